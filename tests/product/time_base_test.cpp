@@ -1,0 +1,231 @@
+#include "product/time_base.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstring>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "product/byte_order.h"
+
+namespace {
+
+std::string fmt(double t) {
+  std::string s;
+  EXPECT_EQ(sec852myascii(t, s), 0);
+  return s;
+}
+
+TEST(TimeBase, EpochAndKnownDates) {
+  EXPECT_EQ(fmt(0.0), "01-JAN-1985 00:00:00.000000");
+  char buf[kDateTextSize];
+  ASSERT_EQ(sec852ascii(0.0, buf), 0);
+  EXPECT_STREQ(buf, "01-JAN-1985 00:00:00.000000");
+  EXPECT_EQ(sec852myascii(-1.0, buf), -1);
+
+  EXPECT_DOUBLE_EQ(ascii2sec85("01-JAN-1985 00:00:00.000000"), 0.0);
+  EXPECT_DOUBLE_EQ(ascii2sec85("1-JAN-1985"), 0.0);
+  // 1985..1999: 15 years with 1988, 1992, 1996 as leap years.
+  EXPECT_DOUBLE_EQ(ascii2sec85("01-JAN-2000 00:00:00.000000"), 5478.0 * 86400.0);
+  // 2000 is a leap year (divisible by 400), 1900-type years are not.
+  EXPECT_DOUBLE_EQ(ascii2sec85("01-MAR-2000 00:00:00") - ascii2sec85("28-FEB-2000 00:00:00"),
+                   2 * 86400.0);
+  EXPECT_DOUBLE_EQ(ascii2sec85("01-MAR-1999 00:00:00") - ascii2sec85("28-FEB-1999 00:00:00"),
+                   86400.0);
+  EXPECT_DOUBLE_EQ(ascii2sec85("01-MAR-2100 00:00:00") - ascii2sec85("28-FEB-2100 00:00:00"),
+                   86400.0);
+  EXPECT_TRUE(isLeapYear(1988));
+  EXPECT_TRUE(isLeapYear(2000));
+  EXPECT_FALSE(isLeapYear(1900));
+  EXPECT_FALSE(isLeapYear(2006));
+  // Before the epoch the value is negative.
+  EXPECT_DOUBLE_EQ(ascii2sec85("31-DEC-1984 23:59:59.000"), -1.0);
+  // Independent reference: Unix time of 17-FEB-2000 09:57:26 is 950781446,
+  // and 01-JAN-1985 is Unix 473385600.
+  EXPECT_DOUBLE_EQ(ascii2sec85("17-FEB-2000 09:57:26.417"), 950781446.0 - 473385600.0 + 0.417);
+}
+
+TEST(TimeBase, ParserSkipsPrefixesAndBlanks) {
+  const double ref = ascii2sec85("17-FEB-2000 09:57:26.417");
+  // Leader fields with a blank instead of a leading zero.
+  EXPECT_DOUBLE_EQ(ascii2sec85("17-FEB-2000  9:57:26.417"), ref);
+  EXPECT_NEAR(ascii2sec85("17-FEB-2000  9:44: 3.8049"),
+              ascii2sec85("17-FEB-2000 09:44:03.000") + 0.8049, 1e-6);
+  // A header value with its key delimiters in front.
+  EXPECT_NEAR(ascii2sec85("=\"29-MAR-2012 07:11:34.432893\""),
+              ascii2sec85("29-MAR-2012 07:11:34") + 0.432893, 1e-7);
+  EXPECT_DOUBLE_EQ(ascii2sec85("SENSING_START=\"17-feb-2000 09:57:26.417\""), ref);
+
+  testing::internal::CaptureStderr();
+  EXPECT_EQ(ascii2sec85("nothing here"), 0.0);
+  EXPECT_EQ(ascii2sec85("30-FEB-2001 00:00:00"), 0.0);
+  EXPECT_EQ(ascii2sec85("12-XYZ-2001 00:00:00"), 0.0);
+  EXPECT_EQ(ascii2sec85("12-JAN-2001 25:00:00"), 0.0);
+  const std::string err = testing::internal::GetCapturedStderr();
+  EXPECT_NE(err.find("Error: incorrect date format, code "), std::string::npos);
+}
+
+TEST(TimeBase, RoundTripToTheMicrosecond) {
+  const std::vector<std::string> dates = {
+      "01-JAN-1985 00:00:00.000001", "29-FEB-1988 23:59:59.999999", "31-DEC-1999 23:59:59.999999",
+      "01-JAN-2000 00:00:00.000000", "29-FEB-2000 12:00:00.500000", "01-MAR-2000 00:00:00.000001",
+      "31-DEC-2004 06:07:08.123456", "28-FEB-2100 23:59:59.999999", "01-MAR-2100 00:00:00.000000",
+      "29-MAR-2012 07:11:34.432893", "17-FEB-2000 09:57:26.417000", "18-JAN-2010 17:49:46.066000"};
+  for (const auto& d : dates) {
+    const double t = ascii2sec85(d);
+    EXPECT_EQ(fmt(t), d);
+    const mjd m = sec852mjd(t);
+    EXPECT_NEAR(mjd2sec85(m), t, 0.5e-6) << d;
+    EXPECT_EQ(fmt(mjd2sec85(m)), d);
+    EXPECT_GE(m.seconds, 0);
+    EXPECT_LT(m.seconds, 86400);
+    EXPECT_GE(m.microseconds, 0);
+    EXPECT_LT(m.microseconds, 1000000);
+  }
+  // MJD2000 reference values: day 0 is 01-JAN-2000, negative days before it.
+  EXPECT_EQ(fmt(mjd2sec85(mjd{0, 0, 0})), "01-JAN-2000 00:00:00.000000");
+  EXPECT_EQ(fmt(mjd2sec85(mjd{-1, 86399, 999999})), "31-DEC-1999 23:59:59.999999");
+  // 29-MAR-2012 is MJD 56015, i.e. MJD2000 day 56015 - 51544 = 4471.
+  const mjd m = sec852mjd(ascii2sec85("29-MAR-2012 07:11:34.432893"));
+  EXPECT_EQ(m.days, 4471);
+  EXPECT_EQ(m.seconds, 7 * 3600 + 11 * 60 + 34);
+  EXPECT_EQ(m.microseconds, 432893);
+  // Rounding of the last digit carries into the seconds.
+  EXPECT_EQ(fmt(59.9999996), "01-JAN-1985 00:01:00.000000");
+}
+
+TEST(TimeBase, UtcCh2num) {
+  EXPECT_DOUBLE_EQ(utc_ch2num("17-FEB-2000 09:57:26.417"), ascii2sec85("17-FEB-2000 09:57:26.417"));
+  testing::internal::CaptureStderr();
+  EXPECT_EQ(utc_ch2num("garbage"), 0.0);
+  testing::internal::GetCapturedStderr();
+}
+
+TEST(TimeBase, LeapSecondTable) {
+  int sum = 0;
+  for (int y = 1972; y <= 2006; ++y) sum += TimeFormat::leapSecondsOfYear(y);
+  EXPECT_EQ(sum, 23);  // TAI-UTC went from 10 s in 1972 to 33 s in 2006
+  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1972), 2);
+  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1980), 0);
+  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1985), 1);
+  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1986), 0);
+  EXPECT_EQ(TimeFormat::leapSecondsOfYear(2005), 1);
+  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1971), 0);
+  EXPECT_EQ(TimeFormat::leapSecondsOfYear(2010), 0);
+
+  // Sums from 1985 (included) to 2000 (excluded): 1985, 87, 89, 90, 92-95, 97, 98.
+  TimeFormat t(ascii2sec85("15-JUN-2000 00:00:00"));
+  const double before = t.getSEC85();
+  t.add_leap_seconds(ascii2sec85("01-JAN-1985 00:00:00"));
+  EXPECT_DOUBLE_EQ(t.getSEC85() - before, 10.0);
+  // Argument year not below the object's year: nothing.
+  TimeFormat u(ascii2sec85("15-JUN-1990 00:00:00"));
+  u.add_leap_seconds("01-JAN-1995 00:00:00");
+  EXPECT_DOUBLE_EQ(u.getSEC85(), ascii2sec85("15-JUN-1990 00:00:00"));
+  // Other argument forms: 1999 to 2006 holds only the 2005 second.
+  TimeFormat w("01-JUL-2006 00:00:00");
+  const mjd m1999 = sec852mjd(ascii2sec85("01-JUL-1999 00:00:00"));
+  w.add_leap_seconds(&m1999);
+  EXPECT_DOUBLE_EQ(w.getSEC85(), ascii2sec85("01-JUL-2006 00:00:01"));
+  // Full table from 1972 to 2007.
+  TimeFormat x(ascii2sec85("01-JUL-2007 00:00:00"));
+  x.add_leap_seconds("=\"01-JAN-1972 00:00:00\"");
+  EXPECT_DOUBLE_EQ(x.getSEC85(), ascii2sec85("01-JUL-2007 00:00:23"));
+}
+
+TEST(TimeBase, TimeFormatViews) {
+  TimeFormat t("29-FEB-2000 12:00:00.5");
+  EXPECT_EQ(t.getYEAR(), 2000);
+  EXPECT_EQ(t.getUTC(), "29-FEB-2000 12:00:00.500000");
+  const mjd m = t.getMJD();
+  EXPECT_EQ(m.days, 59);
+  EXPECT_EQ(m.seconds, 43200);
+  EXPECT_EQ(m.microseconds, 500000);
+  EXPECT_DOUBLE_EQ(TimeFormat(m).getSEC85(), t.getSEC85());
+  EXPECT_EQ(TimeFormat(ascii2sec85("31-DEC-1999 23:59:59.999")).getYEAR(), 1999);
+}
+
+TEST(TimeBase, RealErsLeaderTimes) {
+  const std::string path = TESSIVOR_REALDATA_DIR "/ers1_2000_orbit44928/lea_01.001";
+  std::ifstream in(path, std::ios::binary);
+  if (!in) GTEST_SKIP() << "real data folder absent";
+  std::vector<char> bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+  ASSERT_GT(bytes.size(), 2606u);
+  const std::string first(&bytes[2534], 24), last(&bytes[2582], 24);
+  EXPECT_EQ(first, "17-FEB-2000 09:57:26.417");
+  const double t0 = ascii2sec85(first), t1 = ascii2sec85(last);
+  EXPECT_EQ(fmt(t0), "17-FEB-2000 09:57:26.417000");
+  EXPECT_NEAR(t1 - t0, 16.667, 1e-6);
+}
+
+TEST(ByteOrder, ReadersWritersAndSwaps) {
+  const unsigned char be[8] = {0x40, 0x09, 0x21, 0xFB, 0x54, 0x44, 0x2D, 0x18};  // pi
+  EXPECT_DOUBLE_EQ(ch2double8(be, 'm'), 3.141592653589793);
+  unsigned char le[8];
+  for (int i = 0; i < 8; ++i) le[i] = be[7 - i];
+  EXPECT_DOUBLE_EQ(ch2double8(le, 'l'), 3.141592653589793);
+  const unsigned char f[4] = {0x3F, 0xC0, 0x00, 0x00};  // 1.5
+  EXPECT_FLOAT_EQ(ch2float4(f, 109), 1.5f);
+  const unsigned char u[4] = {0xFF, 0xFE, 0x00, 0x01};
+  EXPECT_EQ(ch2uint2(u, 'm'), 0xFFFE);
+  EXPECT_EQ(ch2uint2(u, 'l'), 0xFEFF);
+  EXPECT_EQ(ch2int2(u, 'm'), -2);
+  EXPECT_EQ(ch2uint4(u, 'm'), 0xFFFE0001u);
+  EXPECT_EQ(ch2int4(u, 'm'), static_cast<int>(0xFFFE0001u));
+  EXPECT_EQ(ch2long4(u, 'm'), static_cast<int>(0xFFFE0001u));
+  EXPECT_EQ(ch2ulong4(u, 'l'), 0x0100FEFFu);
+
+  unsigned char out[4];
+  float2ch(-2.25f, out, 'm');
+  EXPECT_FLOAT_EQ(ch2float4(out, 'm'), -2.25f);
+  EXPECT_EQ(out[0], 0xC0);
+  long2ch(-5, out, 'l');
+  EXPECT_EQ(ch2long4(out, 'l'), -5);
+  ulong2ch(0x01020304u, out, 'm');
+  EXPECT_EQ(out[0], 1);
+  EXPECT_EQ(out[3], 4);
+  short2ch(-300, out, 'm');
+  EXPECT_EQ(ch2int2(out, 'm'), -300);
+  ushort2ch(0xABCD, out, 'l');
+  EXPECT_EQ(out[0], 0xCD);
+
+  std::uint32_t w = 0x11223344u;
+  swp4(&w);
+  EXPECT_EQ(w, 0x44332211u);
+  std::uint16_t h = 0x1122;
+  swp2(&h);
+  EXPECT_EQ(h, 0x2211);
+  bsw2b(&h);
+  EXPECT_EQ(h, 0x1122);
+  std::uint64_t q = 0x0102030405060708ULL;
+  swp8(&q);
+  EXPECT_EQ(q, 0x0807060504030201ULL);
+  unsigned char three[3] = {1, 2, 3};
+  swp_any(three, 3);
+  EXPECT_EQ(three[0], 3);
+  EXPECT_EQ(three[2], 1);
+
+  const std::uint16_t probe = 1;
+  const bool little = *reinterpret_cast<const unsigned char*>(&probe) == 1;
+  EXPECT_EQ(get_endian(), little ? 'l' : 'm');
+}
+
+TEST(ByteOrder, NanAndInfinityByBits) {
+  const double nan = std::nan(""), inf = HUGE_VAL;
+  EXPECT_TRUE(myisnan(nan));
+  EXPECT_FALSE(myisnan(inf));
+  EXPECT_TRUE(myisinf(-inf));
+  EXPECT_FALSE(myisinf(1e308));
+  EXPECT_TRUE(myfinite(-999.0));
+  EXPECT_FALSE(myfinite(nan));
+  EXPECT_FALSE(myfinite(inf));
+  EXPECT_TRUE(myisnan4(std::nanf("")));
+  EXPECT_TRUE(myisinf4(-HUGE_VALF));
+  EXPECT_FALSE(myisinf4(3.4e38f));
+  EXPECT_TRUE(myfinite4(0.0f));
+  EXPECT_FALSE(myfinite4(HUGE_VALF));
+}
+
+}  // namespace
