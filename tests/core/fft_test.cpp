@@ -1,0 +1,292 @@
+#include "core/fft.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdint>
+#include <numbers>
+#include <random>
+#include <vector>
+
+namespace {
+
+std::vector<fcomplex> randomSignal(std::size_t n, unsigned seed) {
+  std::mt19937 gen(seed);
+  std::uniform_real_distribution<float> u(-1.0f, 1.0f);
+  std::vector<fcomplex> v(n);
+  for (auto& x : v) x = fcomplex(u(gen), u(gen));
+  return v;
+}
+
+// Direct DFT in double: sign -1 forward, +1 backward (unscaled).
+std::vector<dcomplex> dft(const fcomplex* x, int n, int stride, int sign) {
+  std::vector<dcomplex> out(n);
+  for (int k = 0; k < n; ++k) {
+    dcomplex s = 0.0;
+    for (int m = 0; m < n; ++m) {
+      double p = sign * 2.0 * std::numbers::pi * static_cast<double>(m) * k / n;
+      s += dcomplex(x[static_cast<std::size_t>(m) * stride]) * std::polar(1.0, p);
+    }
+    out[k] = s;
+  }
+  return out;
+}
+
+double maxAbs(const std::vector<dcomplex>& v) {
+  double m = 0.0;
+  for (auto& x : v) m = std::max(m, std::abs(x));
+  return m;
+}
+
+TEST(Genpow, SmoothLengthsAndTheExcludedValue) {
+  EXPECT_EQ(genpow(0, 1), 0);
+  EXPECT_EQ(genpow(-5, 1), 0);
+  EXPECT_EQ(genpow(1, 1), 1);
+  EXPECT_EQ(genpow(7, 1), 8);
+  EXPECT_EQ(genpow(97, 1), 100);
+  EXPECT_EQ(genpow(8192, 1), 8192);
+  EXPECT_EQ(genpow(8193, 1), 8640);
+  EXPECT_EQ(genpow(5616, 1), 5760);  // 5625 is skipped
+  EXPECT_EQ(genpow(5625, 1), 5760);
+  EXPECT_EQ(genpow(5600, 1), 5760);
+  EXPECT_EQ(genpow(5626, 1), 5760);
+  EXPECT_EQ(genpow(5624, 1), 5760);
+}
+
+TEST(Genpow, NeverReturns5625AndAlwaysSmooth) {
+  for (int n = 1; n <= 20000; ++n) {
+    int v = genpow(n, 1);
+    ASSERT_NE(v, 5625);
+    ASSERT_GE(v, n);
+    int r = v;
+    for (int p : {2, 3, 5})
+      while (r % p == 0) r /= p;
+    ASSERT_EQ(r, 1) << n;
+  }
+}
+
+TEST(FftShift, EvenAndOddRowsAndInverse) {
+  std::vector<fcomplex> even{0, 1, 2, 3, 4, 5, 10, 11, 12, 13, 14, 15};
+  fftshift(even.data(), 6, 2);
+  std::vector<fcomplex> evenWant{3, 4, 5, 0, 1, 2, 13, 14, 15, 10, 11, 12};
+  EXPECT_EQ(even, evenWant);
+  ifftshift(even.data(), 6, 2);
+  EXPECT_EQ(even, (std::vector<fcomplex>{0, 1, 2, 3, 4, 5, 10, 11, 12, 13, 14, 15}));
+
+  // a b c d e -> d e a b c
+  std::vector<fcomplex> odd{0, 1, 2, 3, 4, 10, 11, 12, 13, 14};
+  fftshift(odd.data(), 5, 2);
+  EXPECT_EQ(odd, (std::vector<fcomplex>{3, 4, 0, 1, 2, 13, 14, 10, 11, 12}));
+  ifftshift(odd.data(), 5, 2);
+  EXPECT_EQ(odd, (std::vector<fcomplex>{0, 1, 2, 3, 4, 10, 11, 12, 13, 14}));
+
+  std::vector<fcomplex> one{7};
+  fftshift(one.data(), 1, 1);
+  EXPECT_EQ(one[0], fcomplex(7));
+}
+
+TEST(FftPlan, StatusCodes) {
+  FFTPlan p;
+  EXPECT_EQ(fft_makep_c(p, 0, 0, 1, 1, 1, 0, 0), 1);
+  EXPECT_EQ(fft_makep_c(p, 4, 4, 0, 1, 1, 0, 0), 1);
+  EXPECT_EQ(fft_makep_c(p, 4, 5, 1, 1, 1, 0, 0), 2);
+  EXPECT_EQ(fft_makep_c(p, 4, 4, 2, 3, 1, 0, 0), 3);
+  EXPECT_EQ(fft_makep_c(p, 4, 4, 2, 2, 1, 1, 0), 0);
+  EXPECT_NE(p.row, nullptr);
+  EXPECT_NE(p.col, nullptr);
+  EXPECT_EQ(fft_destp_c(p), 0);
+  EXPECT_EQ(p.row, nullptr);
+}
+
+TEST(FftPlan, DirectionCodesAndNormalisation) {
+  const int n = 30;
+  auto x = randomSignal(n, 1);
+  std::vector<fcomplex> y(n);
+  ASSERT_EQ(fft_c(n, n, 1, 1, FFT_FORWARD, FFT_NONE, x.data(), y.data()), 0);
+  auto want = dft(x.data(), n, 1, -1);
+  for (int k = 0; k < n; ++k) EXPECT_LT(std::abs(dcomplex(y[k]) - want[k]), 1e-5 * maxAbs(want));
+  // Input kept by the out-of-place transform.
+  EXPECT_EQ(x, randomSignal(n, 1));
+
+  // -2: backward unscaled; -1: backward divided by N.
+  std::vector<fcomplex> b2(n), b1(n);
+  ASSERT_EQ(fft_c(n, n, 1, 1, FFT_BACKWARD, FFT_NONE, y.data(), b2.data()), 0);
+  ASSERT_EQ(fft_c(n, n, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, y.data(), b1.data()), 0);
+  auto back = dft(y.data(), n, 1, +1);
+  for (int k = 0; k < n; ++k) {
+    EXPECT_LT(std::abs(dcomplex(b2[k]) - back[k]), 1e-5 * maxAbs(back));
+    EXPECT_LT(std::abs(b1[k] - x[k]), 1e-5f);
+  }
+
+  // In place gives the same.
+  std::vector<fcomplex> z = x;
+  ASSERT_EQ(fft_c(n, n, 1, 1, FFT_FORWARD, FFT_NONE, z.data(), z.data()), 0);
+  for (int k = 0; k < n; ++k) EXPECT_LT(std::abs(z[k] - y[k]), 1e-5f);
+
+  // A plan of a length-1 axis has no handle and never scales.
+  FFTPlan p;
+  ASSERT_EQ(fft_makep_c(p, 4, 1, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1), 0);
+  EXPECT_EQ(p.row, nullptr);
+  EXPECT_EQ(p.rowNormalise, 0);
+  std::vector<fcomplex> v{fcomplex(3, 4), fcomplex(5, 6), 7, 8};
+  pfft_c(p, v.data(), v.data());
+  EXPECT_EQ(v, (std::vector<fcomplex>{fcomplex(3, 4), fcomplex(5, 6), 7, 8}));
+
+  // -2 is stored as -1 with the flag clear.
+  ASSERT_EQ(fft_makep_c(p, 8, 8, 1, 1, FFT_BACKWARD, FFT_NONE, 0), 0);
+  EXPECT_EQ(p.rowDirection, -1);
+  EXPECT_EQ(p.rowNormalise, 0);
+  ASSERT_EQ(fft_makep_c(p, 8, 8, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 0), 0);
+  EXPECT_EQ(p.rowNormalise, 1);
+
+  // Directions 0, 0 copy nothing.
+  std::vector<fcomplex> out(4, fcomplex(-1, -1));
+  ASSERT_EQ(fft_c(4, 4, 1, 1, FFT_NONE, FFT_NONE, v.data(), out.data()), 0);
+  EXPECT_EQ(out, std::vector<fcomplex>(4, fcomplex(-1, -1)));
+}
+
+TEST(FftPlan, SubRectangleLeavesTheRestUntouched) {
+  const int nx = 9, ux = 5, ny = 6, uy = 4;
+  auto a = randomSignal(nx * ny, 2);
+  auto orig = a;
+  ASSERT_EQ(fft_c(nx, ux, ny, uy, FFT_BACKWARD_NORMALISED, FFT_NONE, a.data(), a.data()), 0);
+  for (int y = 0; y < ny; ++y) {
+    for (int x = 0; x < nx; ++x) {
+      if (x < ux && y < uy) continue;
+      EXPECT_EQ(a[y * nx + x], orig[y * nx + x]) << x << "," << y;
+    }
+  }
+  for (int y = 0; y < uy; ++y) {
+    auto want = dft(&orig[y * nx], ux, 1, +1);
+    for (int x = 0; x < ux; ++x)
+      EXPECT_LT(std::abs(dcomplex(a[y * nx + x]) - want[x] / double(ux)), 1e-5);
+  }
+
+  // Columns only, out of place: reads the input columns, scales by 1/uy.
+  std::vector<fcomplex> out(nx * ny, fcomplex(9, 9));
+  ASSERT_EQ(fft_c(nx, ux, ny, uy, FFT_NONE, FFT_BACKWARD_NORMALISED, orig.data(), out.data()), 0);
+  for (int x = 0; x < ux; ++x) {
+    auto want = dft(&orig[x], uy, nx, +1);
+    for (int y = 0; y < uy; ++y)
+      EXPECT_LT(std::abs(dcomplex(out[y * nx + x]) - want[y] / double(uy)), 1e-5);
+  }
+  EXPECT_EQ(out[ux], fcomplex(9, 9));
+  EXPECT_EQ(out[uy * nx], fcomplex(9, 9));
+}
+
+TEST(FftPlan, TwoDimensionalForwardAndRoundTrip) {
+  const int nx = 12, ux = 12, ny = 10, uy = 10;
+  auto a = randomSignal(nx * ny, 3);
+  std::vector<fcomplex> f(nx * ny), back(nx * ny);
+  ASSERT_EQ(fft_c(nx, ux, ny, uy, FFT_FORWARD, FFT_FORWARD, a.data(), f.data()), 0);
+  // 2-D DFT by definition at a few bins.
+  for (auto [kx, ky] : {std::pair{0, 0}, std::pair{3, 7}, std::pair{11, 1}}) {
+    dcomplex s = 0.0;
+    for (int y = 0; y < uy; ++y)
+      for (int x = 0; x < ux; ++x)
+        s += dcomplex(a[y * nx + x]) *
+             std::polar(1.0, -2.0 * std::numbers::pi * (double(x) * kx / ux + double(y) * ky / uy));
+    EXPECT_LT(std::abs(dcomplex(f[ky * nx + kx]) - s), 1e-4);
+  }
+  ASSERT_EQ(fft_c(nx, ux, ny, uy, FFT_BACKWARD_NORMALISED, FFT_BACKWARD_NORMALISED, f.data(),
+                  back.data()),
+            0);
+  for (int i = 0; i < nx * ny; ++i) EXPECT_LT(std::abs(back[i] - a[i]), 1e-5f);
+}
+
+TEST(FftPlan, ReusedPlanOnUnalignedAndSwappedPlacement) {
+  const int n = 64, rows = 3;
+  FFTPlan p;
+  ASSERT_EQ(fft_makep_c(p, n, n, rows, rows, FFT_FORWARD, FFT_NONE, 0), 0);
+  auto x = randomSignal(n * rows + 1, 4);
+  std::vector<fcomplex> ref(n * rows), got(n * rows + 1);
+  pfft_c(p, x.data(), ref.data());
+  // Input and output shifted by one sample (8 bytes off the SIMD alignment).
+  pfft_c(p, x.data() + 1, got.data() + 1);
+  auto want = dft(x.data() + 1, n, 1, -1);
+  for (int k = 0; k < n; ++k) EXPECT_LT(std::abs(dcomplex(got[k + 1]) - want[k]), 1e-4);
+  // An out-of-place plan run in place.
+  std::vector<fcomplex> inplace(x.begin(), x.begin() + n * rows);
+  pfft_c(p, inplace.data(), inplace.data());
+  for (int i = 0; i < n * rows; ++i) EXPECT_LT(std::abs(inplace[i] - ref[i]), 1e-5f);
+  fft_destp_c(p);
+}
+
+TEST(FftPlan, ThreadCountDoesNotChangeResults) {
+  const int n = 1024, rows = 64;
+  auto x = randomSignal(n * rows, 5);
+  std::vector<fcomplex> one(n * rows), two(n * rows);
+  fft_set_threads(1);
+  ASSERT_EQ(fft_c(n, n, rows, rows, FFT_FORWARD, FFT_NONE, x.data(), one.data()), 0);
+  fft_set_threads(2);
+  ASSERT_EQ(fft_c(n, n, rows, rows, FFT_FORWARD, FFT_NONE, x.data(), two.data()), 0);
+  fft_set_threads(0);
+  for (int i = 0; i < n * rows; ++i) ASSERT_LT(std::abs(one[i] - two[i]), 1e-3f);
+  EXPECT_GE(fft_get_threads(), 1);
+}
+
+TEST(ChirpZ, EqualsTheDftForTheUnitCircleGrid) {
+  for (int M : {37, 64, 100}) {
+    const int rows = 2;
+    auto x = randomSignal(M * rows, 6 + M);
+    std::vector<fcomplex> X(M * rows);
+    ASSERT_EQ(czt_c(x.data(), M, X.data(), M, -2.0 * std::numbers::pi / M, 0.0, rows), 0);
+    std::vector<fcomplex> F(M * rows);
+    ASSERT_EQ(fft_c(M, M, rows, rows, FFT_FORWARD, FFT_NONE, x.data(), F.data()), 0);
+    for (int r = 0; r < rows; ++r) {
+      auto want = dft(&x[r * M], M, 1, -1);
+      double scale = maxAbs(want);
+      for (int k = 0; k < M; ++k) {
+        EXPECT_LT(std::abs(dcomplex(X[r * M + k]) - want[k]), 2e-5 * scale) << M << " " << k;
+        EXPECT_LT(std::abs(X[r * M + k] - F[r * M + k]), 2e-5 * scale);
+      }
+    }
+  }
+}
+
+TEST(ChirpZ, ZoomedGridMatchesTheDefiningSum) {
+  const int M = 50, K = 23;
+  const double a = -0.013, b = 0.4;
+  auto x = randomSignal(M, 9);
+  std::vector<fcomplex> X(K);
+  CZTPlan plan;
+  ASSERT_EQ(czt_makep_c(plan, M, K), 0);
+  EXPECT_EQ(plan.L, genpow(M + K - 1, 1));
+  ASSERT_EQ(pczt_c(plan, x.data(), X.data(), a, b, 1), 0);
+  czt_destp_c(plan);
+  for (int k = 0; k < K; ++k) {
+    dcomplex s = 0.0;
+    for (int n = 0; n < M; ++n) s += dcomplex(x[n]) * std::polar(1.0, n * (a * k - b));
+    EXPECT_LT(std::abs(dcomplex(X[k]) - s), 1e-4 * std::max(1.0, std::abs(s))) << k;
+  }
+}
+
+TEST(FftMemory, AlignedAndZeroed) {
+  for (std::size_t bytes : {1u, 15u, 16u, 1000u}) {
+    void* p = fft_malloc(bytes);
+    ASSERT_NE(p, nullptr);
+    EXPECT_EQ(reinterpret_cast<std::uintptr_t>(p) % 16, 0u);
+    fft_free(p);
+  }
+  auto* z = static_cast<unsigned char*>(fft_calloc(100, 3));
+  ASSERT_NE(z, nullptr);
+  for (int i = 0; i < 300; ++i) ASSERT_EQ(z[i], 0);
+  fft_free(z);
+  fft_free(nullptr);
+}
+
+TEST(FftReal, ForwardMatchesComplexTransformAndRoundTrips) {
+  const int nx = 16, ux = 16, ny = 2, uy = 2;
+  std::vector<float> r(nx * ny);
+  for (int i = 0; i < nx * ny; ++i) r[i] = std::sin(0.3f * i) + 0.1f * i;
+  std::vector<fcomplex> spec((nx / 2 + 1) * ny);
+  ASSERT_EQ(fft_r(nx, ux, ny, uy, FFT_FORWARD, FFT_NONE, r.data(), spec.data()), 0);
+  std::vector<fcomplex> c(r.begin(), r.end());
+  auto want = dft(c.data(), ux, 1, -1);
+  for (int k = 0; k <= ux / 2; ++k) EXPECT_LT(std::abs(dcomplex(spec[k]) - want[k]), 1e-4);
+  std::vector<float> back(nx * ny);
+  ASSERT_EQ(fft_r(nx, ux, ny, uy, FFT_BACKWARD_NORMALISED, FFT_NONE, spec.data(), back.data()), 0);
+  for (int i = 0; i < nx * ny; ++i) EXPECT_NEAR(back[i], r[i], 1e-5f);
+}
+
+}  // namespace
