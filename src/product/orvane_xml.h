@@ -53,6 +53,9 @@ class orvanexml {
   void setDebug(bool on) { debug = on; }
   bool getDebug() const { return debug; }
   bool isOpen() const { return documentOpen; }
+  // True when the file last opened was a parameter document (false when it
+  // was missing or foreign and a new document took its place).
+  bool isRecognised() const { return recognised; }
   const std::string& getPath() const { return docPath; }
   int getNumberOfChannels() const { return numberOfChannels; }
   const std::string& getDescription() const { return description; }
@@ -81,6 +84,7 @@ class orvanexml {
   _xmlXPathContext* context = nullptr;
   _xmlXPathObject* result = nullptr;
   bool debug = false;
+  bool recognised = false;
   int numberOfChannels = 0;
   std::string description;
 };
