@@ -7,11 +7,19 @@
 
 // 0 if the variable is set (value copied as the host wrote it), -11 otherwise.
 int tesvGetEnv(const char* name, std::string& value);
+// Value of a TESSIVOR_* variable, or where it is unset its default: the
+// installed resources folder for the description-file directories, the
+// current folder for TESSIVOR_WORKING_DIR, empty for the others.
+std::string tesvEnvOrDefault(const char* name);
 
 // Reads the variables, opens the logs and loads the catalogues.
 // After this call the fatal path writes files and exits instead of throwing.
 void initEnvironment();
 bool environmentReady();
+// Progress file of the run: TESSIVOR_WORKING_FILE (joined to the working
+// directory when it holds no '/'), "Tessivor_progress.txt" when unset.
+const std::string& progressFilePath();
+const std::string& workingDirectory();
 // Resets everything initEnvironment set up (for tests that run several
 // environments in one process).
 void resetEnvironment();
@@ -30,6 +38,7 @@ bool tracingActive();
 
 // Texts of a code from the catalogues: group title and message.
 void lookupErrorCode(int code, std::string& title, std::string& message);
+void lookupWarningCode(int code, std::string& title, std::string& message);
 
 // Fatal path: _error file, trace, log, failed close, exit(code).
 // Throws orvaneException instead while the environment is not ready.

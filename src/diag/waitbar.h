@@ -5,3 +5,5 @@
 int waitbar_open(const char* message);
 int waitbar_update(int unused, float percentage);
 int waitbar_close();
+// Forgets the percentage on record (a new environment starts from 0).
+void waitbar_reset();
