@@ -199,19 +199,20 @@ std::string fmt(const char* format, ...) {
   return out;
 }
 
-void reportShort(int got, int n, const std::string& section, const std::string& key,
-                 const std::string& file) {
-  ORV_REPORT(fmt("Read only %d elements of %d - SEC: %s, KEY: %s, FILE: %s", got, n,
-                 section.c_str(), key.c_str(), file.c_str()),
-             REPORT_WARNING);
+// Reports are made in the name of the public call that failed.
+void reportShort(const char* who, int got, int n, const std::string& section,
+                 const std::string& key, const std::string& file) {
+  orv_add_report(fmt("Read only %d elements of %d - SEC: %s, KEY: %s, FILE: %s", got, n,
+                     section.c_str(), key.c_str(), file.c_str()),
+                 REPORT_WARNING, __LINE__, who, __FILE__);
 }
 
-int store(const std::string& section, const std::string& key, const std::string& value,
-          const std::string& file) {
+int store(const char* who, const std::string& section, const std::string& key,
+          const std::string& value, const std::string& file) {
   if (GetSetProfileChar(1, section, key, value, file) == nullptr) {
-    ORV_REPORT(fmt("Parameter writing failed - SEC: %s, KEY: %s, FILE: %s", section.c_str(),
-                   key.c_str(), file.c_str()),
-               REPORT_WARNING);
+    orv_add_report(fmt("Parameter writing failed - SEC: %s, KEY: %s, FILE: %s", section.c_str(),
+                       key.c_str(), file.c_str()),
+                   REPORT_WARNING, __LINE__, who, __FILE__);
     return kFail;
   }
   return kOk;
@@ -259,7 +260,7 @@ bool convert(const char* tok, double& v) { return std::sscanf(tok, "%lf", &v) ==
 // Tokenised read of up to n numbers: one leading '{' skipped, tokens split on
 // blanks and tabs, the first token that does not convert ends the reading.
 template <typename T, typename U>
-int readNumbers(const std::string& section, const std::string& key, U* dst, int n,
+int readNumbers(const char* who, const std::string& section, const std::string& key, U* dst, int n,
                 const std::string& file) {
   const std::string* value = GetSetProfileChar(0, section, key, std::string(), file);
   if (value == nullptr) return kFail;
@@ -278,7 +279,7 @@ int readNumbers(const std::string& section, const std::string& key, U* dst, int 
     pos = e;
   }
   if (got < n) {
-    reportShort(got, n, section, key, file);
+    reportShort(who, got, n, section, key, file);
     return kFail;
   }
   return kOk;
@@ -290,8 +291,8 @@ V* grown(std::vector<V>& v, int n) {
   return v.data();
 }
 
-int stringArray(const std::string& section, const std::string& key, std::string* dst, int n,
-                const std::string& file) {
+int stringArray(const char* who, const std::string& section, const std::string& key,
+                std::string* dst, int n, const std::string& file) {
   const std::string* value = GetSetProfileChar(0, section, key, std::string(), file);
   if (value == nullptr) return kFail;
   const std::string text = *value;
@@ -319,7 +320,7 @@ int stringArray(const std::string& section, const std::string& key, std::string*
   }
   if (inside) return kFail;
   if (count >= n) return kOk;
-  reportShort(count, n, section, key, file);
+  reportShort(who, count, n, section, key, file);
   return kFail;
 }
 
@@ -382,28 +383,28 @@ int GetMyProfileString(const std::string& section, const std::string& key, char*
 
 int WriteMyProfileString(const std::string& section, const std::string& key,
                          const std::string& value, const std::string& file) {
-  return store(section, key, value, file);
+  return store(__func__, section, key, value, file);
 }
 
 int WriteMyProfileStringQuote(const std::string& section, const std::string& key,
                               const std::string& value, const std::string& file) {
-  return store(section, key, "\"" + value + "\"", file);
+  return store(__func__, section, key, "\"" + value + "\"", file);
 }
 
 int GetMyProfileStringArray(const std::string& section, const std::string& key,
                             std::vector<std::string>& dst, int n, int /*len*/,
                             const std::string& file) {
-  return stringArray(section, key, grown(dst, n), n, file);
+  return stringArray(__func__, section, key, grown(dst, n), n, file);
 }
 
 int GetMyProfileStringArray(const std::string& section, const std::string& key, std::string* dst,
                             int n, int /*len*/, const std::string& file) {
-  return stringArray(section, key, dst, n, file);
+  return stringArray(__func__, section, key, dst, n, file);
 }
 
 int WriteMyProfileStringArray(const std::string& section, const std::string& key,
                               const std::string* src, int n, const std::string& file) {
-  return store(section, key, quoteRow(src, n, 1), file);
+  return store(__func__, section, key, quoteRow(src, n, 1), file);
 }
 
 int WriteMyProfileStringArray(const std::string& section, const std::string& key,
@@ -419,50 +420,50 @@ int WriteMyProfileStringMatrix(const std::string& section, const std::string& ke
     if (r > 0) text += "\n\t";
     text += quoteRow(src + r, cols, rows);
   }
-  return store(section, key, text, file);
+  return store(__func__, section, key, text, file);
 }
 
 // ---- number arrays ------------------------------------------------------------
 
 int GetMyProfileIntArray(const std::string& section, const std::string& key, int* dst, int n,
                          const std::string& file) {
-  return readNumbers<int>(section, key, dst, n, file);
+  return readNumbers<int>(__func__, section, key, dst, n, file);
 }
 int GetMyProfileIntArray(const std::string& section, const std::string& key, std::vector<int>& dst,
                          int n, const std::string& file) {
-  return readNumbers<int>(section, key, grown(dst, n), n, file);
+  return readNumbers<int>(__func__, section, key, grown(dst, n), n, file);
 }
 int GetMyProfileInt64Array(const std::string& section, const std::string& key, int64_t* dst, int n,
                            const std::string& file) {
-  return readNumbers<long long>(section, key, dst, n, file);
+  return readNumbers<long long>(__func__, section, key, dst, n, file);
 }
 int GetMyProfileInt64Array(const std::string& section, const std::string& key,
                            std::vector<int64_t>& dst, int n, const std::string& file) {
-  return readNumbers<long long>(section, key, grown(dst, n), n, file);
+  return readNumbers<long long>(__func__, section, key, grown(dst, n), n, file);
 }
 int GetMyProfileLongArray(const std::string& section, const std::string& key, long* dst, int n,
                           const std::string& file) {
-  return readNumbers<long>(section, key, dst, n, file);
+  return readNumbers<long>(__func__, section, key, dst, n, file);
 }
 int GetMyProfileLongArray(const std::string& section, const std::string& key,
                           std::vector<long>& dst, int n, const std::string& file) {
-  return readNumbers<long>(section, key, grown(dst, n), n, file);
+  return readNumbers<long>(__func__, section, key, grown(dst, n), n, file);
 }
 int GetMyProfileFloatArray(const std::string& section, const std::string& key, float* dst, int n,
                            const std::string& file) {
-  return readNumbers<float>(section, key, dst, n, file);
+  return readNumbers<float>(__func__, section, key, dst, n, file);
 }
 int GetMyProfileFloatArray(const std::string& section, const std::string& key,
                            std::vector<float>& dst, int n, const std::string& file) {
-  return readNumbers<float>(section, key, grown(dst, n), n, file);
+  return readNumbers<float>(__func__, section, key, grown(dst, n), n, file);
 }
 int GetProfileDoubleArray(const std::string& section, const std::string& key, double* dst, int n,
                           const std::string& file) {
-  return readNumbers<double>(section, key, dst, n, file);
+  return readNumbers<double>(__func__, section, key, dst, n, file);
 }
 int GetProfileDoubleArray(const std::string& section, const std::string& key,
                           std::vector<double>& dst, int n, const std::string& file) {
-  return readNumbers<double>(section, key, grown(dst, n), n, file);
+  return readNumbers<double>(__func__, section, key, grown(dst, n), n, file);
 }
 int GetMyProfileDoubleArray(const std::string& section, const std::string& key, double* dst, int n,
                             const std::string& file) {
@@ -475,7 +476,7 @@ int GetMyProfileDoubleArray(const std::string& section, const std::string& key,
 
 int WriteMyProfileIntArray(const std::string& section, const std::string& key, const int* src,
                            int n, const std::string& file) {
-  return store(section, key, formatRow(src, n, 1), file);
+  return store(__func__, section, key, formatRow(src, n, 1), file);
 }
 int WriteMyProfileIntArray(const std::string& section, const std::string& key,
                            const std::vector<int>& src, const std::string& file) {
@@ -484,7 +485,7 @@ int WriteMyProfileIntArray(const std::string& section, const std::string& key,
 int WriteMyProfileInt64Array(const std::string& section, const std::string& key,
                              const int64_t* src, int n, const std::string& file) {
   std::vector<long long> tmp(src, src + (n > 0 ? n : 0));
-  return store(section, key, formatRow(tmp.data(), n, 1), file);
+  return store(__func__, section, key, formatRow(tmp.data(), n, 1), file);
 }
 int WriteMyProfileInt64Array(const std::string& section, const std::string& key,
                              const std::vector<int64_t>& src, const std::string& file) {
@@ -492,7 +493,7 @@ int WriteMyProfileInt64Array(const std::string& section, const std::string& key,
 }
 int WriteMyProfileLongArray(const std::string& section, const std::string& key, const long* src,
                             int n, const std::string& file) {
-  return store(section, key, formatRow(src, n, 1), file);
+  return store(__func__, section, key, formatRow(src, n, 1), file);
 }
 int WriteMyProfileLongArray(const std::string& section, const std::string& key,
                             const std::vector<long>& src, const std::string& file) {
@@ -500,7 +501,7 @@ int WriteMyProfileLongArray(const std::string& section, const std::string& key,
 }
 int WriteMyProfileFloatArray(const std::string& section, const std::string& key, const float* src,
                              int n, const std::string& file) {
-  return store(section, key, formatRow(src, n, 1), file);
+  return store(__func__, section, key, formatRow(src, n, 1), file);
 }
 int WriteMyProfileFloatArray(const std::string& section, const std::string& key,
                              const std::vector<float>& src, const std::string& file) {
@@ -508,7 +509,7 @@ int WriteMyProfileFloatArray(const std::string& section, const std::string& key,
 }
 int WriteProfileDoubleArray(const std::string& section, const std::string& key, const double* src,
                             int n, const std::string& file) {
-  return store(section, key, formatRow(src, n, 1), file);
+  return store(__func__, section, key, formatRow(src, n, 1), file);
 }
 int WriteProfileDoubleArray(const std::string& section, const std::string& key,
                             const std::vector<double>& src, const std::string& file) {
@@ -530,7 +531,7 @@ int WriteMyProfileDoubleMatrix(const std::string& section, const std::string& ke
     if (r > 0) text += "\n\t";
     text += formatRow(src + r, cols, rows);
   }
-  return store(section, key, text, file);
+  return store(__func__, section, key, text, file);
 }
 
 // ---- single numbers -------------------------------------------------------------
@@ -540,21 +541,21 @@ int WriteMyProfileInt(const std::string& section, const std::string& key, int va
   std::string text;
   formatItem(text, value);
   stripTrailingBlanks(text);
-  return store(section, key, text, file);
+  return store(__func__, section, key, text, file);
 }
 int WriteMyProfileInt64(const std::string& section, const std::string& key, int64_t value,
                         const std::string& file) {
   std::string text;
   formatItem(text, static_cast<long long>(value));
   stripTrailingBlanks(text);
-  return store(section, key, text, file);
+  return store(__func__, section, key, text, file);
 }
 int WriteMyProfileDouble(const std::string& section, const std::string& key, double value,
                          const std::string& file) {
   std::string text;
   formatItem(text, value);
   stripTrailingBlanks(text);
-  return store(section, key, text, file);
+  return store(__func__, section, key, text, file);
 }
 
 // ---- checked twins ------------------------------------------------------------------
