@@ -1,0 +1,180 @@
+#include "numerics/fitting.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <vector>
+
+#include "numerics/root_finding.h"
+
+namespace {
+
+TEST(PolynomialFits, PolfitAndGenPolfitRecoverExactPolynomials) {
+  // Cubic 3 - 2x + 0.5x^2 + 0.25x^3 at 12 points.
+  const double c[4] = {3.0, -2.0, 0.5, 0.25};
+  std::vector<double> x(12), y(12);
+  for (int i = 0; i < 12; ++i) {
+    x[i] = -2.0 + 0.4 * i;
+    y[i] = c[0] + c[1] * x[i] + c[2] * x[i] * x[i] + c[3] * x[i] * x[i] * x[i];
+  }
+  double out[4];
+  ASSERT_EQ(polfit(x.data(), y.data(), 12, out, 3), 0);
+  for (int k = 0; k < 4; ++k) EXPECT_NEAR(out[k], c[k], 1e-13);
+  double g[4], err = -1;
+  ASSERT_EQ(gen_polfit(4, x.data(), y.data(), 12, g, &err), 0);
+  for (int k = 0; k < 4; ++k) EXPECT_NEAR(g[k], c[k], 1e-13);
+  EXPECT_LT(err, 1e-24);
+  // A straight line through the cubic leaves the exact least-squares residual.
+  double line[2];
+  ASSERT_EQ(gen_polfit(2, x.data(), y.data(), 12, line, &err), 0);
+  double e2 = 0;
+  for (int i = 0; i < 12; ++i) {
+    const double r = y[i] - line[0] - line[1] * x[i];
+    e2 += r * r;
+  }
+  EXPECT_NEAR(err, e2, 1e-12 * e2);
+}
+
+TEST(PolynomialFits, OrbffitInterpolatesOrbitTimesExactly) {
+  // Window polynomials of an orbit (time 0 at the first vector, 5 s apart):
+  // the fit interpolates to a micrometre everywhere in the window.
+  const double t0 = 0.0, dt = 5.0;
+  double pts[15];
+  auto f = [&](double t, int k) {
+    const double u = (t - 10.0) / 10.0;
+    return 7.0e6 * (k + 1) * 0.3 + 7000.0 * (k - 1) * u * 10.0 - 3.5 * u * u * 100.0 +
+           0.002 * u * u * u * 1000.0 + 1e-5 * u * u * u * u * 1e4;
+  };
+  for (int i = 0; i < 5; ++i)
+    for (int k = 0; k < 3; ++k) pts[3 * i + k] = f(t0 + i * dt, k);
+  double cx[5], cy[5], cz[5];
+  ASSERT_EQ(orbffit(t0, dt, pts, 5, cx, cy, cz), 0);
+  const double* c[3] = {cx, cy, cz};
+  for (double t = t0; t <= t0 + 20.0; t += 1.25)
+    for (int k = 0; k < 3; ++k) {
+      double v = 0;
+      for (int j = 4; j >= 0; --j) v = v * t + c[k][j];
+      EXPECT_NEAR(v, f(t, k), 2e-6) << t << " " << k;
+    }
+}
+
+TEST(LinearFits, LfitdFitsOnlyMaskedTermsAndSpreadsCovariance) {
+  // y = 1 + 2 u + 3 v + 0.5 u v over a 10 x 4 grid numbered n = 10 v + u.
+  auto basis = [](double n, NrVector<double>& af, int ma) {
+    const double u = std::fmod(n, 10.0), v = std::floor(n / 10.0);
+    const double b[4] = {1.0, u, v, u * v};
+    for (int j = 1; j <= ma; ++j) af[j] = b[j - 1];
+  };
+  const int nd = 40;
+  NrVector<double> x(1, nd), y(1, nd), sig(1, nd, 1.0);
+  for (int i = 1; i <= nd; ++i) {
+    x[i] = i - 1;
+    const double u = std::fmod(x[i], 10.0), v = std::floor(x[i] / 10.0);
+    y[i] = 1.0 + 2.0 * u + 3.0 * v + 0.5 * u * v;
+  }
+  NrVector<double> a(1, 4, 0.0);
+  NrVector<int> ia(1, 4, 1);
+  NrMatrix<double> covar(1, 4, 1, 4);
+  double chisq = -1;
+  ASSERT_EQ(lfitd(x, y, sig, nd, a, ia, 4, covar, &chisq, basis), 0);
+  EXPECT_NEAR(a[1], 1.0, 1e-12);
+  EXPECT_NEAR(a[2], 2.0, 1e-12);
+  EXPECT_NEAR(a[3], 3.0, 1e-12);
+  EXPECT_NEAR(a[4], 0.5, 1e-12);
+  EXPECT_LT(chisq, 1e-18);
+
+  // Hold term 3 at a wrong fixed value: it keeps that value, the fixed
+  // term's row and column of the covariance are zero, and the others absorb
+  // what they can.
+  NrVector<double> b(1, 4, 0.0);
+  b[3] = 2.0;
+  NrVector<int> mask(1, 4, 1);
+  mask[3] = 0;
+  ASSERT_EQ(lfitd(x, y, sig, nd, b, mask, 4, covar, &chisq, basis), 0);
+  EXPECT_EQ(b[3], 2.0);
+  for (int j = 1; j <= 4; ++j) {
+    EXPECT_EQ(covar[3][j], 0.0);
+    EXPECT_EQ(covar[j][3], 0.0);
+  }
+  EXPECT_GT(covar[1][1], 0.0);
+  EXPECT_GT(chisq, 1.0);
+  // With the correct fixed value, the fit of the others is exact again.
+  b[3] = 3.0;
+  ASSERT_EQ(lfitd(x, y, sig, nd, b, mask, 4, covar, &chisq, basis), 0);
+  EXPECT_NEAR(b[1], 1.0, 1e-12);
+  EXPECT_NEAR(b[2], 2.0, 1e-12);
+  EXPECT_NEAR(b[4], 0.5, 1e-12);
+
+  NrVector<int> none(1, 4, 0);
+  EXPECT_EQ(lfitd(x, y, sig, nd, b, none, 4, covar, &chisq, basis), 1);
+}
+
+TEST(LinearFits, LfitModAndSvdfitAgreeOnANoisyLine) {
+  const int nd = 9;
+  const double noise[nd] = {0.3, -0.1, 0.2, -0.4, 0.1, 0.0, -0.2, 0.3, -0.2};
+  NrVector<double> x(1, nd), y(1, nd), sig(1, nd);
+  for (int i = 1; i <= nd; ++i) {
+    x[i] = 0.5 * i;
+    y[i] = 4.0 - 1.5 * x[i] + noise[i - 1];
+    sig[i] = 0.5 + 0.1 * i;
+  }
+  auto basis = [](double xv, NrVector<double>& af, int) {
+    af[1] = 1.0;
+    af[2] = xv;
+  };
+  NrVector<double> a1(1, 2, 0.0), a2(1, 2, 0.0), w(1, 2);
+  NrVector<int> ia(1, 2, 1);
+  NrMatrix<double> covar(1, 2, 1, 2), u(1, nd, 1, 2), v(1, 2, 1, 2);
+  double chi1, chi2;
+  ASSERT_EQ(lfit_mod(y, sig, nd, a1, ia, 2, covar, &chi1,
+                     [&](int i, NrVector<double>& af, int ma) { basis(x[i], af, ma); }),
+            0);
+  ASSERT_EQ(svdfit(x, y, sig, nd, a2, 2, u, v, w, &chi2, basis), 0);
+  EXPECT_NEAR(a1[1], a2[1], 1e-12);
+  EXPECT_NEAR(a1[2], a2[2], 1e-12);
+  EXPECT_NEAR(chi1, chi2, 1e-12);
+  // Weighted normal equations: the weighted residuals are orthogonal to the basis.
+  double s0 = 0, s1 = 0;
+  for (int i = 1; i <= nd; ++i) {
+    const double e = (y[i] - a1[1] - a1[2] * x[i]) / (sig[i] * sig[i]);
+    s0 += e;
+    s1 += e * x[i];
+  }
+  EXPECT_NEAR(s0, 0.0, 1e-12);
+  EXPECT_NEAR(s1, 0.0, 1e-12);
+  NrVector<int> none(1, 2, 0);
+  EXPECT_EQ(lfit_mod(y, sig, nd, a1, none, 2, covar, &chi1,
+                     [&](int i, NrVector<double>& af, int ma) { basis(x[i], af, ma); }),
+            1);
+}
+
+TEST(RootFinding, RtbisFindsBracketedRootsAndRefusesOthers) {
+  int status = -1;
+  const double r = rtbis([](double x) { return x * x - 2.0; }, 0.0, 3.0, 1e-10, &status);
+  EXPECT_EQ(status, 0);
+  EXPECT_NEAR(r, std::sqrt(2.0), 1e-10);
+  // Decreasing function.
+  const double r2 = rtbis([](double x) { return std::cos(x); }, 1.0, 2.0, 1e-12, &status);
+  EXPECT_NEAR(r2, M_PI / 2, 1e-11);
+  rtbis([](double x) { return x * x + 1.0; }, -1.0, 1.0, 1e-10, &status);
+  EXPECT_EQ(status, 1);
+  // A tolerance below what 40 halvings reach ends with a report, not a hang.
+  const double r3 = rtbis([](double x) { return x - 0.3; }, 0.0, 1e6, 1e-12, &status);
+  EXPECT_EQ(status, 1);
+  EXPECT_NEAR(r3, 0.3, 1e-5);
+}
+
+TEST(RootFinding, BrentAndOptimBrFindMinima) {
+  double xmin = 0;
+  int status = -1;
+  const double fmin = brent(0.0, 1.0, 4.0, [](double x) { return (x - 2.5) * (x - 2.5) + 1.0; },
+                            1e-10, &xmin, &status);
+  EXPECT_EQ(status, 0);
+  EXPECT_NEAR(xmin, 2.5, 3e-8);  // a flat minimum: sqrt of the precision
+  EXPECT_NEAR(fmin, 1.0, 1e-15);
+  optim_br([](double x) { return -std::sin(x); }, 0.0, 3.0, 1e-10, &xmin, &status);
+  EXPECT_EQ(status, 0);
+  EXPECT_NEAR(xmin, M_PI / 2, 1e-7);
+}
+
+}  // namespace

@@ -1,0 +1,214 @@
+#include "numerics/matrix_kernels.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <vector>
+
+#include "numerics/nr_arrays.h"
+
+namespace {
+
+// A well-conditioned non-symmetric 4 x 4 system with a known solution.
+NrMatrix<double> testMatrix() {
+  const double v[16] = {4, -2, 1, 3,  3, 6, -4, 2,  2, 1, 8, -5,  1, -3, 2, 7};
+  return convert_matrix(v, 1, 4, 1, 4);
+}
+const double kSolution[4] = {1.5, -2.25, 0.75, 3.0};
+
+NrVector<double> rhsOf(const NrMatrix<double>& a) {
+  NrVector<double> b(1, 4);
+  for (int i = 1; i <= 4; ++i) {
+    b[i] = 0;
+    for (int j = 1; j <= 4; ++j) b[i] += a[i][j] * kSolution[j - 1];
+  }
+  return b;
+}
+
+TEST(NrArrays, BoundsAreInclusiveAndOffset) {
+  NrVector<double> v(-2, 3);
+  EXPECT_EQ(v.size(), 6u);
+  for (long i = -2; i <= 3; ++i) v[i] = static_cast<double>(i);
+  EXPECT_EQ(v.data()[0], -2.0);
+  EXPECT_EQ(v.data()[5], 3.0);
+  NrMatrix<int> m(1, 2, 0, 2);
+  m[2][0] = 7;
+  m[1][2] = 5;
+  EXPECT_EQ(m.data()[3], 7);
+  EXPECT_EQ(m.data()[2], 5);
+  EXPECT_EQ(m.rows(), 2);
+  EXPECT_EQ(m.cols(), 3);
+  NrMatrix<int> s = submatrix(m, 1, 2, 1, 2, 1, 1);
+  EXPECT_EQ(s[1][2], 5);
+  NrTensor3<float> t = f3tensor(1, 2, 1, 3, 1, 4);
+  t(2, 3, 4) = 1.5f;
+  EXPECT_EQ(t.data()[23], 1.5f);
+}
+
+TEST(LinearSolvers, LuGaussJordanSvdQrSolveTheSameSystem) {
+  {
+    NrMatrix<double> a = testMatrix();
+    NrVector<double> b = rhsOf(a);
+    NrVector<int> indx(1, 4);
+    double d = 0;
+    ASSERT_EQ(ludcmp(a, 4, indx, &d), 0);
+    EXPECT_TRUE(d == 1.0 || d == -1.0);
+    lubksb(a, 4, indx, b);
+    for (int i = 1; i <= 4; ++i) EXPECT_NEAR(b[i], kSolution[i - 1], 1e-13);
+  }
+  {
+    NrMatrix<double> a = testMatrix(), b(1, 4, 1, 1);
+    NrVector<double> rhs = rhsOf(a);
+    for (int i = 1; i <= 4; ++i) b[i][1] = rhs[i];
+    ASSERT_EQ(gaussj(a, 4, b, 1), 0);
+    for (int i = 1; i <= 4; ++i) EXPECT_NEAR(b[i][1], kSolution[i - 1], 1e-13);
+    // a now holds the inverse: A^-1 A = I.
+    const NrMatrix<double> orig = testMatrix();
+    for (int i = 1; i <= 4; ++i)
+      for (int j = 1; j <= 4; ++j) {
+        double s = 0;
+        for (int k = 1; k <= 4; ++k) s += a[i][k] * orig[k][j];
+        EXPECT_NEAR(s, i == j ? 1.0 : 0.0, 1e-14);
+      }
+  }
+  {
+    const NrMatrix<double> orig = testMatrix();
+    NrMatrix<long double> a(1, 4, 1, 4), b(1, 4, 1, 1);
+    NrVector<double> rhs = rhsOf(orig);
+    for (int i = 1; i <= 4; ++i) {
+      for (int j = 1; j <= 4; ++j) a[i][j] = orig[i][j];
+      b[i][1] = rhs[i];
+    }
+    ASSERT_EQ(ldgaussj(a, 4, b, 1), 0);
+    for (int i = 1; i <= 4; ++i) EXPECT_NEAR(static_cast<double>(b[i][1]), kSolution[i - 1], 1e-15);
+  }
+  {
+    NrMatrix<double> u = testMatrix(), v(1, 4, 1, 4);
+    NrVector<double> w(1, 4), x(1, 4);
+    NrVector<double> b = rhsOf(u);
+    ASSERT_EQ(svdcmp(u, 4, 4, w, v), 0);
+    svbksb(u, w, v, 4, 4, b, x);
+    for (int i = 1; i <= 4; ++i) EXPECT_NEAR(x[i], kSolution[i - 1], 1e-13);
+    // U W V^T reproduces A, U and V are orthogonal.
+    const NrMatrix<double> a = testMatrix();
+    for (int i = 1; i <= 4; ++i)
+      for (int j = 1; j <= 4; ++j) {
+        double s = 0, uu = 0, vv = 0;
+        for (int k = 1; k <= 4; ++k) {
+          s += u[i][k] * w[k] * v[j][k];
+          uu += u[k][i] * u[k][j];
+          vv += v[k][i] * v[k][j];
+        }
+        EXPECT_NEAR(s, a[i][j], 1e-13);
+        EXPECT_NEAR(uu, i == j ? 1.0 : 0.0, 1e-14);
+        EXPECT_NEAR(vv, i == j ? 1.0 : 0.0, 1e-14);
+      }
+  }
+  {
+    NrMatrix<double> a = testMatrix();
+    NrVector<double> b = rhsOf(a), c(1, 4), d(1, 4);
+    bool sing = true;
+    ASSERT_EQ(qrdcmp(a, 4, c, d, &sing), 0);
+    EXPECT_FALSE(sing);
+    qrsolv(a, 4, c, d, b);
+    for (int i = 1; i <= 4; ++i) EXPECT_NEAR(b[i], kSolution[i - 1], 1e-13);
+  }
+  {
+    NrMatrix<double> a = testMatrix(), y(1, 4, 1, 4);
+    ASSERT_EQ(InvMatrix(a, 4, y), 0);
+    const NrMatrix<double> orig = testMatrix();
+    for (int i = 1; i <= 4; ++i)
+      for (int j = 1; j <= 4; ++j) {
+        double s = 0;
+        for (int k = 1; k <= 4; ++k) s += orig[i][k] * y[k][j];
+        EXPECT_NEAR(s, i == j ? 1.0 : 0.0, 1e-14);
+      }
+  }
+}
+
+TEST(LinearSolvers, SvdOfTallMatrixAndKnownSingularValues) {
+  // Columns orthogonal with norms 3, 2 and 0.5: singular values known exactly.
+  NrMatrix<double> a(1, 5, 1, 3), v(1, 3, 1, 3);
+  a.fill(0.0);
+  a[1][1] = 3.0;
+  a[2][2] = 2.0;
+  a[3][3] = 0.3;
+  a[4][3] = 0.4;
+  NrVector<double> w(1, 3);
+  ASSERT_EQ(svdcmp(a, 5, 3, w, v), 0);
+  std::vector<double> s = {w[1], w[2], w[3]};
+  std::sort(s.begin(), s.end());
+  EXPECT_NEAR(s[0], 0.5, 1e-15);
+  EXPECT_NEAR(s[1], 2.0, 1e-15);
+  EXPECT_NEAR(s[2], 3.0, 1e-15);
+  NrMatrix<double> wide(1, 2, 1, 3), v3(1, 3, 1, 3);
+  EXPECT_NE(svdcmp(wide, 2, 3, w, v3), 0);
+}
+
+TEST(LinearSolvers, QrLeastSquaresMatchesNormalEquations) {
+  // Line through noisy points: y = 2 + 0.5 x with residuals summing to zero.
+  const double xs[6] = {0, 1, 2, 3, 4, 5};
+  const double r[6] = {0.1, -0.2, 0.1, 0.1, -0.2, 0.1};
+  NrMatrix<double> a(1, 6, 1, 2);
+  NrVector<double> b(1, 6), x(1, 2);
+  for (int i = 1; i <= 6; ++i) {
+    a[i][1] = 1.0;
+    a[i][2] = xs[i - 1];
+    b[i] = 2.0 + 0.5 * xs[i - 1] + r[i - 1];
+  }
+  ASSERT_EQ(qr_solve(a, 6, 2, b, x), 0);
+  // The residuals are orthogonal to both columns only for the exact least-squares line.
+  double s0 = 0, s1 = 0;
+  for (int i = 1; i <= 6; ++i) {
+    const double e = b[i] - x[1] - x[2] * xs[i - 1];
+    s0 += e;
+    s1 += e * xs[i - 1];
+  }
+  EXPECT_NEAR(s0, 0.0, 1e-13);
+  EXPECT_NEAR(s1, 0.0, 1e-13);
+}
+
+TEST(LinearSolvers, SingularSystemsReportAndFail) {
+  NrMatrix<double> a(1, 3, 1, 3);
+  const double v[9] = {1, 2, 3, 2, 4, 6, 1, 0, 1};  // rows 1 and 2 dependent
+  NrMatrix<double> s1 = convert_matrix(v, 1, 3, 1, 3);
+  NrVector<int> indx(1, 3);
+  double d;
+  EXPECT_EQ(ludcmp(s1, 3, indx, &d), 1);
+  NrMatrix<double> s2 = convert_matrix(v, 1, 3, 1, 3), b(1, 3, 1, 1);
+  EXPECT_NE(gaussj(s2, 3, b, 1), 0);
+  NrMatrix<long double> s3(1, 3, 1, 3), lb(1, 3, 1, 1);
+  for (int i = 1; i <= 3; ++i)
+    for (int j = 1; j <= 3; ++j) s3[i][j] = v[(i - 1) * 3 + j - 1];
+  EXPECT_NE(ldgaussj(s3, 3, lb, 1), 0);
+  NrMatrix<double> s4(1, 3, 1, 3);
+  s4.fill(0.0);
+  NrVector<double> c(1, 3), dd(1, 3);
+  bool sing = false;
+  EXPECT_NE(qrdcmp(s4, 3, c, dd, &sing), 0);
+  EXPECT_TRUE(sing);
+}
+
+TEST(MatrixProducts, MmoltTransposeAndMatInv) {
+  const double a[6] = {1, 2, 3, 4, 5, 6};        // 2 x 3
+  const double b[6] = {7, 8, 9, 10, 11, 12};     // 3 x 2
+  double c[4];
+  ASSERT_EQ(Mmolt(a, 2, 3, b, 3, 2, c), 0);
+  EXPECT_DOUBLE_EQ(c[0], 58);
+  EXPECT_DOUBLE_EQ(c[1], 64);
+  EXPECT_DOUBLE_EQ(c[2], 139);
+  EXPECT_DOUBLE_EQ(c[3], 154);
+  EXPECT_EQ(Mmolt(a, 2, 3, b, 2, 3, c), 1);
+  double t[6];
+  Transpose_Matrix(a, 2, 3, t);
+  const double expect[6] = {1, 4, 2, 5, 3, 6};
+  for (int i = 0; i < 6; ++i) EXPECT_EQ(t[i], expect[i]);
+  const double m[9] = {2, 0, 1, 1, 3, 0, 0, 1, 4};
+  double mi[9], prod[9];
+  ASSERT_EQ(MatInv(m, mi, 3), 0);
+  ASSERT_EQ(Mmolt(m, 3, 3, mi, 3, 3, prod), 0);
+  for (int i = 0; i < 3; ++i)
+    for (int j = 0; j < 3; ++j) EXPECT_NEAR(prod[i * 3 + j], i == j ? 1.0 : 0.0, 1e-15);
+}
+
+}  // namespace
