@@ -1,6 +1,8 @@
 #pragma once
 #include <cstddef>
+#include <new>
 #include <string>
+#include <vector>
 
 #include "base/fcomplex.h"
 
@@ -111,6 +113,25 @@ int czt_c(const fcomplex* in, int M, fcomplex* out, int K, double a, double b, i
 void* fft_malloc(std::size_t bytes);
 void* fft_calloc(std::size_t count, std::size_t size);
 void fft_free(void* p);
+
+// Allocator of transform buffers in standard containers.
+template <class T>
+struct FFTAllocator {
+  using value_type = T;
+  FFTAllocator() = default;
+  template <class U>
+  FFTAllocator(const FFTAllocator<U>&) noexcept {}
+  T* allocate(std::size_t n) {
+    if (n > static_cast<std::size_t>(-1) / sizeof(T)) throw std::bad_array_new_length();
+    void* p = fft_malloc(n * sizeof(T));
+    if (!p) throw std::bad_alloc();
+    return static_cast<T*>(p);
+  }
+  void deallocate(T* p, std::size_t) noexcept { fft_free(p); }
+  template <class U>
+  bool operator==(const FFTAllocator<U>&) const noexcept { return true; }
+};
+using FFTBuffer = std::vector<fcomplex, FFTAllocator<fcomplex>>;
 
 // Threads used by the transforms; 0 or below means every core (the default,
 // also taken from TESSIVOR_FFT_THREADS when set). Small transforms run on one
