@@ -11,6 +11,7 @@
 #include "base/status.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
+#include "numerics/fitting.h"
 
 namespace {
 
@@ -21,47 +22,13 @@ struct FileCloser {
 };
 using File = std::unique_ptr<std::FILE, FileCloser>;
 
-// Least-squares polynomial of degree `degree` (coefficients constant term
-// first) through n points: normal equations in extended precision solved by
-// Gauss-Jordan elimination with partial pivoting. Returns false when singular.
-bool fitPolynomial(const std::vector<double>& x, const std::vector<double>& y, int degree,
-                   double* out) {
-  const int m = degree + 1;
-  std::vector<long double> a(m * (m + 1), 0.0L);
-  for (std::size_t k = 0; k < x.size(); ++k) {
-    long double p[8];
-    p[0] = 1.0L;
-    for (int i = 1; i < 2 * m - 1; ++i) p[i] = p[i - 1] * x[k];
-    for (int i = 0; i < m; ++i) {
-      for (int j = 0; j < m; ++j) a[i * (m + 1) + j] += p[i + j];
-      a[i * (m + 1) + m] += p[i] * y[k];
-    }
-  }
-  for (int c = 0; c < m; ++c) {
-    int piv = c;
-    for (int r = c + 1; r < m; ++r)
-      if (std::fabs(a[r * (m + 1) + c]) > std::fabs(a[piv * (m + 1) + c])) piv = r;
-    if (a[piv * (m + 1) + c] == 0.0L) return false;
-    if (piv != c)
-      for (int j = 0; j <= m; ++j) std::swap(a[c * (m + 1) + j], a[piv * (m + 1) + j]);
-    const long double d = a[c * (m + 1) + c];
-    for (int j = 0; j <= m; ++j) a[c * (m + 1) + j] /= d;
-    for (int r = 0; r < m; ++r) {
-      if (r == c) continue;
-      const long double f = a[r * (m + 1) + c];
-      for (int j = 0; j <= m; ++j) a[r * (m + 1) + j] -= f * a[c * (m + 1) + j];
-    }
-  }
-  for (int i = 0; i < m; ++i) out[i] = static_cast<double>(a[i * (m + 1) + m]);
-  return true;
-}
-
 // Degree-2 fit, or the highest degree the number of points allows.
 bool fitSeries(const std::vector<double>& t, const std::vector<double>& v, double* coef) {
   coef[0] = coef[1] = coef[2] = 0.0;
   // Fewer blocks (or coincident times) than a parabola needs: lower degree.
-  for (int degree = std::min<int>(2, static_cast<int>(t.size()) - 1); degree >= 0; --degree) {
-    if (fitPolynomial(t, v, degree, coef)) return true;
+  const int n = static_cast<int>(t.size());
+  for (int degree = std::min(2, n - 1); degree >= 0; --degree) {
+    if (polfit(t.data(), v.data(), n, coef, degree) == 0) return true;
     coef[0] = coef[1] = coef[2] = 0.0;
   }
   return false;
