@@ -48,6 +48,7 @@ struct Service {
   bool measure = false;
   bool threadsReady = false;
   bool wisdomTried = false;
+  std::string wisdomPath;  // rewritten after each newly measured plan
 };
 
 Service& service() {
@@ -78,7 +79,12 @@ void prepareService(Service& s) {
   if (!s.wisdomTried) {
     s.wisdomTried = true;
     if (const char* path = std::getenv("TESSIVOR_FFTW_WISDOM")) {
-      if (*path) fftwf_import_wisdom_from_filename(path);
+      if (*path) {
+        // A wisdom file makes measuring worth its cost: it is paid once.
+        fftwf_import_wisdom_from_filename(path);
+        s.wisdomPath = path;
+        s.measure = true;
+      }
     }
   }
 }
@@ -92,6 +98,8 @@ std::size_t extentOf(int n, int howmany, int stride, int dist) {
   return static_cast<std::size_t>(howmany - 1) * static_cast<std::size_t>(dist) +
          static_cast<std::size_t>(n - 1) * static_cast<std::size_t>(stride) + 1;
 }
+
+constexpr std::size_t kMeasureLimit = std::size_t(128) << 20;
 
 // Makes one FFTW plan for the key. ESTIMATE and wisdom-only planning never
 // touch the arrays, so small dummy arrays stand in for the caller's data;
@@ -132,10 +140,16 @@ fftwf_plan createVariant(Service& s, const AxisKey& k, bool inPlace, bool aligne
     std::size_t inBytes = extentOf(k.n, k.howmany, k.istride, k.idist) * sizeof(fftwf_complex);
     std::size_t outBytes = extentOf(k.n, k.howmany, k.ostride, k.odist) * sizeof(fftwf_complex);
     if (inPlace) inBytes = outBytes = std::max(inBytes, outBytes);
-    FftwBuffer a(fftwf_malloc(inBytes));
-    FftwBuffer b(inPlace ? nullptr : fftwf_malloc(outBytes));
-    if (a && (inPlace || b)) {
-      if (fftwf_plan p = plan(a.get(), inPlace ? a.get() : b.get(), base | FFTW_MEASURE)) return p;
+    // Very large batches are not worth measuring.
+    if (inBytes + outBytes <= kMeasureLimit) {
+      FftwBuffer a(fftwf_malloc(inBytes));
+      FftwBuffer b(inPlace ? nullptr : fftwf_malloc(outBytes));
+      if (a && (inPlace || b)) {
+        if (fftwf_plan p = plan(a.get(), inPlace ? a.get() : b.get(), base | FFTW_MEASURE)) {
+          if (!s.wisdomPath.empty()) fftwf_export_wisdom_to_filename(s.wisdomPath.c_str());
+          return p;
+        }
+      }
     }
   }
   return plan(din, dout, base | FFTW_ESTIMATE);

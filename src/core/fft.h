@@ -139,11 +139,11 @@ using FFTBuffer = std::vector<fcomplex, FFTAllocator<fcomplex>>;
 void fft_set_threads(int threads);
 int fft_get_threads();
 
-// Wisdom: plans are made with FFTW_ESTIMATE unless wisdom for them has been
-// imported (then the measured plan is used without measuring again). The
-// file named by TESSIVOR_FFTW_WISDOM is imported on first use.
-// fft_set_measure(true) measures plans that have no wisdom yet (slow first
-// runs; planning then works on scratch arrays of the plan's full extent).
+// Planning: FFTW_ESTIMATE by default. When TESSIVOR_FFTW_WISDOM names a
+// file, its wisdom is imported on first use, plans it lacks are measured
+// (FFTW_MEASURE on scratch arrays, batches up to 128 MiB) and the file is
+// rewritten, so only the first run on a machine pays for measuring.
+// fft_set_measure(true) measures without a file.
 bool fft_import_wisdom(const std::string& path);
 bool fft_export_wisdom(const std::string& path);
 void fft_set_measure(bool measure);
