@@ -10,6 +10,7 @@
 #include "base/constants.h"
 #include "base/status.h"
 #include "diag/report.h"
+#include "numerics/root_finding.h"
 #include "product/byte_order.h"
 #include "product/time_base.h"
 
@@ -85,39 +86,6 @@ int nearestRecord(const std::vector<double>& times, double t) {
 // Lagrange interpolation of one axis-set of nine nodes at one time.
 void lagrange9(const double* pts, const double* times, double t, double out[3]) {
   interp_orb_Lagrange(pts, times, out, &t, 1);
-}
-
-// Bisection of f on [x1, x2] to tolerance tol; status 1 when the root is not
-// bracketed.
-template <class F>
-int bisectRoot(F f, double x1, double x2, double tol, double* root) {
-  double f1 = f(x1);
-  double f2 = f(x2);
-  if (f1 * f2 >= 0.0) {
-    ORV_REPORT("Root must be bracketed for bisection in rtbis", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
-  double dx, x;
-  if (f1 < 0.0) {
-    x = x1;
-    dx = x2 - x1;
-  } else {
-    x = x2;
-    dx = x1 - x2;
-  }
-  for (int j = 0; j < 60; ++j) {
-    dx *= 0.5;
-    double mid = x + dx;
-    double fm = f(mid);
-    if (fm <= 0.0) x = mid;
-    if (std::fabs(dx) < tol || fm == 0.0) {
-      *root = mid;
-      return STATUS_OK;
-    }
-  }
-  ORV_REPORT("Too many bisections in rtbis", REPORT_ERROR);
-  *root = x;
-  return STATUS_OK;
 }
 
 // ---- DORIS-type files ------------------------------------------------------
@@ -344,9 +312,12 @@ int interp_orb_l(const std::string& path, double t, int n, double dt, double* po
       return p[2];
     };
     double tn = nt[nodeRecord - ns];
-    double root = 0.0;
-    st = bisectRoot(z, tn - 180.0, tn, 1e-5, &root);
-    if (st != 0) return st;
+    int rst = 0;
+    const double root = rtbis(z, tn - 180.0, tn, 1e-5, &rst);
+    if (rst != 0) {
+      ORV_REPORT_CALLED_ERROR();
+      return rst;
+    }
     if (nodeOut) *nodeOut = root;
   }
   return STATUS_OK;
