@@ -152,14 +152,19 @@ ProfileFile& loadFile(const std::string& path) {
   return *pf;
 }
 
+// "\n[name]\n" for each section, "key = value\n" for each key, in file
+// order. Strings are written whole (a NUL read from a file goes back out).
 void writeProfile(std::FILE* fp, const ProfileFile& pf) {
+  auto put = [fp](const std::string& s) { std::fwrite(s.data(), 1, s.size(), fp); };
   for (const auto& s : pf.sections) {
-    std::fprintf(fp, "\n[%s]\n", s.name.c_str());
+    put("\n[");
+    put(s.name);
+    put("]\n");
     for (const auto& k : s.keys) {
-      std::fputs(k.key.c_str(), fp);
-      std::fputs(" = ", fp);
-      std::fputs(k.value.c_str(), fp);
-      std::fputc('\n', fp);
+      put(k.key);
+      put(" = ");
+      put(k.value);
+      put("\n");
     }
   }
 }

@@ -1,0 +1,222 @@
+// XML parameter documents: layout, channels, arrays, legacy flat form,
+// replacement of foreign files, and acceptance by xmllint.
+#include "product/orvane_xml.h"
+
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string>
+
+namespace {
+
+namespace fs = std::filesystem;
+
+class OrvaneXmlTest : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
+    dir = fs::path(::testing::TempDir()) /
+          ("params_xml_" + std::string(info->name()) + "_" + std::to_string(getpid()));
+    fs::remove_all(dir);
+    fs::create_directories(dir);
+  }
+  void TearDown() override { fs::remove_all(dir); }
+  std::string path(const std::string& name) const { return (dir / name).string(); }
+  std::string make(const std::string& name, const std::string& text) const {
+    std::string p = path(name);
+    std::ofstream(p, std::ios::binary) << text;
+    return p;
+  }
+  static std::string slurp(const std::string& p) {
+    std::ifstream in(p, std::ios::binary);
+    std::ostringstream ss;
+    ss << in.rdbuf();
+    return ss.str();
+  }
+  fs::path dir;
+};
+
+bool haveXmllint() { return std::system("command -v xmllint >/dev/null 2>&1") == 0; }
+
+// xmllint's verdict on a file: true when it parses as well-formed XML.
+bool xmllintAccepts(const std::string& file) {
+  const std::string cmd = "xmllint --noout '" + file + "' >/dev/null 2>&1";
+  return std::system(cmd.c_str()) == 0;
+}
+
+TEST_F(OrvaneXmlTest, NewDocumentLayoutAndChannels) {
+  const std::string f = path("doc.xml");
+  orvanexml doc(f);
+  EXPECT_TRUE(doc.isOpen());
+  EXPECT_FALSE(doc.isRecognised());
+  EXPECT_EQ(doc.getNumberOfChannels(), 0);
+  EXPECT_EQ(doc.getDescription(), "My description");
+  EXPECT_FALSE(fs::exists(f));  // nothing is saved without write()
+
+  // Channel 3 into an empty document: one channel, numbered 3.
+  const int memory = 256;
+  const double coeffs[] = {1.5, -0.25, 6378137.0};
+  const float gain = 0.1f;
+  const std::string names[] = {"first", "a & b <c>"};
+  ASSERT_EQ(doc.writeInt(3, "Tool/Memory", &memory, 1), 0);
+  ASSERT_EQ(doc.writeDouble(3, "Tool/Coeffs", coeffs, 3), 0);
+  ASSERT_EQ(doc.writeFloat(3, "Tool/Gain", &gain, 1), 0);
+  ASSERT_EQ(doc.writeString(3, "Tool/Name", names, 1), 0);
+  ASSERT_EQ(doc.writeString(1, "Other/Names", names, 2), 0);
+  EXPECT_EQ(doc.getNumberOfChannels(), 2);
+  ASSERT_EQ(doc.write(), 0);
+  EXPECT_EQ(slurp(f),
+            "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+            "<OrvaneXmlDoc>\n"
+            "  <NumberOfChannels>2</NumberOfChannels>\n"
+            "  <Description>My description</Description>\n"
+            "  <Channel Number=\"3\">\n"
+            "    <Tool>\n"
+            "      <Memory>256</Memory>\n"
+            "      <Coeffs>\n"
+            "        <val N=\"1\">1.5</val>\n"
+            "        <val N=\"2\">-0.25</val>\n"
+            "        <val N=\"3\">6378137</val>\n"
+            "      </Coeffs>\n"
+            "      <Gain>0.100000001490116</Gain>\n"
+            "      <Name>first</Name>\n"
+            "    </Tool>\n"
+            "  </Channel>\n"
+            "  <Channel Number=\"1\">\n"
+            "    <Other>\n"
+            "      <Names N=\"1\">first</Names>\n"
+            "      <Names N=\"2\">a &amp; b &lt;c&gt;</Names>\n"
+            "    </Other>\n"
+            "  </Channel>\n"
+            "</OrvaneXmlDoc>\n");
+  if (haveXmllint()) {
+    EXPECT_TRUE(xmllintAccepts(f));
+  }
+
+  // Read back through a fresh object.
+  orvanexml again(f);
+  EXPECT_TRUE(again.isRecognised());
+  EXPECT_EQ(again.getNumberOfChannels(), 2);
+  int m = 0;
+  double c[3] = {0, 0, 0};
+  float g = 0;
+  std::string s[2];
+  EXPECT_EQ(again.readInt(3, "Tool/Memory", &m, 1), 0);
+  EXPECT_EQ(m, 256);
+  EXPECT_EQ(again.readDouble(3, "Tool/Coeffs", c, 3), 0);
+  EXPECT_EQ(c[0], 1.5);
+  EXPECT_EQ(c[1], -0.25);
+  EXPECT_EQ(c[2], 6378137.0);
+  EXPECT_EQ(again.readFloat(3, "Tool/Gain", &g, 1), 0);
+  EXPECT_EQ(g, 0.1f);
+  EXPECT_EQ(again.readString(1, "Other/Names", s, 2), 0);
+  EXPECT_EQ(s[1], "a & b <c>");
+  // Wrong channel, missing element, too few strings: 1, targets untouched.
+  m = -7;
+  EXPECT_EQ(again.readInt(1, "Tool/Memory", &m, 1), 1);
+  EXPECT_EQ(again.readInt(3, "Tool/Nothing", &m, 1), 1);
+  EXPECT_EQ(m, -7);
+  EXPECT_EQ(again.readString(3, "Tool/Name", s, 2), 1);
+  EXPECT_EQ(again.countNodes(1, "Other/Names"), 2);
+  EXPECT_EQ(again.removeNodes(1, "Other"), 1);
+  EXPECT_EQ(again.countNodes(1, "Other/Names"), 0);
+}
+
+TEST_F(OrvaneXmlTest, LegacyFlatFormAndTooFewItems) {
+  const std::string f = make("legacy.xml",
+                             "<?xml version=\"1.0\"?>\n"
+                             "<OrvaneXmlDoc><NumberOfChannels>1</NumberOfChannels>"
+                             "<Description>old</Description>"
+                             "<Channel Number=\"1\"><Tool>"
+                             "<D>1.5, -2, 3e2</D><I>4, 5, 6</I><F>0.5, 0.25</F>"
+                             "<Short>1, 2</Short><Bad>1, x, 3</Bad>"
+                             "<Two><val N=\"1\">7</val></Two>"
+                             "</Tool></Channel></OrvaneXmlDoc>\n");
+  orvanexml doc(f);
+  ASSERT_TRUE(doc.isRecognised());
+  EXPECT_EQ(doc.getDescription(), "old");
+  double d[3] = {0, 0, 0};
+  EXPECT_EQ(doc.readDouble(1, "Tool/D", d, 3), 0);
+  EXPECT_EQ(d[0], 1.5);
+  EXPECT_EQ(d[1], -2.0);
+  EXPECT_EQ(d[2], 300.0);
+  int i[3] = {0, 0, 0};
+  EXPECT_EQ(doc.readInt(1, "Tool/I", i, 3), 0);
+  EXPECT_EQ(i[2], 6);
+  float fl[2] = {0, 0};
+  EXPECT_EQ(doc.readFloat(1, "Tool/F", fl, 2), 0);
+  EXPECT_EQ(fl[1], 0.25f);
+  EXPECT_EQ(doc.readInt(1, "Tool/Short", i, 3), 1);
+  EXPECT_EQ(doc.readInt(1, "Tool/Bad", i, 3), 1);
+  EXPECT_EQ(doc.readInt(1, "Tool/Two", i, 2), 1);  // one val for two items
+  EXPECT_EQ(i[0], 7);
+}
+
+TEST_F(OrvaneXmlTest, ForeignFilesAreReplacedAtTheNextWrite) {
+  const std::string notXml = make("text.xml", "this is not a parameter document\n");
+  const std::string otherRoot = make("other.xml", "<?xml version=\"1.0\"?><Root><A>1</A></Root>\n");
+  const std::string noDescription = make(
+      "nodesc.xml", "<OrvaneXmlDoc><NumberOfChannels>0</NumberOfChannels></OrvaneXmlDoc>");
+  for (const std::string& f : {notXml, otherRoot, noDescription, path("absent.xml")}) {
+    orvanexml doc(f);
+    EXPECT_TRUE(doc.isOpen()) << f;
+    EXPECT_FALSE(doc.isRecognised()) << f;
+    const int one = 1;
+    ASSERT_EQ(doc.writeInt(2, "X/Y", &one, 1), 0);
+    ASSERT_EQ(doc.write(), 0);
+    EXPECT_EQ(slurp(f),
+              "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+              "<OrvaneXmlDoc>\n"
+              "  <NumberOfChannels>1</NumberOfChannels>\n"
+              "  <Description>My description</Description>\n"
+              "  <Channel Number=\"2\">\n"
+              "    <X>\n"
+              "      <Y>1</Y>\n"
+              "    </X>\n"
+              "  </Channel>\n"
+              "</OrvaneXmlDoc>\n")
+        << f;
+  }
+}
+
+TEST_F(OrvaneXmlTest, DescriptionAndIndentationOfParsedDocuments) {
+  // A document saved by another writer with its own layout is re-indented.
+  const std::string f = make("flat.xml",
+                             "<OrvaneXmlDoc>  <NumberOfChannels>1</NumberOfChannels>\n\n"
+                             "<Description>d</Description><Channel Number=\"5\"><T><v>2</v>"
+                             "</T></Channel></OrvaneXmlDoc>");
+  orvanexml doc;
+  EXPECT_FALSE(doc.isOpen());
+  EXPECT_EQ(doc.setDescription(f, "Focusing parameters"), 0);
+  EXPECT_FALSE(doc.isOpen());
+  EXPECT_EQ(slurp(f),
+            "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
+            "<OrvaneXmlDoc>\n"
+            "  <NumberOfChannels>1</NumberOfChannels>\n"
+            "  <Description>Focusing parameters</Description>\n"
+            "  <Channel Number=\"5\">\n"
+            "    <T>\n"
+            "      <v>2</v>\n"
+            "    </T>\n"
+            "  </Channel>\n"
+            "</OrvaneXmlDoc>\n");
+  // Overwriting an array in place keeps one N per item.
+  ASSERT_EQ(doc.initXmlFile(f), 0);
+  const int a[] = {1, 2};
+  const int b[] = {3, 4, 5};
+  ASSERT_EQ(doc.writeInt(5, "T/arr", a, 2), 0);
+  ASSERT_EQ(doc.writeInt(5, "T/arr", b, 3), 0);
+  ASSERT_EQ(doc.write(), 0);
+  int back[3] = {0, 0, 0};
+  EXPECT_EQ(doc.readInt(5, "T/arr", back, 3), 0);
+  EXPECT_EQ(back[2], 5);
+  if (haveXmllint()) {
+    EXPECT_TRUE(xmllintAccepts(f));
+  }
+}
+
+}  // namespace
