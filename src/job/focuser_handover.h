@@ -1,0 +1,51 @@
+#pragma once
+#include <memory>
+#include <string>
+#include <vector>
+
+// Parameters the job driver hands to the multi-platform focuser, with the
+// focuser's defaults.
+struct FocuserJobFields {
+  int Memory = 256;
+  std::string ReportFilename = "ATmultiplatformFocuser.report";
+  int ReportLevel = 1;
+  int Incore = 0;
+  int Verbose = 1;
+  std::string processingConfFilename;
+  std::string platform;
+  std::string level0Filename;
+  std::string level0FilenameSecondPol;
+  std::string level0FilenameThirdPol;
+  std::string level0FilenameFourthPol;
+  std::string outputFilename;
+  std::string auxFile1, auxFile2, auxFile3, auxFile4, auxFile5;
+  std::string auxDirectory1, auxDirectory2, auxDirectory3, auxDirectory4, auxDirectory5;
+  int skipLines = 0;
+  int extractLines = 0;
+  int eraseTemporaryFiles = 0;
+};
+
+// The focuser as the job driver sees it: fields filled by the driver, then
+// checkpar, InitProcessing, run, FinalizeProcessing in this order; each
+// returns 0 on success. An implementation copies back into `job` what the
+// focuser found by itself (auxiliary files), since product finishing reads
+// those fields after FinalizeProcessing.
+class JobFocuser {
+ public:
+  virtual ~JobFocuser() = default;
+  virtual int checkpar() = 0;
+  virtual int InitProcessing() = 0;
+  virtual int run() = 0;
+  virtual int FinalizeProcessing(const char* file, int channel) = 0;
+
+  FocuserJobFields job;
+};
+
+// Builds the focuser of a job.
+std::unique_ptr<JobFocuser> makeJobFocuser();
+
+// Final names, parameter stores, headers and GeoTIFF of the products of a
+// finished job. `parameters` is the job (element 0 the platform), and
+// `alternatingPolarisation` the flag of the chosen profile.
+void finishJobProducts(const JobFocuser& focuser, const std::vector<std::string>& parameters,
+                       int alternatingPolarisation);

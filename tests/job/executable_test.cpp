@@ -1,0 +1,164 @@
+// The executable driven as the host drives it: TESSIVOR_* variables, a
+// command string, then the exit status and the files left behind. The
+// operating system keeps only the low 8 bits of the exit status, so each
+// code is checked in full in the _error file and the process log.
+#include <fcntl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <gtest/gtest.h>
+
+#include <map>
+
+#include "base/status.h"
+#include "job_test_support.h"
+
+namespace {
+
+const char* const kFocuser = TESSIVOR_BINARY_DIR "/bin/stripmap_focuser";
+
+struct FocuserRun {
+  int status = -1;  // exit status as the parent sees it
+  std::string stderrText;
+};
+
+// Runs the focuser in folder with the given variables (an empty value
+// leaves the variable unset).
+FocuserRun runFocuser(const std::string& folder, const std::string& command,
+               const std::map<std::string, std::string>& variables) {
+  const std::string errFile = folder + "stderr.txt";
+  pid_t pid = fork();
+  if (pid == 0) {
+    for (const char* name : {"TESSIVOR_WORKING_DIR", "TESSIVOR_WORKING_FILE",
+                             "TESSIVOR_CEOS_DES_FILES_DIR", "TESSIVOR_TRACING"})
+      unsetenv(name);
+    for (const auto& [name, value] : variables)
+      if (!value.empty()) setenv(name.c_str(), value.c_str(), 1);
+    if (chdir(folder.c_str()) != 0) _exit(126);
+    int fd = open(errFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
+    if (fd >= 0) dup2(fd, STDERR_FILENO);
+    execl(kFocuser, "stripmap_focuser", command.c_str(), static_cast<char*>(nullptr));
+    _exit(127);
+  }
+  FocuserRun run;
+  int status = 0;
+  if (pid > 0 && waitpid(pid, &status, 0) == pid && WIFEXITED(status)) run.status = WEXITSTATUS(status);
+  run.stderrText = readText(errFile);
+  return run;
+}
+
+std::map<std::string, std::string> hostVariables(const std::string& folder) {
+  return {{"TESSIVOR_WORKING_DIR", folder},
+          {"TESSIVOR_WORKING_FILE", folder + "progress.txt"},
+          {"TESSIVOR_CEOS_DES_FILES_DIR", TESSIVOR_SOURCE_DIR "/resources/"},
+          {"TESSIVOR_TRACING", "ACTIVE"}};
+}
+
+bool contains(const std::string& text, const std::string& part) {
+  return text.find(part) != std::string::npos;
+}
+
+}  // namespace
+
+TEST(FocuserExecutable, TooFewParametersEndWith456962) {
+  const std::string dir = freshFolder("exe");
+  std::vector<std::string> p = jobParameters("ERS", "/data/scene");
+  p.pop_back();  // 24 lines in all
+  writeJob(dir + "job.txt", p);
+  const FocuserRun run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt", hostVariables(dir));
+  EXPECT_EQ(run.status, EC_TOO_FEW_PARAMETERS & 0xFF);
+  EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 456962]"));
+  const std::string log = readText(dir + "Process.log");
+  EXPECT_TRUE(contains(log, "\nSTART : Focussing stripmap  [  ]\n"));
+  EXPECT_TRUE(contains(log, " Parameter 0 (ERS)\n"));
+  EXPECT_TRUE(contains(log, " Parameter 22 (NotOK)\n"));
+  EXPECT_TRUE(contains(log, "[ERROR ID : 456962]"));
+  EXPECT_FALSE(contains(log, "INPUT SATELLITE"));
+  EXPECT_TRUE(contains(run.stderrText, "Starting initalization phase\n"));
+  EXPECT_TRUE(contains(run.stderrText, "End of initalization phase\n"));
+}
+
+TEST(FocuserExecutable, WellFormedErsJobReachesTheHandOver) {
+  const std::string dir = freshFolder("exe");
+  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
+  const FocuserRun run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt###Tessivor###more",
+                             hostVariables(dir));
+  // 130560 is 510 x 256: the parent sees 0, the files tell the code.
+  EXPECT_EQ(run.status, EC_STAGE_FAILED & 0xFF);
+  EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 130560]"));
+  const std::string log = readText(dir + "Process.log");
+  EXPECT_TRUE(contains(log, "\nSTART : Focussing stripmap  [  ]\n"));
+  EXPECT_TRUE(contains(log,
+                       "\n\nINPUT SATELLITE  : [ ERS ]\nINPUT SCENE      : [ /data/scene ]\n"
+                       "INPUT SCENE_2    : [ NotOK ]\nINPUT SCENE_3    : [ NotOK ]\n"
+                       "INPUT SCENE_4    : [ NotOK ]\nOUTPUT ROOT NAME : [ /tmp/out ]\n"
+                       "INPUT FILE 1     : [ NotOK ]\nINPUT FILE 2     : [ NotOK ]\n"
+                       "INPUT FILE 3     : [ NotOK ]\nINPUT FILE 4     : [ NotOK ]\n"
+                       "INPUT FILE 5     : [ NotOK ]\nINPUT DIR 1      : [ NotOK ]\n"
+                       "INPUT DIR 2      : [ NotOK ]\nINPUT DIR 3      : [ NotOK ]\n"
+                       "INPUT DIR 4      : [ NotOK ]\nINPUT DIR 5      : [ NotOK ]\n"
+                       "SKIP LINES       : [ 0 ]\nEXTRACT LINES    : [ 0 ]\n"
+                       "ERASE TEMPORARY  : [ NotOK ]\n"));
+  EXPECT_TRUE(contains(log, "[ERROR ID : 130560]"));
+  EXPECT_TRUE(contains(log, "  checkpar() \n"));
+  const std::string trace = readText(dir + "Process.trace");
+  EXPECT_TRUE(contains(trace, "Orvane WARNING: ERS - line"));
+  EXPECT_TRUE(contains(trace, "\nERROR : "));
+}
+
+TEST(FocuserExecutable, UnknownPlatformAndUnsupportedEnvisatProductEndWith1) {
+  const std::string dir = freshFolder("exe");
+  writeJob(dir + "job.txt", jobParameters("SEASAT", "/data/scene"));
+  FocuserRun run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt", hostVariables(dir));
+  EXPECT_EQ(run.status, 1);
+  EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 1]"));
+  std::string log = readText(dir + "Process.log");
+  EXPECT_TRUE(contains(log, "INPUT SATELLITE  : [ SEASAT ]"));
+  EXPECT_TRUE(contains(log, "PROCESSING ERROR: Unknown platform - line"));
+  EXPECT_TRUE(contains(log, "[ERROR ID : 1]"));
+
+  writeText(dir + "scene.N1", std::string(200, 'x'));
+  writeJob(dir + "job.txt", jobParameters("ENVISAT", dir + "scene.N1"));
+  run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt", hostVariables(dir));
+  EXPECT_EQ(run.status, 1);
+  log = readText(dir + "Process.log");
+  EXPECT_TRUE(contains(log, "PROCESSING ERROR: File type not supported - line"));
+}
+
+TEST(FocuserExecutable, CommandStringNotUnderstoodEndsWith456963) {
+  const std::string dir = freshFolder("exe");
+  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
+  const FocuserRun run = runFocuser(dir, "main_focusing_stripmap#" + dir + "job.txt", hostVariables(dir));
+  EXPECT_EQ(run.status, EC_BAD_COMMAND & 0xFF);
+  EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 456963]"));
+  EXPECT_TRUE(contains(readText(dir + "Process.trace"), "main_focusing_stripmap#" + dir + "job.txt\n"));
+  EXPECT_TRUE(contains(readText(dir + "Process.log"), "[ERROR ID : 456963]"));
+  EXPECT_TRUE(contains(run.stderrText, "ERROR 456963"));
+}
+
+TEST(FocuserExecutable, JobFileLookupInTheWorkingFolder) {
+  const std::string dir = freshFolder("exe");
+  // Found by its name in TESSIVOR_WORKING_DIR.
+  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
+  FocuserRun run = runFocuser(dir, "main_focussing_stripmap#/elsewhere/job.txt", hostVariables(dir));
+  EXPECT_EQ(run.status, EC_STAGE_FAILED & 0xFF);
+  EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 130560]"));
+  // Nowhere: file not found.
+  run = runFocuser(dir, "main_focussing_stripmap#/elsewhere/absent.txt", hostVariables(dir));
+  EXPECT_EQ(run.status, EC_FILE_NOT_FOUND & 0xFF);
+  const std::string error = readText(dir + "progress.txt_error");
+  EXPECT_TRUE(contains(error, "/elsewhere/absent.txt"));
+  EXPECT_TRUE(contains(error, "[EC : 261122]"));
+}
+
+TEST(FocuserExecutable, UnsetVariablesFallBackToTheResourcesAndTheCurrentFolder) {
+  const std::string dir = freshFolder("exe");
+  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
+  const FocuserRun run = runFocuser(dir, "main_focussing_stripmap#job.txt", {});
+  EXPECT_EQ(run.status, EC_STAGE_FAILED & 0xFF);
+  // Catalogue texts found in the installed resources; logs and the _error
+  // file in the current folder.
+  EXPECT_TRUE(contains(readText(dir + "Process.log"), "FOCUSSING STAGE FAILED"));
+  EXPECT_TRUE(contains(readText(dir + "Tessivor_progress.txt_error"), "[EC : 130560]"));
+  EXPECT_FALSE(std::filesystem::exists(dir + "Process.trace"));
+}

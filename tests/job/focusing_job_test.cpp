@@ -1,0 +1,149 @@
+#include <gtest/gtest.h>
+
+#include <filesystem>
+
+#include "ingest/product_types.h"
+#include "job/focusing_job.h"
+#include "job_test_support.h"
+
+TEST(FocusingJob, LabelledLinesOfTheStartBanner) {
+  std::vector<std::string> p(24);
+  for (int i = 0; i < 24; ++i) p[i] = std::string(1, 'v').append(std::to_string(i));
+  EXPECT_EQ(jobLabelText(p),
+            "\nINPUT SATELLITE  : [ v0 ]\nINPUT SCENE      : [ v1 ]\nINPUT SCENE_2    : [ v2 ]\n"
+            "INPUT SCENE_3    : [ v3 ]\nINPUT SCENE_4    : [ v4 ]\nOUTPUT ROOT NAME : [ v5 ]\n"
+            "INPUT FILE 1     : [ v6 ]\nINPUT FILE 2     : [ v7 ]\nINPUT FILE 3     : [ v8 ]\n"
+            "INPUT FILE 4     : [ v9 ]\nINPUT FILE 5     : [ v10 ]\nINPUT DIR 1      : [ v11 ]\n"
+            "INPUT DIR 2      : [ v12 ]\nINPUT DIR 3      : [ v13 ]\nINPUT DIR 4      : [ v14 ]\n"
+            "INPUT DIR 5      : [ v15 ]\nSKIP LINES       : [ v16 ]\nEXTRACT LINES    : [ v17 ]\n"
+            "ERASE TEMPORARY  : [ v18 ]\n");
+}
+
+TEST(FocusingJob, FieldsFromTheParameters) {
+  std::vector<std::string> p = jobParameters("ERS", "/data/scene");
+  p[2] = "/data/second";
+  p[6] = "/orbits/ODR.007";
+  p[11] = "/orbits";
+  p[16] = "120";
+  p[17] = "3000x";
+  p[18] = "0";  // any text but NotOK switches erasing on
+  FocuserJobFields f;
+  fillFocuserFields(f, p, "/des/");
+  EXPECT_EQ(f.platform, "ERS");
+  EXPECT_EQ(f.level0Filename, "/data/scene");
+  EXPECT_EQ(f.level0FilenameSecondPol, "/data/second");
+  EXPECT_EQ(f.level0FilenameThirdPol, "");
+  EXPECT_EQ(f.outputFilename, "/tmp/out");
+  EXPECT_EQ(f.auxFile1, "/orbits/ODR.007");
+  EXPECT_EQ(f.auxFile2, "");
+  EXPECT_EQ(f.auxDirectory1, "/orbits");
+  EXPECT_EQ(f.auxDirectory2, "NotOK");  // directories are copied as they stand
+  EXPECT_EQ(f.skipLines, 120);
+  EXPECT_EQ(f.extractLines, 3000);
+  EXPECT_EQ(f.eraseTemporaryFiles, 1);
+  EXPECT_EQ(f.Incore, 0);
+  EXPECT_EQ(f.Verbose, 1);
+  EXPECT_EQ(f.Memory, 256);
+  EXPECT_EQ(f.ReportFilename, "ATmultiplatformFocuser.report");
+  p[18] = "NotOK";
+  fillFocuserFields(f, p, "/des/");
+  EXPECT_EQ(f.eraseTemporaryFiles, 0);
+
+  // ENVISAT: directories 2 to 4 with neither file nor folder given become
+  // the description-file folder; 1 and 5 never do.
+  p = jobParameters("ENVISAT", "/data/asar.N1");
+  p[8] = "/aux/xca";   // file 3 given
+  p[14] = "/aux/xch";  // folder 4 given
+  fillFocuserFields(f, p, "/des/");
+  EXPECT_EQ(f.auxDirectory1, "NotOK");
+  EXPECT_EQ(f.auxDirectory2, "/des/");
+  EXPECT_EQ(f.auxDirectory3, "NotOK");
+  EXPECT_EQ(f.auxDirectory4, "/aux/xch");
+  EXPECT_EQ(f.auxDirectory5, "NotOK");
+}
+
+TEST(FocusingJob, ProfileByPlatform) {
+  const struct {
+    const char* platform;
+    const char* profile;
+  } cases[] = {{"ERS", "/des/parameters_ERS.hdr"},
+               {"RADARSAT", "/des/parameters_RS.hdr"},
+               {"PALSAR", "/des/parameters_PALSAR.hdr"},
+               {"PALSAR_ERSDAC", "/des/parameters_PALSAR.hdr"}};
+  for (const auto& c : cases) {
+    FocuserJobFields f;
+    f.platform = c.platform;
+    int alternating = 7;
+    EXPECT_EQ(chooseParameterProfile(f, "/des/", alternating), 0);
+    EXPECT_EQ(f.processingConfFilename, c.profile);
+    EXPECT_EQ(alternating, 0);
+  }
+  for (const char* unknown : {"ers", "ERS ", "SENTINEL", ""}) {
+    FocuserJobFields f;
+    f.platform = unknown;
+    int alternating = 0;
+    EXPECT_EQ(chooseParameterProfile(f, "/des/", alternating), 1) << unknown;
+    EXPECT_EQ(f.processingConfFilename, "");
+  }
+}
+
+// An ENVISAT product head: "PRODUCT=\"" then the product name at offset 9.
+static void writeEnvisatHead(const std::string& file, const std::string& product) {
+  std::string head = "PRODUCT=\"" + product;
+  head.resize(200, ' ');
+  writeText(file, head);
+}
+
+TEST(FocusingJob, EnvisatProfileByProductType) {
+  const std::string dir = freshFolder("envisat");
+  const struct {
+    const char* product;
+    const char* profile;
+    int alternating;
+  } cases[] = {{"ASA_IM__0CNPDE20120329_071134_000000163113_00121_52721_6279.N1", "parameters_ENVISAT.hdr", 0},
+               {"ASA_APH_0PNPDE20040101_000000_000000162023_00001_09000_0001.N1", "parameters_AP.hdr", 1},
+               {"ASA_APV_0PNPDE20040101_000000_000000162023_00001_09000_0001.N1", "parameters_AP.hdr", 1},
+               {"ASA_APC_0PNPDE20040101_000000_000000162023_00001_09000_0001.N1", "parameters_AP.hdr", 1}};
+  for (const auto& c : cases) {
+    writeEnvisatHead(dir + "scene.N1", c.product);
+    FocuserJobFields f;
+    f.platform = "ENVISAT";
+    f.level0Filename = dir + "scene.N1";
+    int alternating = -1;
+    EXPECT_EQ(chooseParameterProfile(f, "/des/", alternating), 0) << c.product;
+    EXPECT_EQ(f.processingConfFilename, std::string("/des/") + c.profile);
+    EXPECT_EQ(alternating, c.alternating);
+  }
+  for (const char* other : {"ASA_IMS_1PNPDE20040101", "ASA_APP_1PNPDE20040101", "ASA_IM__1P"}) {
+    writeEnvisatHead(dir + "scene.N1", other);
+    FocuserJobFields f;
+    f.platform = "ENVISAT";
+    f.level0Filename = dir + "scene.N1";
+    int alternating = 0;
+    EXPECT_EQ(chooseParameterProfile(f, "/des/", alternating), 1) << other;
+  }
+  // A file too short for the field passes no test.
+  writeText(dir + "short.N1", "PRODUCT=\"ASA_IM__0");
+  EnvisatTypes shortFile(dir + "short.N1");
+  EXPECT_EQ(shortFile.is_im0(), 0);
+  EXPECT_EQ(EnvisatTypes(dir + "absent.N1").is_im0(), 0);
+}
+
+TEST(ProductTypes, RealEnvisatAndErsFiles) {
+  const std::string real = TESSIVOR_REALDATA_DIR;
+  if (!std::filesystem::exists(real)) GTEST_SKIP() << "real data folder absent";
+  const EnvisatTypes im0(real + "/envisat/ASA_IM__0CNPDE20120329_071134_000000163113_00121_52721_6279.N1");
+  EXPECT_EQ(im0.is_im0(), 1);
+  EXPECT_EQ(im0.is_aph() + im0.is_apv() + im0.is_apc(), 0);
+  const EnvisatTypes xca(real + "/envisat/ASA_XCA_AXVIEC20070517_153558_20070204_165113_20071231_000000");
+  EXPECT_EQ(xca.is_im0() + xca.is_aph() + xca.is_apv() + xca.is_apc(), 0);
+
+  // ERS-1 with a lower-case leader, ERS-2 with an upper-case one.
+  const ErsTypes ers1(real + "/ers1_2000_orbit44928");
+  EXPECT_EQ(ers1.leaderPath(), real + "/ers1_2000_orbit44928/lea_01.001");
+  EXPECT_EQ(ers1.is_ers1(), 1);
+  const ErsTypes ers2(real + "/ers2_2010_orbit77106/");
+  EXPECT_EQ(ers2.leaderPath(), real + "/ers2_2010_orbit77106/LEA_01.001");
+  EXPECT_EQ(ers2.is_ers1(), 0);
+  EXPECT_EQ(ErsTypes(real + "/envisat").is_ers1(), 0);
+}
