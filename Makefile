@@ -32,7 +32,9 @@ check: deps
 	@cd $(BUILD)-check && ASAN_OPTIONS=detect_leaks=1 ctest $(CTEST_ARGS) -LE heavy
 
 bench: build
-	@if [ -x $(BUILD)/bin/run_benchmarks ]; then $(BUILD)/bin/run_benchmarks; else echo "no benchmarks built"; fi
+	@found=0; for b in $(BUILD)/bin/bench_*; do \
+	  if [ -x "$$b" ]; then found=1; echo "== $$b"; "$$b" || exit 1; fi; \
+	done; if [ $$found = 0 ]; then echo "no benchmarks built"; fi
 
 demo: build
 	@if [ -x scripts/demo.sh ]; then bash scripts/demo.sh $(BUILD); else echo "no demo yet"; fi
