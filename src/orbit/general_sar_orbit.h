@@ -19,6 +19,8 @@ class polySL2THETA;
 class polySL2PHI;
 class polySL2GR;
 class polyGR2SL;
+class geoCoords_Obj;
+class GSRoi_Obj;
 
 class GeneralSAROrbit : public GeneralSAR_Base {
  public:
@@ -104,6 +106,10 @@ class GeneralSAROrbit : public GeneralSAR_Base {
   int SVGetFRpoly(const ROI_Obj* roi, const polyDC* dc, polyFR* fr);
   int SVGetFRpoly_v2(const ROI_Obj* roi, const polyDC* dc, polyFR* fr);
 
+  // Corners and centre of a region (fd 0, height 0), slots by flight
+  // direction; the first failure is passed on.
+  int SVGetGeoCoords(geoCoords_Obj* geo, GSRoi_Obj* roi);
+  int SVGetGeoCoords(geoCoords_Obj* geo, const ROI_Obj* roi);
   // Geolocation polynomials of a region (angle polynomials in radians of look
   // and sine of incidence; ground range in metres).
   int SVGetSlantToAnglesPolys(const ROI_Obj* roi, const polyDC* dc, polySL2THETA* theta,

@@ -1,0 +1,251 @@
+// Geolocation corners and polynomials of a region against direct queries of
+// the orbit model.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <vector>
+
+#include "orbit/general_sar_orbit.h"
+#include "orbit/geo_grid.h"
+#include "orbit/ground_geometry.h"
+#include "product/general_sar.h"
+#include "product/geo_coords.h"
+#include "product/poly_sar.h"
+#include "product/roi.h"
+
+namespace {
+
+constexpr double kLambda = 0.05656;
+constexpr double kT0 = 600000000.0;
+constexpr double kWe = 7.292115189334571e-5;
+
+// Earth-fixed circular orbit, 785 km, 98.5 degrees; phase picks the place
+// on the orbit (ascending near 0, descending near pi).
+void circular(double t, double phase, double p[3], double v[3]) {
+  const double a = 6378137.0 + 785000.0, n = std::sqrt(3.986004418e14 / (a * a * a));
+  const double inc = 98.5 * M_PI / 180.0, raan = 0.4;
+  const double u = phase + n * t;
+  const double xo = a * std::cos(u), yo = a * std::sin(u);
+  const double vxo = -a * n * std::sin(u), vyo = a * n * std::cos(u);
+  const double cO = std::cos(raan), sO = std::sin(raan), ci = std::cos(inc), si = std::sin(inc);
+  double pi[3] = {cO * xo - sO * ci * yo, sO * xo + cO * ci * yo, si * yo};
+  double vi[3] = {cO * vxo - sO * ci * vyo, sO * vxo + cO * ci * vyo, si * vyo};
+  const double g = kWe * t, c = std::cos(g), s = std::sin(g);
+  p[0] = c * pi[0] + s * pi[1];
+  p[1] = -s * pi[0] + c * pi[1];
+  p[2] = pi[2];
+  v[0] = c * vi[0] + s * vi[1] + kWe * p[1];
+  v[1] = -s * vi[0] + c * vi[1] - kWe * p[0];
+  v[2] = vi[2];
+}
+
+void makeOrbit(GeneralSAROrbit& o, double phase) {
+  o.setLambda(kLambda);
+  ASSERT_EQ(o.SVCreate(kT0, 5.0, 25), 0);
+  for (int i = 0; i < 25; ++i) circular(i * 5.0, phase, &o.pos[3 * i], &o.vel[3 * i]);
+  ASSERT_EQ(o.computeApproximateSV(), 0);
+}
+
+ROI_Obj sceneRoi() {
+  ROI_Obj r;
+  r.SetFastAxe(5.5e-3, 1.0 / 18.96e6, 5000);   // ~264 us of range
+  r.SetSlowAxe(kT0 + 30.0, 1.0 / 1680.0, 100000);  // ~60 s
+  return r;
+}
+
+polyDC doppler() {
+  polyDC dc;
+  dc.c[0] = 250.0;
+  dc.c[1] = 2.0e5;  // Hz per second of range time
+  dc.trg0 = 5.5e-3;
+  dc.taz0 = 0.0;
+  return dc;
+}
+
+}  // namespace
+
+TEST(GeoCoords, CornerSlotsFollowTheFlightDirection) {
+  for (double phase : {0.3, M_PI + 0.3}) {
+    GeneralSAROrbit o;
+    makeOrbit(o, phase);
+    const bool asc = o.isAscending();
+    EXPECT_EQ(asc, phase < 1.0);
+    GSRoi_Obj roi;
+    roi.roi = sceneRoi();
+    geoCoords_Obj geo;
+    ASSERT_EQ(o.SVGetGeoCoords(&geo, &roi), 0);
+    const ROI_Obj& r = roi.roi;
+    const double a0 = r.SlowStartTime, A = r.SlowTimeLength, r0 = r.FastStartTime, R = r.FastTimeLength;
+    auto check = [&](const geopoint& p, double t, double tau) {
+      double lat, lon, inc, look;
+      ASSERT_EQ(o.SVGetLatLon(t, tau, &lat, &lon), 0);
+      ASSERT_EQ(o.SVGetAngles(t, tau, &inc, &look), 0);
+      EXPECT_DOUBLE_EQ(p.lat, lat);
+      EXPECT_DOUBLE_EQ(p.lon, lon);
+      EXPECT_DOUBLE_EQ(p.incidence, inc);
+      EXPECT_DOUBLE_EQ(p.look, look);
+      EXPECT_EQ(p.height, 0.0);
+    };
+    if (asc) {
+      check(geo.NW, a0 + A, r0);
+      check(geo.NE, a0 + A, r0 + R);
+      check(geo.SW, a0, r0);
+      check(geo.SE, a0, r0 + R);
+    } else {
+      check(geo.NW, a0, r0 + R);
+      check(geo.NE, a0, r0);
+      check(geo.SW, a0 + A, r0 + R);
+      check(geo.SE, a0 + A, r0);
+    }
+    check(geo.center, a0 + A / 2, r0 + R / 2);
+    // The names hold: north above south, west of east (right-looking).
+    EXPECT_GT(geo.NW.lat, geo.SW.lat);
+    EXPECT_GT(geo.NE.lat, geo.SE.lat);
+    EXPECT_LT(geo.NW.lon, geo.NE.lon);
+    EXPECT_LT(geo.SW.lon, geo.SE.lon);
+  }
+}
+
+TEST(GeoPolys, MidAzimuthAngleAndGroundRangePolynomials) {
+  GeneralSAROrbit o;
+  makeOrbit(o, 0.3);
+  const ROI_Obj r = sceneRoi();
+  const polyDC dc = doppler();
+  const double tm = r.SlowStartTime + r.SlowTimeLength / 2;
+
+  polySL2PHI phi;
+  polySL2THETA theta;
+  theta.c[3] = 123.0;  // untouched when not asked for
+  ASSERT_EQ(o.SVGetSlantToAnglesPolys(&r, &dc, nullptr, &phi), 0);
+  EXPECT_EQ(theta.c[3], 123.0);
+  ASSERT_EQ(o.SVGetSlantToAnglesPolys(&r, &dc, &theta, &phi), 0);
+  EXPECT_EQ(phi.trg0, r.FastStartTime);
+  EXPECT_EQ(phi.taz0, 0.0);
+  EXPECT_EQ(phi.c[2], 0.0);
+  EXPECT_EQ(phi.c[3], 0.0);
+  for (double f : {0.0, 0.37, 1.0}) {
+    const double tau = r.FastStartTime + f * r.FastTimeLength;
+    double inc, look;
+    ASSERT_EQ(o.SVGetAngles(tm, tau, dc.EvaluatePoly(tau, tm), &inc, &look), 0);
+    // A quadratic across a whole ERS swath (look 16 to 23 degrees) is good
+    // to a few 1e-4 rad.
+    EXPECT_NEAR(phi.EvaluatePoly(tau, 0.0), std::sin(inc * M_PI / 180), 5e-4);
+    EXPECT_NEAR(theta.EvaluatePoly(tau, 0.0), look * M_PI / 180, 5e-4);
+  }
+
+  polySL2GR sl2gr;
+  polyGR2SL gr2sl;
+  ASSERT_EQ(o.SVGetGroundToSlantPolys(&r, &dc, &sl2gr, &gr2sl), 0);
+  // Ground range is far from linear near nadir: the quadratic is good to
+  // a few hundred metres over 105 km.
+  EXPECT_NEAR(sl2gr.EvaluatePoly(r.FastStartTime, 0.0), 0.0, 400.0);
+  // Ground width of the swath from the two edge points.
+  double g0[3], g1[3];
+  o.sat2earth(tm, r.FastStartTime, dc.EvaluatePoly(r.FastStartTime, tm), g0);
+  const double tauEnd = r.FastStartTime + r.FastTimeLength;
+  o.sat2earth(tm, tauEnd, dc.EvaluatePoly(tauEnd, tm), g1);
+  const double width = std::sqrt((g0[0] - g1[0]) * (g0[0] - g1[0]) + (g0[1] - g1[1]) * (g0[1] - g1[1]) +
+                                 (g0[2] - g1[2]) * (g0[2] - g1[2]));
+  EXPECT_NEAR(sl2gr.EvaluatePoly(tauEnd, 0.0), width, 400.0);
+  EXPECT_GT(width, 60e3);
+  // The inverse polynomial takes ground range back to slant offset.
+  EXPECT_NEAR(gr2sl.c[0] + gr2sl.c[1] * width + gr2sl.c[4] * width * width, r.FastTimeLength, 3e-6);
+
+  // Doppler rate polynomial against direct queries (0.1 %).
+  polyFR fr;
+  ASSERT_EQ(o.SVGetFRpoly(&r, &dc, &fr), 0);
+  polyFR fr2;
+  ASSERT_EQ(o.SVGetFRpoly_v2(&r, &dc, &fr2), 0);
+  EXPECT_EQ(fr2.trg0, dc.trg0);
+  for (double f : {0.0, 0.5, 1.0}) {
+    const double tau = r.FastStartTime + f * r.FastTimeLength;
+    double rate;
+    ASSERT_EQ(o.SVGetFR(tm, tau, dc.EvaluatePoly(tau, tm), &rate), 0);
+    EXPECT_NEAR(fr.EvaluatePoly(tau, 0.0), rate, 1e-3 * std::fabs(rate));
+    EXPECT_NEAR(fr2.EvaluatePoly(tau, 0.0), rate, 1e-3 * std::fabs(rate));
+    EXPECT_LT(rate, -1500.0);
+    EXPECT_GT(rate, -2600.0);
+  }
+}
+
+TEST(GeoPolys, WholeRegionPolynomials) {
+  GeneralSAROrbit o;
+  makeOrbit(o, M_PI + 0.3);
+  const ROI_Obj r = sceneRoi();
+  const polyDC dc = doppler();
+  polySL2GR sl2gr;
+  polyGR2SL gr2sl;
+  ASSERT_EQ(o.SVGetGroundToTimePolys(&r, &dc, &sl2gr, &gr2sl), 0);
+  EXPECT_EQ(sl2gr.trg0, r.FastStartTime);
+  EXPECT_EQ(sl2gr.taz0, r.SlowStartTime);
+  EXPECT_EQ(gr2sl.trg0, 0.0);
+  EXPECT_EQ(gr2sl.taz0, 0.0);
+  polySL2THETA theta;
+  polySL2PHI phi;
+  ASSERT_EQ(o.SVGetTimeToAnglesPolys(&r, &dc, &theta, &phi), 0);
+  for (double fa : {0.0, 0.4, 1.0}) {
+    const double t = r.SlowStartTime + fa * r.SlowTimeLength;
+    double first[3];
+    o.sat2earth(t, r.FastStartTime, dc.EvaluatePoly(r.FastStartTime, t), first);
+    for (double fr : {0.0, 0.3, 1.0}) {
+      const double tau = r.FastStartTime + fr * r.FastTimeLength;
+      // Ground range along the row: the sum of the grid's small chords is
+      // the arc, slightly more than the straight chord from the first point.
+      double g[3];
+      o.sat2earth(t, tau, dc.EvaluatePoly(tau, t), g);
+      const double chord = std::sqrt((g[0] - first[0]) * (g[0] - first[0]) +
+                                     (g[1] - first[1]) * (g[1] - first[1]) +
+                                     (g[2] - first[2]) * (g[2] - first[2]));
+      const double ground = sl2gr.EvaluatePoly(tau, t);
+      // Quartic in range over the whole swath: tens of metres.
+      EXPECT_NEAR(ground, chord, 60.0);
+      EXPECT_NEAR(gr2sl.EvaluatePoly(ground, t), tau, 1.5e-7);
+      double inc, look;
+      ASSERT_EQ(o.SVGetAngles(t, tau, dc.EvaluatePoly(tau, t), &inc, &look), 0);
+      EXPECT_NEAR(theta.EvaluatePoly(tau, t), look * M_PI / 180, 2e-4);
+      EXPECT_NEAR(phi.EvaluatePoly(tau, t), std::sin(inc * M_PI / 180), 2e-4);
+    }
+  }
+}
+
+TEST(GeoGrid, FreeFunctionsMatchTheOrbitObject) {
+  GeneralSAROrbit o;
+  makeOrbit(o, 0.3);
+  const polyDC dc = doppler();
+  const double svT0 = kT0 + 20.0;
+  double pos[15];
+  for (int k = 0; k < 15; ++k) pos[k] = o.pos[3 * 4 + k];  // vectors 4..8
+  const double fc = 299792458.0 / kLambda;
+  const double t = svT0 + 10.0, tau0 = 5.5e-3, dtau = 2e-5;
+  std::vector<double> fr(3 * 8), inc(3 * 8), look(3 * 8);
+  ASSERT_EQ(get_geo_grid(t, tau0, 3, 8, 0.5, dtau, fr.data(), inc.data(), look.data(), pos, svT0,
+                         5.0, fc, &dc, 1.0),
+            0);
+  for (int j = 0; j < 3; ++j)
+    for (int i = 0; i < 8; i += 3) {
+      const double tt = t + 0.5 * j, tau = tau0 + i * dtau;
+      double rate, in, lk;
+      ASSERT_EQ(o.SVGetFR(tt, tau, dc.EvaluatePoly(tau, tt), &rate), 0);
+      ASSERT_EQ(o.SVGetAngles(tt, tau, dc.EvaluatePoly(tau, tt), &in, &lk), 0);
+      EXPECT_NEAR(fr[8 * j + i], rate, 1e-6 * std::fabs(rate));
+      EXPECT_NEAR(inc[8 * j + i], in, 1e-6);
+      EXPECT_NEAR(look[8 * j + i], lk, 1e-6);
+    }
+  double pf[4], pi[4], pl[4];
+  ASSERT_EQ(get_poly(fr.data(), inc.data(), look.data(), 3, 8, dtau, 3, pf, pi, pl), 0);
+  EXPECT_NEAR(pi[0] + pi[1] * 7 * dtau + pi[2] * 49 * dtau * dtau, inc[8 + 7], 0.01);  // degrees, quadratic
+  EXPECT_EQ(get_poly(fr.data(), inc.data(), look.data(), 3, 8, dtau, 5, pf, pi, pl), 10);
+
+  ASSERT_EQ(getgeopoly(t, tau0, 5000, 18.96e6, pos, svT0, 5.0, fc, &dc, 1.0, 4, pf, pi, pl), 0);
+  const double tauMid = tau0 + 2500 / 18.96e6;
+  double in, lk, rate;
+  o.SVGetAngles(t, tauMid, dc.EvaluatePoly(tauMid, t), &in, &lk);
+  o.SVGetFR(t, tauMid, dc.EvaluatePoly(tauMid, t), &rate);
+  const double x = tauMid - tau0;
+  EXPECT_NEAR(pl[0] + x * (pl[1] + x * (pl[2] + x * pl[3])), lk, 0.005);  // degrees, cubic
+  EXPECT_NEAR(pf[0] + x * (pf[1] + x * (pf[2] + x * pf[3])), rate, 1e-3 * std::fabs(rate));
+  // A time outside the five vectors is refused by the ground-point record.
+  EXPECT_NE(get_geo_grid(svT0 + 60.0, tau0, 1, 2, 0.0, dtau, fr.data(), nullptr, nullptr, pos, svT0,
+                         5.0, fc, &dc, 1.0),
+            0);
+}
