@@ -192,9 +192,9 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     const int* shifts = work.incore ? work.shift.data() : fileShift.data();
 
     if (!work.incore) {
-      std::fill(work.data.begin(), work.data.begin() + static_cast<std::size_t>(N) * nl,
-                fcomplex(0.0f, 0.0f));
       for (int l = 0; l < nl; ++l) {
+        fcomplex* row = data + static_cast<std::size_t>(l) * N;
+        std::fill(row + S, row + N, fcomplex(0.0f, 0.0f));  // zero padding
         fileShift[l] = 0;
         if (work.prefix) {
           float swst = 0.0f;
@@ -204,7 +204,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
                          fileShift[l]))
             return RF_FAIL(wrongSwst(first + l).c_str(), STATUS_BAD_CONDITION);
         }
-        if (std::fread(data + static_cast<std::size_t>(l) * N, sizeof(fcomplex), S, in.get()) !=
+        if (std::fread(row, sizeof(fcomplex), S, in.get()) !=
             static_cast<std::size_t>(S))
           return RF_FAIL("File reading failed!", STATUS_READ_FAILED);
       }
