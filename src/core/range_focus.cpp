@@ -161,6 +161,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
         work.shift.size() < static_cast<std::size_t>(lines))
       return RF_FAIL("In-core buffer not prepared for range focusing", STATUS_BAD_CONDITION);
     P = lines;
+    work.linesPerBlock = lines;
     q = 0;
     passes = 1;
   } else {
