@@ -1,0 +1,304 @@
+// Physics of the simulated echoes: a plain time-domain focuser (chirp
+// correlation, then back-projection with the exact range history) puts a
+// target where the truth says; clutter and target spectra sit at the
+// Doppler centroid; rendering is deterministic.
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstring>
+#include <vector>
+
+#ifdef _OPENMP
+#include <omp.h>
+#endif
+
+#include "base/constants.h"
+#include "sim/raw_scene.h"
+#include "sim/sim_fft.h"
+
+namespace {
+
+constexpr double kC = 299792458.0;
+
+SceneDescription smallScene() {
+  SceneDescription s;
+  s.mission = "ERS2";
+  s.lines = 3200;
+  s.samples = 1024;
+  s.dopplerCentroidHz = 310.0;
+  return s;
+}
+
+// Range compression: correlation with the replica exp(j pi K t^2) of
+// n = round(fs T) samples centred on its middle; output m starts at the
+// replica's first sample.
+std::vector<cdouble> rangeCompress(const fcomplex* line, int samples, const RawSceneSimulator& sim) {
+  const int n = sim.replicaLength();
+  const double fs = sim.scene().samplingRateHz, K = sim.chirpRate();
+  const int N = nextPowerOfTwo(samples + n);
+  std::vector<cdouble> x(N), r(N);
+  for (int j = 0; j < samples; ++j) x[j] = cdouble(line[j].real(), line[j].imag());
+  for (int i = 0; i < n; ++i) {
+    const double t = (i - (n - 1) * 0.5) / fs;
+    r[i] = std::polar(1.0, M_PI * K * t * t);
+  }
+  simFft(x.data(), N, -1);
+  simFft(r.data(), N, -1);
+  for (int k = 0; k < N; ++k) x[k] *= std::conj(r[k]) / static_cast<double>(N);
+  simFft(x.data(), N, +1);
+  x.resize(samples - n + 1);
+  return x;
+}
+
+cdouble interpolate(const std::vector<cdouble>& v, double x) {
+  const int h = 16;
+  const int i0 = static_cast<int>(std::floor(x));
+  cdouble acc = 0.0;
+  for (int i = i0 - h + 1; i <= i0 + h; ++i) {
+    if (i < 0 || i >= static_cast<int>(v.size())) continue;
+    const double d = x - i;
+    const double s = d == 0.0 ? 1.0 : std::sin(M_PI * d) / (M_PI * d);
+    const double w = 0.5 * (1.0 + std::cos(M_PI * d / (h + 0.5)));
+    acc += v[i] * s * w;
+  }
+  return acc;
+}
+
+double parabolic(double a, double b, double c) { return 0.5 * (a - c) / (a - 2.0 * b + c); }
+
+}  // namespace
+
+TEST(SimEcho, TimeDomainFocuserPeaksAtTheTruthPosition) {
+  // Place a target through a pixel position, then simulate it again from
+  // its latitude and longitude alone: both truths must agree.
+  SceneDescription a = smallScene();
+  a.pixelTargets.push_back({1600.37, 300.61, 50.0, 1.0});
+  const TargetTruth placed = RawSceneSimulator(a).truth()[0];
+  EXPECT_NEAR(placed.line, 1600.37, 1e-4);
+  EXPECT_NEAR(placed.sample, 300.61, 1e-4);
+
+  SceneDescription s = smallScene();
+  s.targets.push_back({placed.latDeg, placed.lonDeg, placed.height, 1.0});
+  const RawSceneSimulator sim(s);
+  const TargetTruth t = sim.truth()[0];
+  EXPECT_NEAR(t.line, placed.line, 1e-4);
+  EXPECT_NEAR(t.sample, placed.sample, 1e-4);
+  ASSERT_GE(t.firstLine, 0);
+  ASSERT_LT(t.lastLine, s.lines);
+  EXPECT_GT(t.lastLine - t.firstLine, 1500);  // the synthetic aperture
+
+  std::vector<fcomplex> raw;
+  sim.renderLines(0, s.lines, raw);
+  std::vector<std::vector<cdouble>> rc(s.lines);
+  for (int k = t.firstLine; k <= t.lastLine; ++k) rc[k] = rangeCompress(raw.data() + static_cast<std::size_t>(k) * s.samples, s.samples, sim);
+
+  // Back-projection onto the zero-Doppler grid of (line, sample).
+  const double lambda = kC / sim.scene().carrierHz, fs = sim.scene().samplingRateHz, prf = sim.scene().prfHz;
+  std::vector<StateVector> sv(s.lines);
+  for (int k = t.firstLine; k <= t.lastLine; ++k) sv[k] = sim.orbit().at(s.startTime + k / prf);
+  auto image = [&](double line, double sample) {
+    const double tz = s.startTime + line / prf;
+    const double R = kC / 2.0 * (sim.swst() + (sample - sim.rangePeakOffset()) / fs);
+    double lat = 0, lon = 0;
+    EXPECT_TRUE(zeroDopplerPoint(sim.orbit(), tz, R, t.height, 1, lat, lon));
+    const Vec3 p = geodeticToEcef(lat, lon, t.height);
+    cdouble acc = 0.0;
+    for (int k = t.firstLine; k <= t.lastLine; ++k) {
+      const double Rk = norm(sv[k].pos - p);
+      const double x = (2.0 * Rk / kC - sim.swst()) * fs + sim.rangePeakOffset();
+      acc += interpolate(rc[k], x) * std::polar(1.0, 4.0 * M_PI * Rk / lambda);
+    }
+    return std::abs(acc);
+  };
+  const double step = 0.1;
+  const int h = 10;
+  std::vector<double> grid((2 * h + 1) * (2 * h + 1));
+  int bi = 0, bj = 0;
+  for (int i = -h; i <= h; ++i)
+    for (int j = -h; j <= h; ++j) {
+      const double v = image(std::round(t.line) + i * step, std::round(t.sample) + j * step);
+      grid[(i + h) * (2 * h + 1) + (j + h)] = v;
+      if (v > grid[(bi + h) * (2 * h + 1) + (bj + h)]) {
+        bi = i;
+        bj = j;
+      }
+    }
+  ASSERT_LT(std::abs(bi), h);
+  ASSERT_LT(std::abs(bj), h);
+  auto g = [&](int i, int j) { return grid[(i + h) * (2 * h + 1) + (j + h)]; };
+  const double peakLine = std::round(t.line) + (bi + parabolic(g(bi - 1, bj), g(bi, bj), g(bi + 1, bj))) * step;
+  const double peakSample = std::round(t.sample) + (bj + parabolic(g(bi, bj - 1), g(bi, bj), g(bi, bj + 1))) * step;
+  std::printf("time-domain focuser: peak offset %.4f lines, %.4f samples\n", peakLine - t.line, peakSample - t.sample);
+  EXPECT_NEAR(peakLine, t.line, 0.05);
+  EXPECT_NEAR(peakSample, t.sample, 0.05);
+}
+
+TEST(SimEcho, RangeCompressedPeakLiesAtTheDocumentedOffset) {
+  // One line at the beam centre: the correlation peaks (fs T - (n - 1)) / 2
+  // samples after the two-way delay of that line.
+  SceneDescription s = smallScene();
+  s.dopplerCentroidHz = 0.0;
+  s.pixelTargets.push_back({1600.0, 250.3, 0.0, 1.0});
+  const RawSceneSimulator sim(s);
+  const TargetTruth t = sim.truth()[0];
+  EXPECT_NEAR(sim.rangePeakOffset(), (s.samplingRateHz * s.pulseLength - (sim.replicaLength() - 1)) / 2.0, 1e-3);
+  EXPECT_EQ(sim.replicaLength(), 704);
+  std::vector<fcomplex> raw;
+  sim.renderLines(1600, 1, raw);
+  const std::vector<cdouble> rc = rangeCompress(raw.data(), s.samples, sim);
+  int m = 0;
+  for (int k = 0; k < static_cast<int>(rc.size()); ++k)
+    if (std::abs(rc[k]) > std::abs(rc[m])) m = k;
+  // Sub-sample peak by a fine search of the interpolated correlation.
+  double best = m, bestV = 0.0;
+  for (double x = m - 1.0; x <= m + 1.0; x += 0.001) {
+    const double v = std::abs(interpolate(rc, x));
+    if (v > bestV) {
+      bestV = v;
+      best = x;
+    }
+  }
+  const StateVector sv = sim.orbit().at(s.startTime + 1600.0 / s.prfHz);
+  const double tau = 2.0 * norm(sv.pos - t.position) / kC;
+  EXPECT_NEAR(best, (tau - sim.swst()) * s.samplingRateHz + sim.rangePeakOffset(), 0.02);
+  // Carrier phase at the peak: -4 pi R / lambda.
+  const double lambda = kC / s.carrierHz;
+  EXPECT_NEAR(std::remainder(std::arg(interpolate(rc, best)) + 4.0 * M_PI * norm(sv.pos - t.position) / lambda, 2 * M_PI),
+              0.0, 0.02);
+}
+
+TEST(SimEcho, SpectraSitAtTheDopplerCentroidAndClutterHasItsPower) {
+  for (double fdc : {-420.0, 0.0, 560.0}) {
+    SceneDescription s = smallScene();
+    s.lines = 1024;
+    s.samples = 800;
+    s.dopplerCentroidHz = fdc;
+    s.clutterSigma = 3.0;
+    const RawSceneSimulator clutter(s);
+    std::vector<fcomplex> x;
+    clutter.renderLines(0, s.lines, x);
+    std::complex<double> acc = 0.0;
+    double power = 0.0;
+    for (int k = 0; k + 1 < s.lines; ++k)
+      for (int j = 0; j < s.samples; ++j) {
+        const std::size_t i = static_cast<std::size_t>(k) * s.samples + j;
+        acc += std::complex<double>(x[i + s.samples]) * std::conj(std::complex<double>(x[i]));
+        power += std::norm(std::complex<double>(x[i]));
+      }
+    power /= static_cast<double>(s.lines - 1) * s.samples;
+    EXPECT_NEAR(std::arg(acc) / (2.0 * M_PI) * s.prfHz, fdc, 10.0) << "clutter";
+    EXPECT_NEAR(power, 2.0 * 9.0, 0.9);
+
+    SceneDescription p = smallScene();
+    p.dopplerCentroidHz = fdc;
+    p.pixelTargets.push_back({1600.0, 100.0, 0.0, 1.0});
+    const RawSceneSimulator point(p);
+    point.renderLines(0, p.lines, x);
+    acc = 0.0;
+    for (int k = 0; k + 1 < p.lines; ++k)
+      for (int j = 0; j < p.samples; ++j) {
+        const std::size_t i = static_cast<std::size_t>(k) * p.samples + j;
+        acc += std::complex<double>(x[i + p.samples]) * std::conj(std::complex<double>(x[i]));
+      }
+    EXPECT_NEAR(std::arg(acc) / (2.0 * M_PI) * p.prfHz, fdc, 10.0) << "point target";
+    // The echo is strongest where the Doppler equals the centroid.
+    const TargetTruth t = point.truth()[0];
+    int best = 0;
+    double bestE = 0.0;
+    for (int k = 0; k < p.lines; ++k) {
+      double e = 0.0;
+      for (int j = 0; j < p.samples; ++j) e += std::norm(x[static_cast<std::size_t>(k) * p.samples + j]);
+      if (e > bestE) {
+        bestE = e;
+        best = k;
+      }
+    }
+    EXPECT_NEAR(best, (t.beamCentreTime - p.startTime) * p.prfHz, 3.0);
+  }
+}
+
+TEST(SimEcho, RenderingIsIndependentOfBlocksAndThreads) {
+  SceneDescription s = smallScene();
+  s.lines = 3000;
+  s.samples = 900;
+  s.clutterSigma = 2.0;
+  s.noiseSigma = 1.0;
+  s.pixelTargets.push_back({1400.0, 80.0, 0.0, 3.0});
+  s.pixelTargets.push_back({1500.0, 120.0, 0.0, 2.0});
+  const RawSceneSimulator sim(s);
+  std::vector<fcomplex> whole, part1, part2;
+  sim.renderLines(1200, 96, whole);
+  sim.renderLines(1200, 37, part1);
+  sim.renderLines(1237, 59, part2);
+  part1.insert(part1.end(), part2.begin(), part2.end());
+  ASSERT_EQ(whole.size(), part1.size());
+  EXPECT_EQ(0, std::memcmp(whole.data(), part1.data(), whole.size() * sizeof(fcomplex)));
+#ifdef _OPENMP
+  const int threads = omp_get_max_threads();
+  omp_set_num_threads(1);
+  std::vector<fcomplex> serial;
+  sim.renderLines(1200, 96, serial);
+  omp_set_num_threads(std::max(2, threads));
+  EXPECT_EQ(0, std::memcmp(whole.data(), serial.data(), whole.size() * sizeof(fcomplex)));
+  omp_set_num_threads(threads);
+#endif
+}
+
+TEST(SimEcho, QuantisesToFiveBitOffsetBytes) {
+  SceneDescription s = smallScene();
+  s.biasI = -0.258;
+  s.biasQ = -9999999.9999999;  // absent: no bias
+  const RawSceneSimulator sim(s);
+  std::vector<fcomplex> line(s.samples, fcomplex(0.0f, 0.0f));
+  line[0] = {0.0f, -0.01f};
+  line[1] = {100.0f, -100.0f};
+  line[2] = {3.2f, -3.7f};
+  std::vector<unsigned char> iq(2 * s.samples);
+  sim.quantiseLine(line.data(), iq.data());
+  EXPECT_EQ(iq[0], 15);  // 0 - 0.258 lies nearest to level 15 - 15.5
+  EXPECT_EQ(iq[1], 15);
+  EXPECT_EQ(iq[2], 31);
+  EXPECT_EQ(iq[3], 0);
+  EXPECT_EQ(iq[4], 18);  // 3.2 - 0.258 = 2.942 -> level 2.5
+  EXPECT_EQ(iq[5], 12);  // -3.7 -> level -3.5
+  for (unsigned char b : iq) EXPECT_LE(b, 31);
+}
+
+TEST(SimGeometry, OrbitTimeAndGeodesyAreConsistent) {
+  // Calendar.
+  double t = 0.0;
+  ASSERT_TRUE(simParseDate("17-FEB-2000 09:57:26.417", t));
+  EXPECT_EQ(simDateText(t), "17-FEB-2000 09:57:26.417");
+  EXPECT_EQ(simCompactDateText(t), "20000217095726417");
+  EXPECT_DOUBLE_EQ(simSec85({2000, 1, 1, 0, 0, 0.0}), 5478.0 * 86400.0);
+  EXPECT_EQ(simDayOfYear(2000, 2, 17), 48);
+  EXPECT_FALSE(simParseDate("17-FOO-2000 09:57:26", t));
+  // Orbit: velocity is the derivative of position; Earth-fixed speed and
+  // radius stay in the ERS range.
+  const SimOrbit orbit(KeplerElements{});
+  const StateVector a = orbit.at(100.0), b = orbit.at(100.001), c = orbit.at(99.999);
+  for (int k = 0; k < 3; ++k) EXPECT_NEAR((b.pos[k] - c.pos[k]) / 0.002, a.vel[k], 1e-4);
+  EXPECT_NEAR(norm(a.pos), 7.16e6, 2e4);
+  EXPECT_NEAR(norm(a.vel), 7.55e3, 1e2);
+  // Inertial energy is conserved over half an orbit.
+  auto energy = [](const StateVector& s) {
+    const Vec3 vi{s.vel[0] - 7.292115189334571e-5 * s.pos[1], s.vel[1] + 7.292115189334571e-5 * s.pos[0], s.vel[2]};
+    return 0.5 * dot(vi, vi) - 3.986004418e14 / norm(s.pos);
+  };
+  EXPECT_NEAR(energy(orbit.at(0.0)), energy(orbit.at(3000.0)), 1e-3);
+  // Geodesy round trips.
+  double lat = 0, lon = 0, hh = 0;
+  ecefToGeodetic(geodeticToEcef(41.851, 12.03, 785000.0), lat, lon, hh);
+  EXPECT_NEAR(lat, 41.851, 1e-10);
+  EXPECT_NEAR(lon, 12.03, 1e-10);
+  EXPECT_NEAR(hh, 785000.0, 1e-5);
+  const Vec3 p = a.pos;
+  ecefToDeos(p, lat, lon, hh);
+  const Vec3 q = deosToEcef(lat, lon, hh);
+  EXPECT_NEAR(norm(p - q), 0.0, 1e-5);
+  // Closest approach: the range rate vanishes there.
+  const Vec3 target = geodeticToEcef(45.0, 10.0, 0.0);
+  const double tc = closestApproachTime(orbit, target, 0.0);
+  const StateVector sc = orbit.at(tc);
+  EXPECT_NEAR(dot(sc.pos - target, sc.vel) / norm(sc.pos - target), 0.0, 1e-6);
+}
