@@ -428,10 +428,15 @@ int groundPointProperties(grPtRecord* rec, const double S[3], const double V[3],
   const double nv = dot3(n, Vi);
   const double gRaw[3] = {Vi[0] - n[0] * nv, Vi[1] - n[1] * nv, Vi[2] - n[2] * nv};
   make_versor(gRaw, g);
-  const double xy = X[0] / X[1];
-  const double en = std::sqrt(1.0 + xy * xy);
-  e[0] = 1.0 / en;
-  e[1] = -xy / en;
+  if (X[1] != 0.0) {
+    const double xy = X[0] / X[1];
+    const double en = std::sqrt(1.0 + xy * xy);
+    e[0] = 1.0 / en;
+    e[1] = -xy / en;
+  } else {  // limit of the same vector for y -> 0+
+    e[0] = 0.0;
+    e[1] = (X[0] > 0.0) ? -1.0 : 1.0;
+  }
   e[2] = 0.0;
   const double ge = dot3(g, e);
   const double mRaw[3] = {g[0] - e[0] * ge, g[1] - e[1] * ge, g[2] - e[2] * ge};
