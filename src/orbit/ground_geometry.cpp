@@ -322,7 +322,7 @@ int inverseNewton(double* t, double* tau, const double* cx, const double* cy, co
   const double h = lambda * fd / 2.0;
   double tauK = 0.0;
   for (int round = 0; round < rounds; ++round) {
-    if (u < 0.0 || u > tMax) {
+    if (!(u >= 0.0 && u <= tMax)) {  // also stops on a not-a-number iterate
       if (speak)
         std::fprintf(stderr, "inv_grpt: azimuth time %g s outside the orbit span 0 .. %g s\n", u,
                      tMax);

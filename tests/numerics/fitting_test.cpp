@@ -148,6 +148,33 @@ TEST(LinearFits, LfitModAndSvdfitAgreeOnANoisyLine) {
             1);
 }
 
+TEST(LinearFits, SvdfitDropsADegenerateBasisTerm) {
+  // Basis 1, x, 2x: the third term duplicates the second. The SVD fit zeroes
+  // the null direction and still reproduces the line exactly.
+  const int nd = 8;
+  NrVector<double> x(1, nd), y(1, nd), sig(1, nd, 1.0), a(1, 3), w(1, 3);
+  for (int i = 1; i <= nd; ++i) {
+    x[i] = i;
+    y[i] = 1.0 + 3.0 * i;
+  }
+  NrMatrix<double> u(1, nd, 1, 3), v(1, 3, 1, 3);
+  double chisq = -1;
+  ASSERT_EQ(svdfit(x, y, sig, nd, a, 3, u, v, w, &chisq,
+                   [](double xv, NrVector<double>& af, int) {
+                     af[1] = 1.0;
+                     af[2] = xv;
+                     af[3] = 2.0 * xv;
+                   }),
+            0);
+  EXPECT_NEAR(a[1], 1.0, 1e-12);
+  EXPECT_NEAR(a[2] + 2.0 * a[3], 3.0, 1e-12);
+  EXPECT_NEAR(a[3], 2.0 * a[2], 1e-12);  // minimum-norm split
+  EXPECT_LT(chisq, 1e-20);
+  int zeros = 0;
+  for (int j = 1; j <= 3; ++j) zeros += (w[j] == 0.0);
+  EXPECT_EQ(zeros, 1);
+}
+
 TEST(RootFinding, RtbisFindsBracketedRootsAndRefusesOthers) {
   int status = -1;
   const double r = rtbis([](double x) { return x * x - 2.0; }, 0.0, 3.0, 1e-10, &status);

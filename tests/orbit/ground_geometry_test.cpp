@@ -295,6 +295,9 @@ TEST(InverseSolution, ReturnsAzimuthAndRangeTimeOfAGroundPoint) {
   ASSERT_EQ(gr_pt(X, S, V, tauOf(850e3), 0.0, kLambda, 0.0, 1.0, kA, kB), 0);
   EXPECT_EQ(inv_grpt_opt(&t, &tau, cx, cy, cz, X, 4 * dt, kLambda, 0.0), 12);
   EXPECT_EQ(inv_grpt(&t, &tau, pts, X, dt, kLambda, 0.0), 12);
+  // A point that is not a number never comes back as a solution.
+  const double bad[3] = {std::nan(""), 0.0, 0.0};
+  EXPECT_EQ(inv_grpt_opt(&t, &tau, cx, cy, cz, bad, 4 * dt, kLambda, 0.0), 12);
 }
 
 TEST(GroundPointRecord, AnglesSpeedsAndDopplerRate) {
