@@ -345,16 +345,19 @@ double GeneralSAROrbit::sat2earthY(double t, double tau) { return sat2earthY(t, 
 double GeneralSAROrbit::sat2earthZ(double t, double tau) { return sat2earthZ(t, tau, 0.0); }
 
 double GeneralSAROrbit::sat2earthX(double t, double tau, double h) {
+  if (pos.empty() || updatePolys(t) != 0) return 0.0;
   grPtRecord rec;
   int st = recordQuery(t, tau, 0.0, h, &rec);
   return st != 0 ? static_cast<double>(st) : rec.x;
 }
 double GeneralSAROrbit::sat2earthY(double t, double tau, double h) {
+  if (pos.empty() || updatePolys(t) != 0) return 0.0;
   grPtRecord rec;
   int st = recordQuery(t, tau, 0.0, h, &rec);
   return st != 0 ? static_cast<double>(st) : rec.y;
 }
 double GeneralSAROrbit::sat2earthZ(double t, double tau, double h) {
+  if (pos.empty() || updatePolys(t) != 0) return 0.0;
   grPtRecord rec;
   int st = recordQuery(t, tau, 0.0, h, &rec);
   return st != 0 ? static_cast<double>(st) : rec.z;

@@ -235,6 +235,8 @@ TEST(GeneralSAROrbit, RecordQueriesAgreeWithTheGeometry) {
   EXPECT_NEAR(o.sat2earthX(t, tau), g[0], 1e-3);
   EXPECT_NEAR(o.sat2earthY(t, tau), g[1], 1e-3);
   EXPECT_NEAR(o.sat2earthZ(t, tau), g[2], 1e-3);
+  GeneralSAROrbit empty;
+  EXPECT_EQ(empty.sat2earthX(t, tau), 0.0);
   // On an ellipsoid raised by 500 m the point moves but stays at the range.
   double gh[3] = {o.sat2earthX(t, tau, 500.0), o.sat2earthY(t, tau, 500.0), o.sat2earthZ(t, tau, 500.0)};
   double S[3];
@@ -430,6 +432,15 @@ TEST(GeneralSAROrbitLoaders, RealDorisAndDeosFiles) {
   ASSERT_EQ(interp_orb_l(dor, o.t0 + 12.5, 1, 5.0, pos, vt), 0);
   EXPECT_LT(dist(v, vt), 1e-3);
   EXPECT_EQ(o.GetStateVectorsENVI(dor, t + 86400.0 * 3, 16.0), 13);
+  // The older object: n vectors centred on the scene, one polynomial.
+  SAROrbitStateVectors_Obj sv;
+  ASSERT_EQ(GetStateVectorsENVI(dor, t, 16.0, 7, &sv), 0);
+  EXPECT_DOUBLE_EQ(sv.t0, t + 8.0 - 15.0);
+  double ps[3], pw[3];
+  sv.SVGetPos(t + 8.0, ps);
+  o.GetStateVectorsENVI(dor, t, 16.0);
+  o.SVGetPos(t + 8.0, pw);
+  EXPECT_LT(dist(ps, pw), 1e-3);
 
   const std::string ers1 = dir + "ers1_ODR.079";
   const double te = ascii2sec85("13-APR-1992 08:00:00.000000");
