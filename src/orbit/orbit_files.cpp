@@ -382,10 +382,14 @@ int readOdr(const std::string& path, OdrHeader& h, OrbitRecords& out) {
   h.satellite.assign(reinterpret_cast<char*>(head) + 4, 8);
   h.firstTime = ch2int4(head + 12, kMsbFirst);
   h.count = ch2int4(head + 24, kMsbFirst);
-  if (h.count < 0 || h.count > 10000000) {
+  if (h.count < 0) {
     ORV_REPORT(fmt("Bad record count in DEOS orbit file %s", path), REPORT_ERROR);
     return STATUS_READ_FAILED;
   }
+  // A count beyond the end of the file is a short read.
+  if (std::fseek(f.get(), 0, SEEK_END) != 0 ||
+      std::ftell(f.get()) < 32 + 16 * static_cast<long>(h.count))
+    return reportReadFailed(path);
   const double scale = h.id == "@ODR" ? 1e-6 : 1e-7;
   std::vector<unsigned char> recs(static_cast<std::size_t>(h.count) * 16);
   if (!recs.empty() && !readAt(f.get(), 32, recs.data(), recs.size())) return reportReadFailed(path);
