@@ -1,5 +1,6 @@
 #include "orbit/general_sar_orbit.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <cstring>
@@ -440,7 +441,10 @@ int GeneralSAROrbit::earth2satLinear(const double P[3], double* t, double* tau, 
   for (int k = 0; k < 3; ++k) d[k] = P[k] - pos[k];
   transposeMul(approxRotation, d, q);
   double u = lineTime(q, fd, lambda, approxSpeed);
-  int i = roundAway(u / dt) - 2;
+  // Window index, clamped in floating point first so that a degenerate
+  // table (no motion: not-a-number) cannot overflow the conversion.
+  const double ui = std::isfinite(u / dt) ? std::clamp(u / dt, -1e9, 1e9) : 0.0;
+  int i = roundAway(ui) - 2;
   if (i < 1) i = 0;
   if (i > nSV - 5) i = nSV - 5;
   const std::size_t o = 3 * static_cast<std::size_t>(i);
