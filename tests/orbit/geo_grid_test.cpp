@@ -103,6 +103,9 @@ TEST(GeoCoords, CornerSlotsFollowTheFlightDirection) {
     EXPECT_GT(geo.NE.lat, geo.SE.lat);
     EXPECT_LT(geo.NW.lon, geo.NE.lon);
     EXPECT_LT(geo.SW.lon, geo.SE.lon);
+    // A region far past the table fails with the status of the first corner.
+    roi.roi.SetSlowAxe(kT0 + 1000.0, 1.0 / 1680.0, 1000);
+    EXPECT_NE(o.SVGetGeoCoords(&geo, &roi), 0);
   }
 }
 
