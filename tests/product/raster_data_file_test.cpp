@@ -184,6 +184,38 @@ TEST(RasterDataFile, ReadConversionTableIsPinned) {
   }
 }
 
+TEST(RasterDataFile, WriteConversionTableMirrorsTheReadTable) {
+  const std::string dir = tempDir();
+  for (int mt = 0; mt < 8; ++mt) {
+    const Layout src{mt, false, 1, 5, 0, 0};
+    const std::vector<unsigned char> mem = referenceRaster(src);
+    for (int ft = 0; ft < 8; ++ft) {
+      SCOPED_TRACE("memory " + std::to_string(mt) + " file " + std::to_string(ft));
+      DataFile f;
+      f.filename = dir + "/m" + std::to_string(mt) + "f" + std::to_string(ft);
+      f.CellType = ft;
+      f.NrOfPixelsPerLine = 5;
+      f.NrOfLinesPerImage = 1;
+      BufferIO io{&f, 0, 5, 0, 1, mt};
+      ASSERT_EQ(io.writebuffer(mem.data()), STATUS_OK);
+      ASSERT_EQ(f.close(), STATUS_OK);
+      const std::vector<unsigned char> bytes = slurp(f.filename);
+      const TypeInfo fi = typeInfo(ft);
+      ASSERT_EQ(bytes.size(), size_t(5 * fi.bytes * fi.parts));
+      const bool served = kReadPairs[ft][mt] == 1;
+      const bool mc = typeInfo(mt).parts == 2;
+      for (int c = 0; c < 5; ++c) {
+        // Complex to real keeps the real part; real to complex has im 0; an
+        // unserved pair leaves the row as allocated (zeros).
+        EXPECT_EQ(component(bytes.data(), ft, size_t(c), 0), served ? pixelValue(0, c, 0) : 0.0);
+        if (fi.parts == 2) {
+          EXPECT_EQ(component(bytes.data(), ft, size_t(c), 1), served && mc ? pixelValue(0, c, 1) : 0.0);
+        }
+      }
+    }
+  }
+}
+
 TEST(RasterDataFile, WriteConversionsRoundHalfAwayFromZero) {
   const std::string dir = tempDir();
   const std::vector<float> values = {2.5f, -2.5f, 1.49f, -0.5f, 0.5f, -1.5f, 3.0f, 70000.0f};
