@@ -106,6 +106,21 @@ TEST(Remez, HilbertTransformerIsAntisymmetricWithUnitGain) {
   for (double f = 0.05; f <= 0.45; f += 0.01) EXPECT_NEAR(std::abs(response(h, f)), 1.0, 0.02);
 }
 
+TEST(Remez, DifferentiatorHasAResponseProportionalToFrequency) {
+  // Desired slope 1: H(f) = j f within the band, for odd and even lengths.
+  for (int n : {31, 32}) {
+    const double bands[2] = {0.0, 0.45}, des[1] = {1.0}, wt[1] = {1.0};
+    std::vector<double> h(n);
+    ASSERT_EQ(remez_(h.data(), n, 1, bands, des, wt, REMEZ_DIFFERENTIATOR), 0);
+    for (int k = 0; k < n; ++k) EXPECT_NEAR(h[k], -h[n - 1 - k], 1e-15);
+    for (double f = 0.05; f <= 0.4; f += 0.05) {
+      const std::complex<double> r = response(h, f);
+      EXPECT_NEAR(r.real(), 0.0, 1e-12);
+      EXPECT_NEAR(r.imag() / f, 1.0, 0.02) << n << " " << f;
+    }
+  }
+}
+
 // Spectrum (along the wavenumber axis) of a signal occupying the first 80 %
 // of a 64-sample window, at continuous position k.
 std::complex<double> spectrumAt(const std::vector<std::complex<double>>& x, double k) {
