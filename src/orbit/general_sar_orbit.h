@@ -37,7 +37,7 @@ class GeneralSAROrbit : public GeneralSAR_Base {
   void refreshParameters() override;
 
   using GeneralSAR_Base::writehdr;
-  // XML element document, class "StateVectorData".
+  // XML element document, channel 1, class "StateVectorData"; returns 0.
   int writehdr(const std::string& file) override;
   // XML element document; if absent, profile keys of section
   // "StateVectorData" (4 when one is missing). Ends in computeApproximateSV.
@@ -214,6 +214,12 @@ class SAROrbitStateVectors_Obj : public GeneralSAR_Base {
   int createBuffers() override;
   int destroyBuffers() override;
   void refreshParameters() override;
+  // Reads the "StateVectorData" block (element document, else profile
+  // keys) and fits the polynomials; 1 when there is none. Writing is left to
+  // GeneralSAROrbit, which owns that block in a product record, so writehdr
+  // is the base's (nothing written).
+  using GeneralSAR_Base::writehdr;
+  int readhdr(const std::string& file) override;
 
   int SVCreate(double t0, double dt, int n);
   int SVPolyCompute();

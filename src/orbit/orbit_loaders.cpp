@@ -179,6 +179,17 @@ int SAROrbitStateVectors_Obj::destroyBuffers() {
   return STATUS_OK;
 }
 
+int SAROrbitStateVectors_Obj::readhdr(const std::string& file) {
+  GeneralSAROrbit orbit;
+  if (orbit.readhdr(file) != 0 || orbit.nSV < 1) return STATUS_BAD_CONDITION;
+  int st = SVCreate(orbit.t0, orbit.dt, orbit.nSV);
+  if (st != 0) return st;
+  pos = orbit.pos;
+  vel = orbit.vel;
+  refreshParameters();
+  return SVPolyCompute();
+}
+
 int SAROrbitStateVectors_Obj::SVCreate(double t0Value, double dtValue, int n) {
   destroyBuffers();
   if (n < 1) {

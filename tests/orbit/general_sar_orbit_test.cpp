@@ -358,6 +358,16 @@ TEST(GeneralSAROrbit, BothFileFormsRoundTrip) {
   FreeProfile(bad);
   GeneralSAROrbit b;
   EXPECT_EQ(b.readhdr(bad), 4);
+
+  // The older object reads the same block, from either form.
+  SAROrbitStateVectors_Obj sv;
+  ASSERT_EQ(sv.readhdr(xml), 0);
+  EXPECT_EQ(sv.nSV, 9);
+  ASSERT_EQ(sv.readhdr(hdr), 0);
+  double ps[3];
+  sv.SVGetPos(kT0 + 33.0, ps);
+  EXPECT_LT(dist(ps, p1), 1e-3);
+  EXPECT_EQ(sv.readhdr(bad), 1);
 }
 
 TEST(GeneralSAROrbit, BaselineOfTwoOrbits) {
