@@ -322,6 +322,10 @@ TEST(DeosReader, RealArcs) {
   for (int a = 0; a < 3; ++a) EXPECT_NEAR(rec.pos[a], x[a], 1e-6);
   EXPECT_NEAR(std::atan2(rec.pos[1], rec.pos[0]) * 180 / M_PI, 146.667523, 1e-9);
   for (int i = 0; i < 7921; i += 500) EXPECT_NEAR(norm3(&rec.pos[3 * i]), 7.16e6, 0.04e6);
+  // Last record: 16-APR-1992 00:00:00, -45.439368, 346.199288, 802643.740 m.
+  EXPECT_DOUBLE_EQ(rec.times[7920], ascii2sec85("16-APR-1992 00:00:00.000000"));
+  deos_to_cartesian(-45.439368, 346.199288, 802643.740, x);
+  for (int a = 0; a < 3; ++a) EXPECT_NEAR(rec.pos[3 * 7920 + a], x[a], 1e-6);
 
   // Positions at 5 s from nine records: the node record exactly, and a
   // smooth velocity of a low orbit between.
@@ -358,6 +362,11 @@ TEST(DeosReader, RealArcs) {
   ASSERT_EQ(read_deos_odr(ers2, rec, &sat), 0);
   EXPECT_EQ(sat.substr(0, 5), "ERS-2");
   EXPECT_NEAR(std::atan2(rec.pos[1], rec.pos[0]) * 180 / M_PI, -28.4788267, 1e-9);
+  ASSERT_EQ(rec.size(), 7921);
+  EXPECT_DOUBLE_EQ(rec.times[0], ascii2sec85("09-JUN-1995 12:00:00.000000"));
+  EXPECT_DOUBLE_EQ(rec.times[7920], 329788800.0);
+  deos_to_cartesian(61.3329987, 173.4338634, 793587.824, x);
+  for (int a = 0; a < 3; ++a) EXPECT_NEAR(rec.pos[3 * 7920 + a], x[a], 1e-6);
   const double t2 = rec.times[3000];
   EXPECT_EQ(interp_orb_deos(ers2, t2, "ERS2", t2, 5.0, 5, pos), 0);
   EXPECT_EQ(interp_orb_deos(ers2, t2, "ERS1", t2, 5.0, 5, pos), 1);
