@@ -205,6 +205,11 @@ int BufferIO::readbuffer(void* dst, int stride) {
       return STATUS_NO_MEMORY;
     }
   }
+  if (direct) {
+    if ((status = f.readRows(out, pitch, rows, lead, bytes, trail)) != STATUS_OK)
+      ORV_REPORT_CALLED_ERROR();
+    return status;
+  }
   const bool converts = cell_read_pair(ft, mt);
   for (int r = 0; r < rows; ++r) {
     char* target = out + r * pitch;

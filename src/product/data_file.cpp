@@ -2,6 +2,7 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/uio.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -10,6 +11,7 @@
 #include <cstdio>
 #include <cstring>
 #include <new>
+#include <vector>
 
 #include "base/status.h"
 #include "diag/ckerr.h"
@@ -95,6 +97,29 @@ int64_t RasterStream::pwrite(const void* src, int64_t n, int64_t position) const
     done += put;
   }
   return done;
+}
+
+int64_t RasterStream::preadv(char* const* dst, const int64_t* len, int count,
+                             int64_t position) const {
+  if (fd_ < 0 || count < 0 || position < 0) {
+    errno = EBADF;
+    return -1;
+  }
+  // Discarded pieces land in one scratch area; their bytes are not used.
+  static thread_local std::vector<char> scratch;
+  std::vector<iovec> iov(static_cast<size_t>(count));
+  for (int i = 0; i < count; ++i) {
+    if (!dst[i] && scratch.size() < size_t(len[i])) scratch.resize(size_t(len[i]));
+  }
+  for (int i = 0; i < count; ++i) {
+    iov[size_t(i)].iov_base = dst[i] ? dst[i] : scratch.data();
+    iov[size_t(i)].iov_len = size_t(len[i]);
+  }
+  ssize_t got;
+  do {
+    got = ::preadv(fd_, iov.data(), count, off_t(position));
+  } while (got < 0 && errno == EINTR);
+  return got;
 }
 
 int64_t RasterStream::size() const {
@@ -417,4 +442,48 @@ int DataFile::copy(const std::string& newname, int chunk) {
   const int status = target.write_hdr();
   if (status != STATUS_OK) ORV_REPORT_CALLED_ERROR();
   return status;
+}
+
+int DataFile::readRows(char* dst, int64_t pitch, int rows, int64_t lead, int64_t bytes,
+                       int64_t trail) {
+  if (!is_open()) return reportNotOpened(filename);
+  const int64_t gap = lead + trail;
+  const bool gather = !(is_buffered() && buffer_) && bytes > 0 && lead >= 0 && trail >= 0 &&
+                      gap <= 65536 && gap * 4 <= bytes;
+  int r = 0;
+  if (gather) {
+    // Groups of rows, at most 1 GiB and 1024 pieces per transfer.
+    const int64_t span = bytes + gap;
+    const int perCall = int(std::clamp<int64_t>((int64_t(1) << 30) / span, 1, 500));
+    std::vector<char*> to;
+    std::vector<int64_t> len;
+    while (r < rows) {
+      const int n = std::min(perCall, rows - r);
+      to.clear();
+      len.clear();
+      int64_t total = 0;
+      for (int i = 0; i < n; ++i) {
+        const int64_t skipBytes = i == 0 ? lead : gap;
+        if (skipBytes > 0) {
+          to.push_back(nullptr);
+          len.push_back(skipBytes);
+        }
+        to.push_back(dst + (r + i) * pitch);
+        len.push_back(bytes);
+        total += skipBytes + bytes;
+      }
+      const int64_t got = stream_.preadv(to.data(), len.data(), int(to.size()), position_);
+      if (got != total) break;  // the row by row path below tells what went wrong
+      position_ += total + trail;
+      r += n;
+    }
+  }
+  for (; r < rows; ++r) {
+    int status;
+    if ((lead && (status = seek(lead, kSeekCur)) != STATUS_OK) ||
+        (status = read(dst + r * pitch, bytes)) != STATUS_OK ||
+        (trail && (status = seek(trail, kSeekCur)) != STATUS_OK))
+      return status;
+  }
+  return STATUS_OK;
 }

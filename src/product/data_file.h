@@ -33,6 +33,10 @@ class RasterStream {
   int64_t pwrite(const void* src, int64_t n, int64_t position) const;
   // Current size of the file, -1 on error.
   int64_t size() const;
+  // Scatter read: `count` pieces of lengths len[i] into dst[i] (a null dst
+  // discards the piece), starting at `position`, in one call. Bytes read, -1
+  // on error.
+  int64_t preadv(char* const* dst, const int64_t* len, int count, int64_t position) const;
   int fd() const { return fd_; }
 
  private:
@@ -97,6 +101,11 @@ class DataFile : public GeneralSAR_Base {
   // Copies HeaderOffset + rows * row length bytes into newname in pieces of
   // `chunk` bytes and writes its side file.
   int copy(const std::string& newname, int chunk);
+  // `rows` times: skip `lead` bytes, read `bytes` bytes into dst (rows
+  // `pitch` bytes apart), skip `trail` bytes; the same as the seek/read/seek
+  // sequence, with rows gathered into few transfers when the file is
+  // unbuffered and the gaps are small.
+  int readRows(char* dst, int64_t pitch, int rows, int64_t lead, int64_t bytes, int64_t trail);
 
   // Bytes of one row: prefix plus pixels.
   int64_t rowlength() const {
