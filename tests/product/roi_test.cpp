@@ -102,6 +102,27 @@ TEST(RoiObj, ElementDocumentAndProfileForms) {
   EXPECT_EQ(bad.Lines, 3);
 }
 
+TEST(RoiObj, FileRegion) {
+  const std::string dir = record_test::freshDir();
+  DataFile raster(dir + "/img");
+  raster.NrOfPixelsPerLine = 64;
+  raster.NrOfLinesPerImage = 32;
+  raster.CellType = FLOAT32;
+  ASSERT_EQ(raster.write_hdr(), 0);
+  ROI_Obj r;
+  r.SetFastAxe(6e-3, 5e-8, 64);
+  r.SetSlowAxe(2000.0, 0.01, 32);
+  ASSERT_EQ(r.write_roi(dir + "/img.hdr", "ROI"), 0);
+  FileROI_Obj f(dir + "/img");
+  ASSERT_EQ(f.read_roi(), 0);
+  EXPECT_EQ(f.roi.Lines, 32);
+  EXPECT_EQ(f.roi.SlowStartTime, 2000.0);
+  EXPECT_EQ(f.datafile.NrOfPixelsPerLine, 64);
+  EXPECT_EQ(f.datafile.CellType, FLOAT32);
+  FileROI_Obj missing(dir + "/nothing");
+  EXPECT_EQ(missing.read_roi(), 1);
+}
+
 TEST(RoiObj, CoordinatesProfileForm) {
   const std::string dir = record_test::freshDir();
   record_test::writeText(dir + "/c.hdr",

@@ -160,6 +160,26 @@ TEST(TimeBase, RealErsLeaderTimes) {
   EXPECT_NEAR(t1 - t0, 16.667, 1e-6);
 }
 
+TEST(TimeBase, RealAsarMainHeaderTimes) {
+  const std::string path = TESSIVOR_REALDATA_DIR
+      "/envisat/ASA_IM__0CNPDE20120329_071134_000000163113_00121_52721_6279.N1";
+  std::ifstream in(path, std::ios::binary);
+  if (!in) GTEST_SKIP() << "real data folder absent";
+  // SENSING_START value with its '="' in front, 27 bytes at offset 349, and
+  // SENSING_STOP 16 bytes further on.
+  char start[28] = {}, stop[28] = {};
+  in.seekg(349);
+  in.read(start, 27);
+  in.seekg(349 + 27 + 16);
+  in.read(stop, 27);
+  ASSERT_TRUE(in);
+  EXPECT_EQ(std::string(start, 2), "=\"");
+  const double t0 = ascii2sec85(start);
+  const double t1 = ascii2sec85(stop);
+  EXPECT_NEAR(t0, ascii2sec85("29-MAR-2012 07:11:34.000000") + 0.4328, 1e-6);
+  EXPECT_NEAR(t1 - t0, 16.235, 1e-6);  // 07:11:50.6678 - 07:11:34.4328
+}
+
 TEST(ByteOrder, ReadersWritersAndSwaps) {
   const unsigned char be[8] = {0x40, 0x09, 0x21, 0xFB, 0x54, 0x44, 0x2D, 0x18};  // pi
   EXPECT_DOUBLE_EQ(ch2double8(be, 'm'), 3.141592653589793);
