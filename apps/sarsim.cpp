@@ -1,0 +1,42 @@
+// sarsim: simulates a raw scene from a scene description and writes the
+// mission's files, the orbit archive and the truth of the targets.
+//   sarsim SCENE_FILE OUTPUT_DIR
+#include <cstdio>
+#include <exception>
+#include <string>
+
+#include "sim/raw_scene.h"
+
+int main(int argc, char** argv) {
+  if (argc != 3) {
+    std::fprintf(stderr, "usage: sarsim SCENE_FILE OUTPUT_DIR\n");
+    return 10;
+  }
+  SceneDescription scene;
+  std::string error;
+  if (!SceneDescription::load(argv[1], scene, error)) {
+    std::fprintf(stderr, "sarsim: %s\n", error.c_str());
+    return 10;
+  }
+  try {
+    const RawSceneSimulator sim(scene);
+    std::fprintf(stderr, "sarsim: %s, %d lines x %d samples, window code %d, %zu targets\n", sim.scene().mission.c_str(),
+                 sim.scene().lines, sim.scene().samples, sim.swstCode(), sim.truth().size());
+    const int status = sim.writeErsScene(argv[2], error);
+    if (status != 0) {
+      std::fprintf(stderr, "sarsim: %s\n", error.c_str());
+      return status;
+    }
+    std::printf("%-4s %14s %14s %12s %12s %10s\n", "#", "line", "sample", "lat", "lon", "height");
+    for (std::size_t i = 0; i < sim.truth().size(); ++i) {
+      const TargetTruth& t = sim.truth()[i];
+      std::printf("%-4zu %14.4f %14.4f %12.6f %12.6f %10.2f\n", i + 1, t.line, t.sample, t.latDeg, t.lonDeg, t.height);
+    }
+    std::printf("leader %s\nimage  %s\norbit  %s\ntruth  %s/truth.txt\n", sim.leaderPath(argv[2]).c_str(),
+                sim.imagePath(argv[2]).c_str(), sim.odrPath(argv[2]).c_str(), argv[2]);
+  } catch (const std::exception& ex) {
+    std::fprintf(stderr, "sarsim: %s: %s\n", argv[1], ex.what());
+    return 10;
+  }
+  return 0;
+}
