@@ -5,6 +5,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <fstream>
+#include <new>
 
 #include "base/constants.h"
 #include "diag/report.h"
@@ -192,13 +193,20 @@ int SARPulse_Obj::generateChirp(fcomplex* buffer) const {
 int SARPulse_Obj::generateChirp(std::vector<fcomplex>& buffer) const {
   const int n = chirpSamples();
   if (n <= 0) return 1;
-  buffer.assign(static_cast<std::size_t>(n), fcomplex(0.0f, 0.0f));
+  try {
+    buffer.assign(static_cast<std::size_t>(n), fcomplex(0.0f, 0.0f));
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Memory allocation failed for the replica", REPORT_ERROR);
+    return 7;
+  }
   return generateChirp(buffer.data());
 }
 
 int SARPulse_Obj::writeChirp(const std::string& file) const {
   std::vector<fcomplex> chirp;
-  if (generateChirp(chirp) != 0) {
+  const int made = generateChirp(chirp);
+  if (made == 7) return 7;
+  if (made != 0) {
     ORV_REPORT("Bad pulse parameters for the replica of " + file, REPORT_ERROR);
     return 10;
   }

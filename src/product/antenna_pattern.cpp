@@ -1,6 +1,7 @@
 #include "product/antenna_pattern.h"
 
 #include <cmath>
+#include <new>
 
 #include "diag/report.h"
 #include "product/acquisition_objects.h"

@@ -127,16 +127,6 @@ void destroyTable(std::vector<T>& table, int& count) {
 }
 
 template <typename T>
-int writeRows(std::vector<T>& rows, const std::string& file) {
-  int status = 0;
-  for (size_t k = 0; k < rows.size(); ++k) {
-    if (rows[k].writepar(file, rowSection(rows[k].tableName(), static_cast<int>(k))) != 0)
-      status = 1;
-  }
-  return status;
-}
-
-template <typename T>
 int readRows(std::vector<T>& rows, const std::string& file) {
   int status = 0;
   for (size_t k = 0; k < rows.size(); ++k) {
@@ -385,25 +375,46 @@ ORV_INTERP(SL2PHI, SL2PHI, "NO SL2PHI poly available", false, false)
 #undef ORV_INTERP
 
 int polySAR::writehdr(const std::string& file) {
-  int status = writeAuxiliaryFile(file, 1, kPolySAR);
-  status |= writeRows(DC, file);
-  status |= writeRows(FR, file);
-  status |= writeRows(SL2GR, file);
-  status |= writeRows(GR2SL, file);
-  status |= writeRows(SL2THETA, file);
-  status |= writeRows(SL2PHI, file);
-  status |= writeRows(DCExt, file);
-  status |= writeRows(FRExt, file);
+  // One document for the counts and every row: the rows are written at the
+  // paths their own element tables use ("PolySAR/<name>-<k>/pol", ...), and
+  // the file is saved once for all of them.
+  if (setAuxiliaryFile(file, 1, kPolySAR) != 0 || writeAuxiliaryFile() != 0) {
+    unsetAuxiliaryFile();
+    return 1;
+  }
+  orvanexml& doc = getXml();
+  int status = 0;
+  const auto rows = [&](auto& table) {
+    for (size_t k = 0; k < table.size(); ++k) {
+      auto& row = table[k];
+      const std::string base = rowClass(rowSection(row.tableName(), static_cast<int>(k)));
+      status |= doc.writeDouble(1, base + "/pol", row.coefficientData(), row.coefficientSize());
+      status |= doc.writeDouble(1, base + "/trg0_s", &row.trg0, 1);
+      status |= doc.writeDouble(1, base + "/taz0_s", &row.taz0, 1);
+    }
+  };
+  rows(DC);
+  rows(FR);
+  rows(SL2GR);
+  rows(GR2SL);
+  rows(SL2THETA);
+  rows(SL2PHI);
+  rows(DCExt);
+  rows(FRExt);
+  status |= doc.write();
+  unsetAuxiliaryFile();
   return status != 0 ? 1 : 0;
 }
 
 int polySAR::readhdr(const std::string& file) {
   DestroyPolys();
   int counts[8] = {0, 0, 0, 0, 0, 0, 0, 0};
-  if (readAuxiliaryFile(file, 1, kPolySAR)) {
+  const bool document = setAuxiliaryFile(file, 1, kPolySAR) == 0 && readAuxiliaryFile() == 0;
+  if (document) {
     const int read[8] = {ndc, nfr, nsl2gr, ngr2sl, nsl2theta, nsl2phi, ndcExt, nfrExt};
     for (int k = 0; k < 8; ++k) counts[k] = read[k] > 0 ? read[k] : 0;
   } else {
+    unsetAuxiliaryFile();
     const char* keys[6] = {"nDopCenDataSet", "nFMRateDataSet", "nSlant2Ground",
                            "nGround2Slant",  "nSlant2Theta",   "nSlant2Phi"};
     bool any = false;
@@ -419,14 +430,35 @@ int polySAR::readhdr(const std::string& file) {
   CreatePolys(counts[0], counts[1], counts[2], counts[3], counts[4], counts[5], counts[6],
               counts[7]);
   int status = 0;
-  status |= readRows(DC, file);
-  status |= readRows(FR, file);
-  status |= readRows(SL2GR, file);
-  status |= readRows(GR2SL, file);
-  status |= readRows(SL2THETA, file);
-  status |= readRows(SL2PHI, file);
-  status |= readRows(DCExt, file);
-  status |= readRows(FRExt, file);
+  if (document) {
+    // Every row from the one open document.
+    orvanexml& doc = getXml();
+    const auto rows = [&](auto& table) {
+      for (size_t k = 0; k < table.size(); ++k) {
+        auto& row = table[k];
+        const std::string base = rowClass(rowSection(row.tableName(), static_cast<int>(k)));
+        status |= doc.readDouble(1, base + "/pol", row.coefficientData(), row.coefficientSize());
+        status |= doc.readDouble(1, base + "/trg0_s", &row.trg0, 1);
+        status |= doc.readDouble(1, base + "/taz0_s", &row.taz0, 1);
+      }
+    };
+    rows(DC);
+    rows(FR);
+    rows(SL2GR);
+    rows(GR2SL);
+    rows(SL2THETA);
+    rows(SL2PHI);
+    rows(DCExt);
+    rows(FRExt);
+    unsetAuxiliaryFile();
+  } else {
+    status |= readRows(DC, file);
+    status |= readRows(FR, file);
+    status |= readRows(SL2GR, file);
+    status |= readRows(GR2SL, file);
+    status |= readRows(SL2THETA, file);
+    status |= readRows(SL2PHI, file);
+  }
   if (status != 0) {
     ORV_REPORT("Polynomial rows missing in file : " + file, REPORT_WARNING);
     DestroyPolys();

@@ -38,6 +38,10 @@ class poly : public GeneralSAR_Base {
   virtual const char* rangeReferenceKey() const { return ""; }
   virtual const char* azimuthReferenceKey() const { return ""; }
 
+  // The coefficients as stored: c (7) here, e (14) in the extended shape.
+  double* coefficientData() { return coefficients(); }
+  int coefficientSize() const { return coefficientCount(); }
+
   double c[7] = {0, 0, 0, 0, 0, 0, 0};
   double trg0 = 0.0;
   double taz0 = 0.0;

@@ -24,7 +24,7 @@ class NoOrbitSlots : public GeneralSAROrbitSlots {
 };
 const NoOrbitSlots kSlots;
 
-TEST(Configuration, DefaultsAsSpecified) {
+TEST(Configuration, Defaults) {
   GeneralSAR_configuration c;
   EXPECT_EQ(c.azimuthConf.LinesInBlock, 5000);
   EXPECT_FLOAT_EQ(c.azimuthConf.StoltPadding, 0.4f);
