@@ -469,6 +469,29 @@ TEST(RasterDataFile, BufferedWritingKeepsItsSeekRule) {
   EXPECT_EQ(slurp(dir + "/rows"), ref);
 }
 
+TEST(RasterDataFile, BufferedUpdateWritesInPlace) {
+  const std::string dir = tempDir();
+  spit(dir + "/u", std::vector<unsigned char>(40, '.'));
+  DataFile f(dir + "/u");
+  f.buffersize = 16;
+  ASSERT_EQ(f.open(3), STATUS_OK);
+  char buf[8];
+  ASSERT_EQ(f.read(buf, 5), STATUS_OK);
+  ASSERT_EQ(f.write("XY", 2), STATUS_OK);  // at 5, the buffer is dropped
+  EXPECT_EQ(f.tell(), 7);
+  ASSERT_EQ(f.seek(20, 0), STATUS_OK);
+  ASSERT_EQ(f.write("Z", 1), STATUS_OK);
+  ASSERT_EQ(f.seek(4, 0), STATUS_OK);
+  ASSERT_EQ(f.read(buf, 4), STATUS_OK);  // reads what was written
+  EXPECT_EQ(std::string(buf, 4), ".XY.");
+  ASSERT_EQ(f.close(), STATUS_OK);
+  const std::vector<unsigned char> bytes = slurp(dir + "/u");
+  std::string want(40, '.');
+  want.replace(5, 2, "XY");
+  want[20] = 'Z';
+  EXPECT_EQ(std::string(bytes.begin(), bytes.end()), want);
+}
+
 TEST(RasterDataFile, CopyAndClone) {
   const std::string dir = tempDir();
   const Layout l{SHORT_COMPLEX, true, 7, 5, 3, 11};
