@@ -209,6 +209,13 @@ bool SceneDescription::fromIni(const SimIni& ini, SceneDescription& s, std::stri
     s.samples = ini.getInt("Scene", "samples", s.samples);
     s.nearRangeTime = ini.getDouble("Scene", "near_range_time_s", s.nearRangeTime);
     s.dopplerCentroidHz = ini.getDouble("Scene", "doppler_centroid_hz", s.dopplerCentroidHz);
+    if (ini.find("Scene", "yaw_deg") || ini.find("Scene", "pitch_deg")) {
+      if (ini.find("Scene", "doppler_centroid_hz"))
+        throw std::runtime_error("[Scene] give either doppler_centroid_hz or yaw_deg/pitch_deg, not both");
+      s.attitudeGiven = true;
+      s.yawDeg = ini.getDouble("Scene", "yaw_deg", 0.0);
+      s.pitchDeg = ini.getDouble("Scene", "pitch_deg", 0.0);
+    }
     s.patternExtent = ini.getDouble("Scene", "pattern_extent", s.patternExtent);
     s.orbitNumber = ini.getInt("Scene", "orbit_number", s.orbitNumber);
     s.frame = ini.getInt("Scene", "frame", s.frame);
@@ -283,6 +290,7 @@ RawSceneSimulator::RawSceneSimulator(SceneDescription s) : scene_(std::move(s)) 
     throw std::runtime_error("near range time gives a window code outside 0..65535");
   swst_ = ersSwstSeconds(swstCode_);
   if (replicaLength() >= d.samples) throw std::runtime_error("the window is shorter than the pulse");
+  if (d.attitudeGiven) d.dopplerCentroidHz = attitudeDoppler(d.yawDeg, d.pitchDeg);
 
   // Clutter filters: range band of the chirp, azimuth spectrum of the
   // two-way antenna pattern around the centroid (aliased into the PRF).
@@ -333,6 +341,27 @@ double RawSceneSimulator::rangePeakOffset() const {
 
 int RawSceneSimulator::priCode() const {
   return static_cast<int>(std::lround(scene_.samplingRateHz / (4.0 * scene_.prfHz))) - 2;
+}
+
+double RawSceneSimulator::attitudeDoppler(double yawDeg, double pitchDeg) const {
+  const SceneDescription& d = scene_;
+  const StateVector sv = orbit_.at(lineTime(d.lines / 2));
+  const double R = kC / 2.0 * (swst_ + 0.5 * d.samples / d.samplingRateHz);
+  double lat = 0, lon = 0;
+  if (!zeroDopplerPoint(orbit_, sv.t, R, 0.0, d.lookSign, lat, lon))
+    throw std::runtime_error("no scene centre on the ground for the attitude");
+  Vec3 u = geodeticToEcef(lat, lon, 0.0) - sv.pos;
+  u = (1.0 / norm(u)) * u;
+  // Rodrigues rotation of u by angle a about the unit axis k.
+  auto rotate = [](const Vec3& v, const Vec3& k, double a) {
+    return std::cos(a) * v + std::sin(a) * cross(k, v) + (dot(k, v) * (1.0 - std::cos(a))) * k;
+  };
+  const Vec3 down = (-1.0 / norm(sv.pos)) * sv.pos;
+  Vec3 right = cross(down, (1.0 / norm(sv.vel)) * sv.vel);
+  right = (1.0 / norm(right)) * right;
+  u = rotate(u, down, -d.lookSign * yawDeg * kPi / 180.0);
+  u = rotate(u, right, pitchDeg * kPi / 180.0);
+  return 2.0 / wavelength() * dot(sv.vel, u);
 }
 
 void RawSceneSimulator::computeTruth() {
@@ -504,12 +533,12 @@ int RawSceneSimulator::writeErsScene(const std::string& outDir, std::string& err
   namespace stdfs = std::filesystem;
   const SceneDescription& d = scene_;
   std::error_code ec;
-  stdfs::create_directories(outDir + "/" + d.sceneDir, ec);
-  stdfs::create_directories(outDir + "/orbits/ERS1/PRECISE", ec);
-  stdfs::create_directories(outDir + "/orbits/" + d.mission + "/PRECISE", ec);
-  if (ec) {
-    error = "cannot create directories under " + outDir + ": " + ec.message();
-    return 5;
+  for (const std::string& sub : {d.sceneDir, std::string("orbits/ERS1/PRECISE"), "orbits/" + d.mission + "/PRECISE"}) {
+    stdfs::create_directories(outDir + "/" + sub, ec);
+    if (ec) {
+      error = "cannot create " + outDir + "/" + sub + ": " + ec.message();
+      return 5;
+    }
   }
   const double lambda = wavelength();
   const double fs = d.samplingRateHz;

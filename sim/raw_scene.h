@@ -47,6 +47,11 @@ struct SceneDescription {
   double antennaLength = 10.0;
   int lookSign = 1;                      // +1 right, -1 left
   double dopplerCentroidHz = 0.0;
+  // Attitude instead of an explicit centroid: the beam of the zero-Doppler
+  // look to the scene centre turned by the yaw (about the local vertical)
+  // and the pitch (about the cross-track axis); positive turns it forward.
+  bool attitudeGiven = false;
+  double yawDeg = 0.0, pitchDeg = 0.0;
   double patternExtent = 1.0;            // azimuth pattern kept to this many first nulls
   KeplerElements orbit;
   // Acquisition.
@@ -110,6 +115,8 @@ class RawSceneSimulator {
   // Where the range-compressed peak lies after the two-way delay, samples.
   double rangePeakOffset() const;
   int priCode() const;
+  // Doppler centroid at the scene centre of a yaw and pitch, Hz.
+  double attitudeDoppler(double yawDeg, double pitchDeg) const;
 
   // Complex echoes of lines [first, first + count) before quantisation,
   // row-major count x samples. Deterministic and independent of the

@@ -302,3 +302,29 @@ TEST(SimGeometry, OrbitTimeAndGeodesyAreConsistent) {
   const StateVector sc = orbit.at(tc);
   EXPECT_NEAR(dot(sc.pos - target, sc.vel) / norm(sc.pos - target), 0.0, 1e-6);
 }
+
+TEST(SimEcho, AttitudeGivesTheCentroidOfTheTurnedBeam) {
+  SceneDescription s = smallScene();
+  s.attitudeGiven = true;
+  const double f0 = RawSceneSimulator(s).scene().dopplerCentroidHz;
+  EXPECT_NEAR(f0, 0.0, 1e-3);  // the zero-Doppler beam
+  s.yawDeg = 0.1;
+  const RawSceneSimulator yawed(s);
+  const double lambda = kC / yawed.scene().carrierHz;
+  const StateVector sv = yawed.orbit().at(yawed.lineTime(s.lines / 2));
+  // Small yaw: 2 v sin(yaw) sin(off-nadir angle) / lambda.
+  const double R = kC / 2.0 * (yawed.swst() + 0.5 * s.samples / yawed.scene().samplingRateHz);
+  double lat = 0, lon = 0, h = 0;
+  ecefToGeodetic(sv.pos, lat, lon, h);
+  const double offNadir = std::acos(std::min(1.0, (h + 0.5 * (R * R - h * h) / 6.37e6) / R));
+  EXPECT_GT(yawed.scene().dopplerCentroidHz, 0.0);
+  EXPECT_NEAR(yawed.scene().dopplerCentroidHz, 2.0 * norm(sv.vel) * std::sin(0.1 * M_PI / 180.0) * std::sin(offNadir) / lambda,
+              0.1 * yawed.scene().dopplerCentroidHz);
+  s.yawDeg = 0.0;
+  s.pitchDeg = -0.05;
+  EXPECT_LT(RawSceneSimulator(s).scene().dopplerCentroidHz, 0.0);
+  SimIni ini;
+  std::string err;
+  ASSERT_TRUE(ini.loadText("[Scene]\nyaw_deg = 0.2\ndoppler_centroid_hz = 10\n", err));
+  EXPECT_FALSE(SceneDescription::fromIni(ini, s, err));
+}

@@ -10,6 +10,8 @@
 #include <string>
 #include <vector>
 
+#include <unistd.h>
+
 #include "product/time_base.h"
 #include "sim/ers_ceos_writer.h"
 #include "sim/raw_scene.h"
@@ -123,12 +125,16 @@ bool masked(int off) {
   return false;
 }
 
-std::string tempDir(const std::string& name) {
-  const std::string d = testing::TempDir() + "/sim_" + name + "_" + std::to_string(::getpid());
-  std::filesystem::remove_all(d);
-  std::filesystem::create_directories(d);
-  return d;
-}
+// A scratch folder under the test temporary directory, removed afterwards.
+struct TempTree {
+  explicit TempTree(const std::string& name)
+      : path(testing::TempDir() + "/sim_" + name + "_" + std::to_string(::getpid())) {
+    std::filesystem::remove_all(path);
+    std::filesystem::create_directories(path);
+  }
+  ~TempTree() { std::filesystem::remove_all(path); }
+  std::string path;
+};
 
 }  // namespace
 
@@ -199,7 +205,8 @@ TEST(ErsSceneFiles, ReadBackWithTheValuesPutIn) {
   s.arcNumber = 7;
   s.odrRecords = 200;
   RawSceneSimulator sim(s);
-  const std::string dir = tempDir("readback");
+  const TempTree tmp("readback");
+  const std::string& dir = tmp.path;
   std::string err;
   ASSERT_EQ(sim.writeErsScene(dir, err), 0) << err;
 
@@ -283,7 +290,8 @@ TEST(ErsSceneFiles, OrbitArcAndArclistLeadToTheSceneOrbit) {
   s.arcNumber = 15;
   s.odrRecords = 7921;
   RawSceneSimulator sim(s);
-  const std::string dir = tempDir("orbit");
+  const TempTree tmp("orbit");
+  const std::string& dir = tmp.path;
   std::string err;
   ASSERT_EQ(sim.writeErsScene(dir, err), 0) << err;
 
@@ -345,7 +353,8 @@ TEST(ErsSceneFiles, DamageIsInjectedAsAsked) {
   s.leaderPatches.push_back({1654, "   ABC.DEF      "});
   s.odrRecords = 60;
   RawSceneSimulator sim(s);
-  const std::string dir = tempDir("damage");
+  const TempTree tmp("damage");
+  const std::string& dir = tmp.path;
   std::string err;
   ASSERT_EQ(sim.writeErsScene(dir, err), 0) << err;
   EXPECT_EQ(std::filesystem::file_size(sim.imagePath(dir)), static_cast<std::uintmax_t>(s.truncateImageBytes));

@@ -9,6 +9,8 @@
 #include <fstream>
 #include <vector>
 
+#include <unistd.h>
+
 #include "sim/point_target.h"
 
 namespace {
