@@ -36,6 +36,25 @@ struct SimPixelTarget {
   double line = 0.0, sample = 0.0, height = 0.0, amplitude = 1.0;
 };
 
+// Scene file (sections and keys; every key is optional, defaults are an
+// ERS-2 image-mode scene; see tests/sim/data/ers2_small_scene.txt):
+//   [Mission] mission (ERS1|ERS2), carrier_ghz, sampling_rate_mhz, prf_hz,
+//             pulse_length_us, chirp_coefficient, antenna_length_m,
+//             look_side (right|left)
+//   [Orbit]   semi_major_axis_m, eccentricity, inclination_deg,
+//             node_longitude_deg (Earth-fixed, at the epoch), arg_perigee_deg,
+//             mean_anomaly_deg, epoch ("DD-MMM-YYYY HH:MM:SS.mmm", default the start)
+//   [Scene]   start_time, lines, samples, near_range_time_s,
+//             doppler_centroid_hz or yaw_deg/pitch_deg, pattern_extent,
+//             orbit_number, frame, arc_number, facility, scene_dir,
+//             file_names (upper|lower), odr_form (xODR|@ODR), odr_records,
+//             bias_i, bias_q
+//   [Targets] target* = lat lon height [amplitude];
+//             pixel_target* = line sample height [amplitude]
+//   [Clutter] clutter_sigma, noise_sigma, seed
+//   [Damage]  drop_lines (e.g. "100 200-205"), corrupt_swst_lines,
+//             corrupt_swst_delta, truncate_image_bytes,
+//             leader_patch = <file offset> <text> (repeatable)
 struct SceneDescription {
   std::string mission = "ERS2";   // "ERS1" or "ERS2"
   // Radar; each value is kept at the precision the leader records it with.

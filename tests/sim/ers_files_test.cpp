@@ -12,6 +12,8 @@
 
 #include <unistd.h>
 
+#include "orbit/orbit_files.h"
+#include "product/profile.h"
 #include "product/time_base.h"
 #include "sim/ers_ceos_writer.h"
 #include "sim/raw_scene.h"
@@ -343,6 +345,23 @@ TEST(ErsSceneFiles, OrbitArcAndArclistLeadToTheSceneOrbit) {
     EXPECT_NEAR(R * std::cos(g) * std::sin(lon), sv.pos[1], 0.02);
     EXPECT_NEAR(R * std::sin(g), sv.pos[2], 0.02);
   }
+  // The project's DEOS reader interpolates the scene orbit from the arc.
+  double pos[3 * 5];
+  ASSERT_EQ(interp_orb_deos(dir + "/orbits/ERS2/PRECISE/ODR.015", s.startTime, "ERS2", s.startTime - 10.0, 5.0, 5, pos), 0);
+  for (int k = 0; k < 5; ++k) {
+    const StateVector sv = sim.orbit().at(s.startTime - 10.0 + 5.0 * k);
+    EXPECT_NEAR(norm(Vec3{pos[3 * k], pos[3 * k + 1], pos[3 * k + 2]} - sv.pos), 0.0, 0.05) << k;
+  }
+  EXPECT_NE(interp_orb_deos(dir + "/orbits/ERS2/PRECISE/ODR.015", s.startTime, "ERS1", s.startTime, 5.0, 5, pos), 0);
+
+  // The truth file through the profile library.
+  std::string value;
+  ASSERT_EQ(GetMyProfileString("Scene", "prf_hz", value, dir + "/truth.txt"), 0);
+  EXPECT_DOUBLE_EQ(std::stod(value), sim.scene().prfHz);
+  ASSERT_EQ(GetMyProfileString("Scene", "first_line_time_text", value, dir + "/truth.txt"), 0);
+  EXPECT_DOUBLE_EQ(ascii2sec85(value), s.startTime);
+  ASSERT_EQ(GetMyProfileString("Scene", "targets", value, dir + "/truth.txt"), 0);
+  EXPECT_EQ(value, "0");
 }
 
 TEST(ErsSceneFiles, DamageIsInjectedAsAsked) {
