@@ -155,6 +155,22 @@ void BM_BufferFileRead(benchmark::State& state) {
   rate(state);
 }
 
+// Through a 32 MiB read window, as the multi-looker reads its input.
+void BM_BufferFileWindowRead(benchmark::State& state) {
+  ensureFile();
+  std::vector<fcomplex> buf(block().size());
+  for (auto _ : state) {
+    BufferFile f;
+    describe(f);
+    if (!f.open(BufferFile::READ)) state.SkipWithError("cannot open the scratch file");
+    f.initbuffer(33554432, 2097152);
+    for (int l = 0; l < lines(); l += kBlockLines)
+      benchmark::DoNotOptimize(f.readbuffer(buf.data(), l, kBlockLines, 0, 0));
+    f.close();
+  }
+  rate(state);
+}
+
 // Rows with an 8-byte prefix (the raw-data layout), pixels read row by row
 // behind each prefix: the same file seen with one pixel less per row.
 void BM_BufferIOReadPrefixedRows(benchmark::State& state) {
@@ -200,6 +216,7 @@ BENCHMARK(BM_BufferFileWrite)->Unit(benchmark::kMillisecond)->UseRealTime()->Ite
 BENCHMARK(BM_PlainFread)->Unit(benchmark::kMillisecond)->UseRealTime()->Iterations(2);
 BENCHMARK(BM_BufferIORead)->Unit(benchmark::kMillisecond)->UseRealTime()->Iterations(2);
 BENCHMARK(BM_BufferFileRead)->Unit(benchmark::kMillisecond)->UseRealTime()->Iterations(2);
+BENCHMARK(BM_BufferFileWindowRead)->Unit(benchmark::kMillisecond)->UseRealTime()->Iterations(2);
 BENCHMARK(BM_BufferIOReadPrefixedRows)->Unit(benchmark::kMillisecond)->UseRealTime()->Iterations(2);
 BENCHMARK(BM_BufferIOReadColumnWindow)->Unit(benchmark::kMillisecond)->UseRealTime()->Iterations(2);
 

@@ -147,7 +147,8 @@ void BufferFile::seek(int64_t offset, SeekType whence) {
   }
   if (opType_ == READ) {
     const int64_t first = position_ - valid_;
-    if (target >= first && target < position_) {
+    // The end of the loaded data counts as inside: the next read refills.
+    if (target >= first && target <= position_) {
       cursor_ = target - first;
       return;
     }
@@ -200,6 +201,20 @@ int64_t BufferFile::read(void* dst, int64_t n) {
       // A seek landed beyond the data that the last load found.
       position_ = position_ - valid_ + cursor_;
       valid_ = cursor_ = 0;
+    }
+    if (n >= windowSize_ / 2) {
+      // Large request: straight from the stream into the caller's buffer;
+      // the window keeps the back-reach from its end.
+      const int64_t got = std::max<int64_t>(stream_.pread(out + delivered, n, position_), 0);
+      if (got == 0) break;
+      position_ += got;
+      delivered += got;
+      n -= got;
+      const int64_t keep = std::min(back_, got);
+      std::memcpy(window_.get(), out + delivered - keep, size_t(keep));
+      valid_ = cursor_ = keep;
+      if (n > 0) break;  // end of file
+      continue;
     }
     // Keep a back-reach of the old window, fill the rest from the stream.
     const int64_t keep = std::min(back_, valid_ / 2);
@@ -274,7 +289,7 @@ int64_t BufferFile::transfer(void* memory, int memType, bool complexForm, int fi
   const int64_t pitch = int64_t(columns) * ms;
 
   seek(rowstart(firstRow), FROM_START);
-  if (direct && lead == 0 && trail == 0 && !is_buffered()) {
+  if (direct && lead == 0 && trail == 0) {
     const int64_t total = bytes * rows;
     return writing ? write(mem, total) : read(mem, total);
   }
