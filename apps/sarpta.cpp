@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include "product/data_file.h"
 #include "sim/point_target.h"
 #include "sim/raw_scene.h"
 
@@ -16,7 +17,8 @@ namespace {
 
 void usage() {
   std::fprintf(stderr,
-               "usage: sarpta --raster FILE --lines N --samples M --truth FILE [options]\n"
+               "usage: sarpta --raster FILE --truth FILE [--lines N --samples M] [options]\n"
+               "  (without --lines and --samples the layout comes from FILE.hdr)\n"
                "  --big-endian               samples stored most significant byte first\n"
                "  --header-bytes B           bytes before the first line (0)\n"
                "  --first-line-time T        azimuth time of line 0, s since 1985 (truth: first line)\n"
@@ -56,7 +58,7 @@ int main(int argc, char** argv) {
       return 10;
     }
   }
-  for (const char* k : {"--raster", "--lines", "--samples", "--truth"})
+  for (const char* k : {"--raster", "--truth"})
     if (!a.count(k)) {
       std::fprintf(stderr, "sarpta: %s is required\n", k);
       usage();
@@ -99,9 +101,29 @@ int main(int argc, char** argv) {
   const double r0 = num("--first-range-time", swst), dr = num("--range-time-step", 1.0 / fs);
   const double rangeOffset = a.count("--no-range-offset") ? 0.0 : offset;
 
+  long lines = 0, samples = 0;
+  bool big = a.count("--big-endian") > 0;
+  long long headerBytes = static_cast<long long>(num("--header-bytes", 0));
+  int prefix = 0;
+  if (a.count("--lines") && a.count("--samples")) {
+    lines = std::atol(a["--lines"].c_str());
+    samples = std::atol(a["--samples"].c_str());
+  } else {
+    DataFile raster;
+    raster.filename = a["--raster"];
+    if (raster.read_hdr(a["--raster"]) != 0 || raster.CellType != 0) {
+      std::fprintf(stderr, "sarpta: %s.hdr: no FLOAT_COMPLEX raster layout; give --lines and --samples\n",
+                   a["--raster"].c_str());
+      return 10;
+    }
+    lines = raster.NrOfLinesPerImage;
+    samples = raster.NrOfPixelsPerLine;
+    big = raster.ByteOrder == 1;
+    headerBytes = raster.HeaderOffset;
+    prefix = raster.RowPrefix;
+  }
   ComplexRasterReader image;
-  if (!image.open(a["--raster"], std::atol(a["--lines"].c_str()), std::atol(a["--samples"].c_str()),
-                  a.count("--big-endian") > 0, static_cast<long long>(num("--header-bytes", 0)), err)) {
+  if (!image.open(a["--raster"], lines, samples, big, headerBytes, err, prefix)) {
     std::fprintf(stderr, "sarpta: %s\n", err.c_str());
     return 9;
   }

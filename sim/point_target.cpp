@@ -157,7 +157,7 @@ ComplexRasterReader::~ComplexRasterReader() {
 }
 
 bool ComplexRasterReader::open(const std::string& path, long lines, long samples, bool bigEndian, long long header,
-                               std::string& error) {
+                               std::string& error, int rowPrefix) {
   if (f_) std::fclose(f_);
   f_ = std::fopen(path.c_str(), "rb");
   if (!f_) {
@@ -170,7 +170,7 @@ bool ComplexRasterReader::open(const std::string& path, long lines, long samples
   }
   std::fseek(f_, 0, SEEK_END);
   const long long size = std::ftell(f_);
-  if (size < header + static_cast<long long>(lines) * samples * 8) {
+  if (size < header + static_cast<long long>(lines) * (rowPrefix + samples * 8)) {
     error = "raster " + path + " holds " + std::to_string(size) + " bytes, fewer than " + std::to_string(lines) +
             " lines of " + std::to_string(samples) + " complex samples";
     return false;
@@ -179,6 +179,7 @@ bool ComplexRasterReader::open(const std::string& path, long lines, long samples
   samples_ = samples;
   big_ = bigEndian;
   header_ = header;
+  prefix_ = rowPrefix;
   return true;
 }
 
@@ -191,7 +192,7 @@ bool ComplexRasterReader::read(long line0, long sample0, int rows, int cols, std
     if (line < 0 || line >= lines_) continue;
     const long s0 = std::max(0L, sample0), s1 = std::min(samples_, sample0 + cols);
     if (s1 <= s0) continue;
-    const long long off = header_ + (static_cast<long long>(line) * samples_ + s0) * 8;
+    const long long off = header_ + static_cast<long long>(line) * (prefix_ + samples_ * 8) + prefix_ + s0 * 8;
     if (std::fseek(f_, static_cast<long>(off), SEEK_SET) != 0 ||
         std::fread(buf.data(), 8, static_cast<std::size_t>(s1 - s0), f_) != static_cast<std::size_t>(s1 - s0)) {
       error = "raster read failed at line " + std::to_string(line);

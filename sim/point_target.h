@@ -45,7 +45,7 @@ class ComplexRasterReader {
   ComplexRasterReader& operator=(const ComplexRasterReader&) = delete;
   // false with a message when the file is missing or shorter than its size.
   bool open(const std::string& path, long lines, long samples, bool bigEndian, long long headerBytes,
-            std::string& error);
+            std::string& error, int rowPrefix = 0);
   // rows x cols values starting at (line0, sample0).
   bool read(long line0, long sample0, int rows, int cols, std::vector<cdouble>& out, std::string& error) const;
   long lines() const { return lines_; }
@@ -56,6 +56,7 @@ class ComplexRasterReader {
   long lines_ = 0, samples_ = 0;
   bool big_ = false;
   long long header_ = 0;
+  int prefix_ = 0;
 };
 
 struct PtaOptions {

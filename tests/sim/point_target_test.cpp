@@ -148,5 +148,28 @@ TEST(PointTargetAnalysis, SquintedSpectrumAndRasterFilesInBothByteOrders) {
     EXPECT_FALSE(reader.open(path, rows + 1, cols, big, 0, err));
     EXPECT_NE(err.find("fewer than"), std::string::npos);
   }
+  // Row prefixes and a file header are skipped.
+  {
+    const std::string path = dir + "/img_prefix";
+    std::ofstream f(path, std::ios::binary);
+    f.write("HEADER--", 8);
+    for (int i = 0; i < rows; ++i) {
+      const float prefix = 0.0055f;
+      f.write(reinterpret_cast<const char*>(&prefix), 4);
+      for (int j = 0; j < cols; ++j) {
+        const cdouble v = img[static_cast<std::size_t>(i) * cols + j];
+        const float q[2] = {static_cast<float>(v.real()), static_cast<float>(v.imag())};
+        f.write(reinterpret_cast<const char*>(q), 8);
+      }
+    }
+    f.close();
+    ComplexRasterReader reader;
+    std::string err;
+    ASSERT_TRUE(reader.open(path, rows, cols, false, 8, err, 4)) << err;
+    const PtaResult r = analysePointTarget(reader, 121.0, 69.0, -2.0, opt);
+    ASSERT_TRUE(r.found) << r.message;
+    EXPECT_NEAR(r.errorLine, -0.55, 0.01);
+    EXPECT_NEAR(r.errorSample, 1.2, 0.01);
+  }
   std::filesystem::remove_all(dir);
 }
