@@ -12,6 +12,7 @@
 
 #include <unistd.h>
 
+#include "orbit/general_sar_orbit.h"
 #include "orbit/orbit_files.h"
 #include "product/profile.h"
 #include "product/time_base.h"
@@ -353,6 +354,18 @@ TEST(ErsSceneFiles, OrbitArcAndArclistLeadToTheSceneOrbit) {
     EXPECT_NEAR(norm(Vec3{pos[3 * k], pos[3 * k + 1], pos[3 * k + 2]} - sv.pos), 0.0, 0.05) << k;
   }
   EXPECT_NE(interp_orb_deos(dir + "/orbits/ERS2/PRECISE/ODR.015", s.startTime, "ERS1", s.startTime, 5.0, 5, pos), 0);
+  // The state vectors the extractor asks for: positions and velocities of
+  // the fitted orbit agree with the simulated orbit.
+  GeneralSAROrbit fitted;
+  ASSERT_EQ(fitted.GetStateVectorsERS(dir + "/orbits/ERS2/PRECISE/ODR.015", s.startTime, 12.0, "ERS2"), 0);
+  for (double dt : {0.0, 4.3, 11.9}) {
+    double p[3], v[3];
+    ASSERT_EQ(fitted.SVGetPos(s.startTime + dt, p), 0);
+    ASSERT_EQ(fitted.SVGetVel(s.startTime + dt, v), 0);
+    const StateVector sv = sim.orbit().at(s.startTime + dt);
+    EXPECT_NEAR(norm(Vec3{p[0], p[1], p[2]} - sv.pos), 0.0, 0.1) << dt;
+    EXPECT_NEAR(norm(Vec3{v[0], v[1], v[2]} - sv.vel), 0.0, 0.01) << dt;
+  }
 
   // The truth file through the profile library.
   std::string value;
