@@ -217,6 +217,8 @@ bool SceneDescription::fromIni(const SimIni& ini, SceneDescription& s, std::stri
       s.pitchDeg = ini.getDouble("Scene", "pitch_deg", 0.0);
     }
     s.patternExtent = ini.getDouble("Scene", "pattern_extent", s.patternExtent);
+    s.swstChangeLine = ini.getInt("Scene", "swst_change_line", s.swstChangeLine);
+    s.swstChangeCodes = ini.getInt("Scene", "swst_change_codes", s.swstChangeCodes);
     s.orbitNumber = ini.getInt("Scene", "orbit_number", s.orbitNumber);
     s.frame = ini.getInt("Scene", "frame", s.frame);
     s.arcNumber = ini.getInt("Scene", "arc_number", s.arcNumber);
@@ -286,7 +288,8 @@ RawSceneSimulator::RawSceneSimulator(SceneDescription s) : scene_(std::move(s)) 
   orbit_ = SimOrbit(d.orbit);
 
   swstCode_ = static_cast<int>(std::lround((d.nearRangeTime - 0.005357529 + 6.627e-06) / 2.10943e-07));
-  if (swstCode_ < 0 || swstCode_ + d.corruptSwstDelta > 65535)
+  if (swstCode_ < 0 || swstCode_ + d.swstChangeCodes < 0 || swstCode_ + d.swstChangeCodes + d.corruptSwstDelta > 65535 ||
+      swstCode_ + d.corruptSwstDelta > 65535)
     throw std::runtime_error("near range time gives a window code outside 0..65535");
   swst_ = ersSwstSeconds(swstCode_);
   if (replicaLength() >= d.samples) throw std::runtime_error("the window is shorter than the pulse");
@@ -337,6 +340,10 @@ int RawSceneSimulator::replicaLength() const {
 
 double RawSceneSimulator::rangePeakOffset() const {
   return (scene_.samplingRateHz * scene_.pulseLength - (replicaLength() - 1)) / 2.0;
+}
+
+int RawSceneSimulator::swstCodeOf(int line) const {
+  return (scene_.swstChangeLine >= 0 && line >= scene_.swstChangeLine) ? swstCode_ + scene_.swstChangeCodes : swstCode_;
 }
 
 int RawSceneSimulator::priCode() const {
@@ -419,6 +426,7 @@ void RawSceneSimulator::addTargets(int line, fcomplex* row) const {
   const double lambda = wavelength();
   const double fs = d.samplingRateHz, T = d.pulseLength, K = chirpRate();
   const double dt = 1.0 / fs;
+  const double swst = ersSwstSeconds(swstCodeOf(line));
   StateVector sv{};
   bool haveSv = false;
   for (const TargetTruth& t : truth_) {
@@ -435,15 +443,15 @@ void RawSceneSimulator::addTargets(int line, fcomplex* row) const {
     const double s = sinc(x);
     const double a = t.amplitude * s * s;
     const double tau = 2.0 * R / kC;
-    const int j0 = std::max(0, static_cast<int>(std::ceil((tau - swst_) * fs)));
-    const int j1 = std::min(d.samples, static_cast<int>(std::ceil((tau + T - swst_) * fs)));
+    const int j0 = std::max(0, static_cast<int>(std::ceil((tau - swst) * fs)));
+    const int j1 = std::min(d.samples, static_cast<int>(std::ceil((tau + T - swst) * fs)));
     const double carrier = wrapPhase(-4.0 * kPi * R / lambda);
     // Chirp exp(j pi K u^2), u from the pulse centre; phase advanced by a
     // second-order recursion, re-seeded exactly every 64 samples.
     std::complex<double> z, w;
     const std::complex<double> ww = std::polar(1.0, 2.0 * kPi * K * dt * dt);
     for (int j = j0; j < j1; ++j) {
-      const double u = swst_ + j * dt - tau - 0.5 * T;
+      const double u = swst + j * dt - tau - 0.5 * T;
       if (((j - j0) & 63) == 0) {
         z = std::polar(a, kPi * K * u * u + carrier);
         w = std::polar(1.0, kPi * K * (2.0 * u * dt + dt * dt));
@@ -651,7 +659,7 @@ int RawSceneSimulator::writeErsScene(const std::string& outDir, std::string& err
         for (int k = 0; k < count; ++k) {
           const int line = first + k;
           quantiseLine(echoes.data() + static_cast<std::size_t>(k) * d.samples, iq.data());
-          const int code = swstCode_ + (corrupt[line] ? d.corruptSwstDelta : 0);
+          const int code = swstCodeOf(line) + (corrupt[line] ? d.corruptSwstDelta : 0);
           buildErsDataRecord(bytes.data() + recLen * k, static_cast<std::uint32_t>(position[line] + 2),
                              static_cast<std::uint32_t>(line + 1), d.samples, static_cast<std::uint16_t>(code),
                              static_cast<std::uint16_t>(priCode()), static_cast<std::uint32_t>(163840 + line),

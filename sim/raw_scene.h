@@ -46,6 +46,7 @@ struct SimPixelTarget {
 //             mean_anomaly_deg, epoch ("DD-MMM-YYYY HH:MM:SS.mmm", default the start)
 //   [Scene]   start_time, lines, samples, near_range_time_s,
 //             doppler_centroid_hz or yaw_deg/pitch_deg, pattern_extent,
+//             swst_change_line, swst_change_codes,
 //             orbit_number, frame, arc_number, facility, scene_dir,
 //             file_names (upper|lower), odr_form (xODR|@ODR), odr_records,
 //             bias_i, bias_q
@@ -78,6 +79,10 @@ struct SceneDescription {
   int lines = 2048;
   int samples = 1024;
   double nearRangeTime = 0.00555;        // wanted window start, two-way seconds
+  // A sampling-window change: from this line on (if >= 0) the window code
+  // moves by swstChangeCodes (4 / fs each).
+  int swstChangeLine = -1;
+  int swstChangeCodes = 0;
   std::vector<SimTarget> targets;
   std::vector<SimPixelTarget> pixelTargets;
   double clutterSigma = 0.0;             // counts per I/Q component, before quantisation
@@ -128,8 +133,10 @@ class RawSceneSimulator {
   double chirpRate() const { return 2.0 * scene_.chirpCoefficient; }
   double lineTime(int line) const { return scene_.startTime + line / scene_.prfHz; }
   int swstCode() const { return swstCode_; }
-  // Window start of the data, two-way seconds (the extractor's code formula).
+  // Window start of line 0, two-way seconds (the extractor's code formula).
   double swst() const { return swst_; }
+  // Window code of a line (with the scene's window change, if any).
+  int swstCodeOf(int line) const;
   int replicaLength() const;
   // Where the range-compressed peak lies after the two-way delay, samples.
   double rangePeakOffset() const;

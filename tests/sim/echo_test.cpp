@@ -328,3 +328,24 @@ TEST(SimEcho, AttitudeGivesTheCentroidOfTheTurnedBeam) {
   ASSERT_TRUE(ini.loadText("[Scene]\nyaw_deg = 0.2\ndoppler_centroid_hz = 10\n", err));
   EXPECT_FALSE(SceneDescription::fromIni(ini, s, err));
 }
+
+TEST(SimEcho, SamplingWindowChangeMovesTheEchoInTheWindow) {
+  SceneDescription s = smallScene();
+  s.dopplerCentroidHz = 0.0;
+  s.swstChangeLine = 1601;
+  s.swstChangeCodes = 20;  // 80 samples later
+  s.pixelTargets.push_back({1600.0, 200.0, 0.0, 1.0});
+  const RawSceneSimulator sim(s);
+  EXPECT_EQ(sim.swstCodeOf(1600), sim.swstCode());
+  EXPECT_EQ(sim.swstCodeOf(1601), sim.swstCode() + 20);
+  std::vector<fcomplex> raw;
+  sim.renderLines(1600, 2, raw);
+  auto peak = [&](int row) {
+    const std::vector<cdouble> rc = rangeCompress(raw.data() + static_cast<std::size_t>(row) * s.samples, s.samples, sim);
+    int m = 0;
+    for (int k = 0; k < static_cast<int>(rc.size()); ++k)
+      if (std::abs(rc[k]) > std::abs(rc[m])) m = k;
+    return m;
+  };
+  EXPECT_NEAR(peak(0) - peak(1), 80, 1);
+}
