@@ -89,6 +89,19 @@ bool scanItem(const std::string& item, double& v) {
   return true;
 }
 
+// A channel-relative path of plain element names ("Class/Element").
+bool plainPath(const std::string& path) {
+  if (path.empty()) return false;
+  size_t pos = 0;
+  while (true) {
+    size_t slash = path.find('/', pos);
+    std::string part = path.substr(pos, slash == std::string::npos ? std::string::npos : slash - pos);
+    if (part.empty() || xmlValidateNCName(X(part.c_str()), 0) != 0) return false;
+    if (slash == std::string::npos) return true;
+    pos = slash + 1;
+  }
+}
+
 template <typename T>
 int scanFlat(const std::string& text, T* dst, int n) {
   size_t pos = 0;
@@ -251,12 +264,16 @@ _xmlNode* orvanexml::createNode(const std::string& absolutePath) {
   size_t slash = absolutePath.rfind('/');
   if (slash == std::string::npos || slash == 0) return nullptr;
   std::string name = absolutePath.substr(slash + 1);
+  // Only plain element names are created; anything else would make the
+  // saved document unreadable.
+  if (name.empty() || xmlValidateNCName(X(name.c_str()), 0) != 0) return nullptr;
   xmlNodePtr parent = createNode(absolutePath.substr(0, slash));
-  if (parent == nullptr || name.empty()) return nullptr;
+  if (parent == nullptr) return nullptr;
   return xmlNewTextChild(parent, nullptr, X(name.c_str()), nullptr);
 }
 
 int orvanexml::createPath(int channel, const std::string& path, int n) {
+  if (!plainPath(path)) return 1;
   const std::string chan = channelPath(channel);
   if (evalXPath(chan) != 0) return 1;
   if (nodeCount() == 0) {

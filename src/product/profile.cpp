@@ -15,6 +15,7 @@
 #include <cstring>
 #include <iterator>
 #include <list>
+#include <new>
 
 #include "diag/report.h"
 
@@ -144,7 +145,12 @@ ProfileFile& loadFile(const std::string& path) {
     cache().push_back(ProfileFile{path, {}});
     pf = &cache().back();
     if (std::FILE* fp = std::fopen(path.c_str(), "rb")) {
-      parseProfile(fp, *pf);
+      try {
+        parseProfile(fp, *pf);
+      } catch (const std::bad_alloc&) {
+        std::fputs("Memory re-allocation failure\n", stderr);
+        std::exit(1);
+      }
       std::fclose(fp);
     }
   }

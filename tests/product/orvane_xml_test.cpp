@@ -219,4 +219,24 @@ TEST_F(OrvaneXmlTest, DescriptionAndIndentationOfParsedDocuments) {
   }
 }
 
+TEST_F(OrvaneXmlTest, InvalidElementNamesAreRefused) {
+  const std::string f = path("names.xml");
+  orvanexml doc(f);
+  const int one = 1;
+  EXPECT_EQ(doc.writeInt(1, "Tool/bad name", &one, 1), 1);
+  EXPECT_EQ(doc.writeInt(1, "Tool/9lives", &one, 1), 1);
+  EXPECT_EQ(doc.writeInt(1, "", &one, 1), 1);
+  EXPECT_EQ(doc.getNumberOfChannels(), 0);
+  EXPECT_EQ(doc.writeInt(1, "Tool/good-name_2", &one, 1), 0);
+  ASSERT_EQ(doc.write(), 0);
+  orvanexml back(f);
+  EXPECT_TRUE(back.isRecognised());
+  int v = 0;
+  EXPECT_EQ(back.readInt(1, "Tool/good-name_2", &v, 1), 0);
+  EXPECT_EQ(v, 1);
+  if (haveXmllint()) {
+    EXPECT_TRUE(xmllintAccepts(f));
+  }
+}
+
 }  // namespace
