@@ -127,6 +127,24 @@ TEST_F(ProfileTest, ParserConsequences) {
   EXPECT_EQ(get("Fresh", "k", f), "v");
 }
 
+TEST_F(ProfileTest, GetSetProfileCharModes) {
+  const std::string f = make("g.hdr", "[S]\nk = 1\n");
+  const std::string* v = GetSetProfileChar(0, "S", "k", "ignored", f);
+  ASSERT_NE(v, nullptr);
+  EXPECT_EQ(*v, "1");
+  EXPECT_EQ(GetSetProfileChar(0, "S", "absent", "", f), nullptr);
+  EXPECT_EQ(GetSetProfileChar(0, "T", "k", "", f), nullptr);
+  const std::string* w = GetSetProfileChar(1, "S", "k", "2", f);
+  ASSERT_NE(w, nullptr);
+  EXPECT_EQ(*w, "2");
+  EXPECT_EQ(v, w);  // the stored value is updated in place
+  ASSERT_NE(GetSetProfileChar(1, "T", "n", "3", f), nullptr);
+  EXPECT_EQ(*GetSetProfileChar(0, "T", "n", "", f), "3");
+  EXPECT_EQ(*v, "2");  // still valid after other keys were added
+  EXPECT_EQ(SyncProfile(f), 0);
+  EXPECT_EQ(slurp(f), "\n[S]\nk = 2\n\n[T]\nn = 3\n");
+}
+
 TEST_F(ProfileTest, KeyFormsAndUnterminatedSection) {
   const std::string f = make("forms.hdr",
                              "[S]\nk1=v\nk2 = v\n  k3   =    v  \n= v\n[Cut");
