@@ -12,6 +12,7 @@
 #include "diag/report.h"
 #include "diag/waitbar.h"
 #include "numerics/fitting.h"
+#include "product/general_sar.h"
 
 namespace {
 
@@ -60,7 +61,40 @@ OrtogNState g_ortogN;
 constexpr double kKeep = 0.99;
 constexpr double kTake = 1.0 - kKeep;  // 0.010000000000000009
 
+// Geometry of a raw raster from its record.
+int rasterFromRecord(const std::string& raw, OrtogRaster& r) {
+  GeneralSAR gs;
+  if (int st = gs.GSread(raw + ".hdr"); st != 0) return st;
+  const ROI_Obj& roi = gs.roi.roi;
+  r.lines = gs.dataFile.NrOfLinesPerImage > 0 ? gs.dataFile.NrOfLinesPerImage : roi.Lines;
+  r.samples = gs.dataFile.NrOfPixelsPerLine > 0 ? gs.dataFile.NrOfPixelsPerLine : roi.Samples;
+  r.prefixBytes = gs.dataFile.RowPrefix;
+  r.headerOffset = gs.dataFile.HeaderOffset;
+  r.slowStartTime = roi.SlowStartTime;
+  r.slowTimeDelta = roi.SlowTimeDelta;
+  return 0;
+}
+
 }  // namespace
+
+int Ortog::estimate() {
+  if (linesPerBlock > blockPitch) return 0;
+  OrtogRaster r;
+  if (int st = rasterFromRecord(rawFile, r); st != 0) {
+    ORV_REPORT_CALLED_ERROR();
+    return st;
+  }
+  return estimate(r);
+}
+
+int Ortog::apply_ortog() {
+  OrtogRaster r;
+  if (int st = rasterFromRecord(rawFile, r); st != 0) {
+    ORV_REPORT_CALLED_ERROR();
+    return st;
+  }
+  return apply_ortog(r);
+}
 
 int Ortog::estimate(const OrtogRaster& raster) {
   if (linesPerBlock > blockPitch) return 0;

@@ -42,11 +42,15 @@ class Ortog {
   double phase[3] = {0, 0, 0};  // radians
   double timeOrigin = 0.0;
 
+  // Reads the raster geometry from rawFile + ".hdr" and estimates.
+  int estimate();
   // Estimates with the geometry given.
   int estimate(const OrtogRaster& raster);
   // Corrects n samples of one line at slow time t.
   void apply_ortog(fcomplex* line, double t, int n) const;
-  // Corrects the whole raster rawFile in place.
+  // Corrects the whole raster rawFile in place (geometry from its record).
+  int apply_ortog();
+  // Same with the geometry given.
   int apply_ortog(const OrtogRaster& raster);
 };
 
