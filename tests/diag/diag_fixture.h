@@ -1,6 +1,7 @@
 #pragma once
 #include <gtest/gtest.h>
 #include <stdlib.h>
+#include <unistd.h>
 
 #include <filesystem>
 #include <fstream>
@@ -18,7 +19,8 @@ class DiagEnvironment : public ::testing::Test {
   void SetUp() override {
     const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
     dir_ = std::filesystem::path(::testing::TempDir()) /
-           (std::string("tessivor_diag_") + info->test_suite_name() + "_" + info->name());
+           (std::string("tessivor_diag_") + std::to_string(getpid()) + "_" + info->test_suite_name() +
+            "_" + info->name());
     std::filesystem::remove_all(dir_);
     std::filesystem::create_directories(dir_);
     working_ = dir_.string() + "/";

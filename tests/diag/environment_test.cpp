@@ -63,7 +63,7 @@ TEST(OrvaneException, Constructors) {
 }
 
 TEST(ParameterLines, TrimCarriageReturnCommentAndMarker) {
-  const std::string file = ::testing::TempDir() + "tessivor_parameter_lines.txt";
+  const std::string file = ::testing::TempDir() + "tessivor_parameter_lines_" + std::to_string(getpid()) + ".txt";
   std::ofstream(file, std::ios::binary) << "  first \r\n\n\tsecond\tpart \nx\ry\n   \n#cut\nafter\n";
   std::vector<std::string> lines;
   ASSERT_TRUE(readParameterLines(file, lines));
@@ -106,7 +106,7 @@ TEST(ErrorCatalogue, ShippedCataloguesHoldEveryCodeOfTheProgram) {
 }
 
 TEST(ErrorCatalogue, LayoutAndItsFaults) {
-  const std::string file = ::testing::TempDir() + "tessivor_catalogue.des";
+  const std::string file = ::testing::TempDir() + "tessivor_catalogue_" + std::to_string(getpid()) + ".des";
   std::ofstream(file) << "2\n4, file\n7\nFILE\nJOB\nErrorCodeInfo_4\n1\nzero\nErrorCodeInfo_7\n"
                          "3\na\n\nc\n";
   ErrorCatalogue catalogue;

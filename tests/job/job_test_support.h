@@ -1,5 +1,6 @@
 #pragma once
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <filesystem>
 #include <fstream>
@@ -7,13 +8,27 @@
 #include <string>
 #include <vector>
 
+// Folders made by the tests, removed when the test program ends.
+struct TestFolders {
+  std::vector<std::filesystem::path> made;
+  ~TestFolders() {
+    std::error_code ec;
+    for (const auto& dir : made) std::filesystem::remove_all(dir, ec);
+  }
+};
+inline TestFolders& testFolders() {
+  static TestFolders folders;
+  return folders;
+}
+
 // A fresh folder under the test temp folder for each test.
 inline std::string freshFolder(const std::string& name) {
   const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
   std::filesystem::path dir = std::filesystem::path(::testing::TempDir()) /
-                              ("tessivor_job_" + name + "_" + info->name());
+                              ("tessivor_job_" + std::to_string(getpid()) + "_" + name + "_" + info->name());
   std::filesystem::remove_all(dir);
   std::filesystem::create_directories(dir);
+  testFolders().made.push_back(dir);
   return dir.string() + "/";
 }
 
