@@ -49,6 +49,18 @@ struct Service {
   bool threadsReady = false;
   bool wisdomTried = false;
   std::string wisdomPath;  // rewritten after each newly measured plan
+  void destroyPlans() {
+    for (auto& [key, entry] : cache)
+      for (auto& inner : entry->variant)
+        for (fftwf_plan& p : inner)
+          if (p) fftwf_destroy_plan(p);
+    cache.clear();
+  }
+  // At exit: the plans and FFTW's own tables go too.
+  ~Service() {
+    destroyPlans();
+    if (threadsReady) fftwf_cleanup_threads();
+  }
 };
 
 Service& service() {
@@ -545,9 +557,5 @@ void fft_set_measure(bool measure) {
 void fft_cleanup() {
   Service& s = service();
   std::lock_guard<std::mutex> lock(s.mutex);
-  for (auto& [key, entry] : s.cache)
-    for (auto& inner : entry->variant)
-      for (fftwf_plan& p : inner)
-        if (p) fftwf_destroy_plan(p);
-  s.cache.clear();
+  s.destroyPlans();
 }
