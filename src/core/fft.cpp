@@ -3,6 +3,7 @@
 #include <fftw3.h>
 
 #include <algorithm>
+#include <atomic>
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
@@ -38,7 +39,8 @@ struct AxisKey {
 // [in place][aligned]. Entries live until fft_cleanup().
 struct AxisEntry {
   AxisKey key{};
-  fftwf_plan variant[2][2] = {{nullptr, nullptr}, {nullptr, nullptr}};
+  // Written under the service mutex, read without it by running transforms.
+  std::atomic<fftwf_plan> variant[2][2] = {{nullptr, nullptr}, {nullptr, nullptr}};
 };
 
 struct Service {
@@ -52,8 +54,8 @@ struct Service {
   void destroyPlans() {
     for (auto& [key, entry] : cache)
       for (auto& inner : entry->variant)
-        for (fftwf_plan& p : inner)
-          if (p) fftwf_destroy_plan(p);
+        for (auto& p : inner)
+          if (fftwf_plan q = p.load()) fftwf_destroy_plan(q);
     cache.clear();
   }
   // At exit: the plans and FFTW's own tables go too.
@@ -187,9 +189,9 @@ AxisEntry* axisEntry(const AxisKey& keyIn, bool inPlace, bool aligned) {
     it = s.cache.emplace(key, std::move(e)).first;
   }
   AxisEntry* e = it->second.get();
-  fftwf_plan& p = e->variant[inPlace][aligned];
-  if (!p) p = createVariant(s, key, inPlace, aligned);
-  return p ? e : nullptr;
+  std::atomic<fftwf_plan>& p = e->variant[inPlace][aligned];
+  if (!p.load()) p.store(createVariant(s, key, inPlace, aligned));
+  return p.load() ? e : nullptr;
 }
 
 fftwf_plan variantFor(AxisEntry* e, const void* in, void* out) {
@@ -197,10 +199,9 @@ fftwf_plan variantFor(AxisEntry* e, const void* in, void* out) {
   const bool aligned =
       fftwf_alignment_of(const_cast<float*>(static_cast<const float*>(in))) == 0 &&
       fftwf_alignment_of(static_cast<float*>(out)) == 0;
-  fftwf_plan p = e->variant[inPlace][aligned];
-  if (p) return p;
+  if (fftwf_plan p = e->variant[inPlace][aligned].load(std::memory_order_acquire)) return p;
   AxisEntry* made = axisEntry(e->key, inPlace, aligned);
-  return made ? made->variant[inPlace][aligned] : nullptr;
+  return made ? made->variant[inPlace][aligned].load() : nullptr;
 }
 
 bool validDirection(int d) { return d == 0 || d == 1 || d == -1 || d == -2; }

@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <numbers>
 #include <random>
+#include <thread>
 #include <vector>
 
 namespace {
@@ -223,6 +224,30 @@ TEST(FftPlan, ThreadCountDoesNotChangeResults) {
   fft_set_threads(0);
   for (int i = 0; i < n * rows; ++i) ASSERT_LT(std::abs(one[i] - two[i]), 1e-3f);
   EXPECT_GE(fft_get_threads(), 1);
+}
+
+TEST(FftPlan, ConcurrentCallersShareTheCache) {
+  // Several threads make and run plans of the same and of new shapes at once.
+  std::vector<int> bad(4, 0);
+  std::vector<std::thread> workers;
+  for (int t = 0; t < 4; ++t) {
+    workers.emplace_back([t, &bad] {
+      for (int rep = 0; rep < 20; ++rep) {
+        const int n = 40 + 3 * ((rep + t) % 7);
+        auto x = randomSignal(n + 1, 100 + rep);
+        std::vector<fcomplex> y(n + 1), z(n + 1);
+        // Odd offset: the unaligned variant is made on demand.
+        if (fft_c(n, n, 1, 1, FFT_FORWARD, FFT_NONE, x.data() + (rep % 2), y.data() + (rep % 2)) ||
+            fft_c(n, n, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, y.data() + (rep % 2),
+                  z.data() + (rep % 2)))
+          ++bad[t];
+        for (int k = 0; k < n; ++k)
+          if (std::abs(z[k + rep % 2] - x[k + rep % 2]) > 1e-5f) ++bad[t];
+      }
+    });
+  }
+  for (auto& w : workers) w.join();
+  EXPECT_EQ(bad, std::vector<int>(4, 0));
 }
 
 TEST(ChirpZ, EqualsTheDftForTheUnitCircleGrid) {
