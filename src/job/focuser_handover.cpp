@@ -22,5 +22,3 @@ class UnavailableFocuser : public JobFocuser {
 }  // namespace
 
 std::unique_ptr<JobFocuser> makeJobFocuser() { return std::make_unique<UnavailableFocuser>(); }
-
-void finishJobProducts(const JobFocuser&, const std::vector<std::string>&, int) {}
