@@ -1,0 +1,122 @@
+#pragma once
+#include "base/fcomplex.h"
+
+// Omega-K focusing of one azimuth block: the block parameter record, the
+// wavenumber grids and the kernels. A block is stored as `lines` rows, each
+// of `samples` range samples.
+
+struct AzimuthBlockPar {
+  int verbose = 0;
+  int lines = 0;             // azimuth rows in the block
+  int samples = 0;           // range samples per row
+  double fc = 0.0;           // carrier, Hz
+  double frg = 0.0;          // range sampling rate, Hz
+  double dc = 0.0;           // Doppler centroid, Hz
+  double scale = 1.0;        // output spacing factor, 1.0 = keep the grid
+  double azshift = 0.0;      // azimuth shift, s (== lines: automatic)
+  double rgshift = 0.0;      // range shift, s (== samples: automatic)
+  int reestimate = 0;        // 1 = re-estimate the centroid per block
+  double prf = 0.0;          // Hz
+  double fr0 = 0.0;          // Doppler rate: constant,
+  double fr1 = 0.0;          //   linear
+  double fr2 = 0.0;          //   and quadratic in fast time
+  double t0 = 0.0;           // fast time of sample 0, s
+  double trg0 = 0.0;         // rate polynomial reference, s
+  double AntennaLength = 0.0;  // m
+  double azw = 0.0;          // azimuth window pedestal, 0 = no window
+  double rgw = 0.0;          // range window pedestal, 0 = no window
+  double azlook = 0.0;       // azimuth look bandwidth, Hz
+  double rglook = 0.0;       // range look bandwidth, Hz
+  double aztrans = 0.0;      // azimuth transition bandwidth, Hz
+  double rgtrans = 0.0;      // range transition bandwidth, Hz
+  int whiten = 0;            // antenna pattern whitening
+  int conj = 0;              // 1 = conjugated processing
+  fcomplex* data = nullptr;  // the block
+  fcomplex* out = nullptr;   // separate output block, used when scale != 1.0
+  double Req = 0.0;          // equivalent near range, m
+  double Veq = 0.0;          // equivalent speed, m/s
+  int interp = 0;            // 0 FastWK, 1 ChirpInterpWK, >1 LSInterpWK taps per side
+  double pad = 0.0;          // Stolt padding fraction
+  double dcref = 0.0;        // fixed reference centroid, 0 = none
+  double bw = 0.0;           // range bandwidth, Hz
+  int final = 0;             // 1 = remove the residual k0 offset at the end
+};
+
+// What focazwk tells its caller about the block it focused.
+struct AzimuthBlockOut {
+  int lines = 0;
+  int samples = 0;
+  double spacing = 0.0;  // range spacing, m
+  double dc = 0.0;       // centroid used, Hz
+  double aztime = 0.0;   // azimuth time offset, s
+  double rgtime = 0.0;   // range time offset, s
+};
+
+// Equivalent speed and range (par.Veq, par.Req) from the Doppler rate at near
+// and far range of the block. 1 (with a report) when the rate does not vary
+// over the block, which leaves the geometry undefined.
+int MyComputeEqPar(AzimuthBlockPar& par);
+
+// k0 = 4 pi fc / c; kx from dc (or dcref when set); kz = sqrt(k0^2 - kx^2).
+void ComputeWaveNumbers(const AzimuthBlockPar& par, double& k0, double& kx, double& kz);
+
+// Angular aperture and the azimuth (a, b) and range (c, d) window fractions.
+// Resets par.azw / par.rgw to 0 (with a message) when the look bandwidth is
+// larger than the sampled one.
+void WindowPars(AzimuthBlockPar& par, double& aperture, double& a, double& b, double& c,
+                double& d);
+
+// Azimuth wavenumbers of the block rows in transform order, wrapped around dc
+// modulo prf: kx, kx^2 and dk = k0 - sqrt(kx^2 + kz^2). Arrays of par.lines.
+void AzimuthGrid(const AzimuthBlockPar& par, double* kx, double* kx2, double* dk);
+
+// Azimuth and range reference distances (m) of the block.
+void ShiftDistances(const AzimuthBlockPar& par, double& az, double& rg);
+
+// out[i] = in[i] exp(j (i step k + k offset)) / divisor for i < n, then zeros
+// up to `total`. `in` may equal `out`.
+void RngShift(const fcomplex* in, int n, double step, double k, fcomplex* out, int total,
+              double offset, double divisor);
+
+// Output grid of the block: FFT length, range spacing (m), padded input
+// length and output samples. 1 when the squint reaches the geometric limit.
+int OutImagePar(const AzimuthBlockPar& par, int& fftlen, double& spacing, int& padded,
+                int& outsamples);
+
+// Focuses par.data in place (or into par.out) with the kernel chosen by
+// par.interp.
+int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
+
+// Walks the block in overlapping range sub-blocks of `subSamples` samples,
+// `overlap` the full overlap. poly[5]: Doppler centroid in fast time about
+// `tref`. block / blocks feed the progress bar.
+int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
+            const double poly[5], double tref, int block = 0, int blocks = 1);
+
+// Omega-K kernel without Stolt interpolation.
+int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const double* dk,
+           double az, double rg);
+
+// Raised-cosine rule: 1 for excess <= 0, pedestal + (1 - pedestal) cos(pi
+// excess / width) for excess below width, else 0.
+double wk_raised_cosine(double excess, double width, double pedestal);
+
+// Antenna pattern term P = sc^4 + sm^4 + sp^4 with L = AntennaLength fc / c
+// and Bx = 2 pi prf / Veq, at squint sq, wavenumber k and row wavenumber kx.
+double wk_pattern_term(double L, double sq, double k, double kx, double Bx);
+
+// Per-block set-up of the weighting shared by the omega-K kernels: the
+// pattern term, whitening and the azimuth and range windows.
+struct WKWeighting {
+  bool active = false;  // any of rgw, azw, whiten
+  int whiten = 0;
+  double azw = 0.0, rgw = 0.0;
+  double aperture = 0.0, a = 0.0, b = 0.0, c = 0.0, d = 0.0;
+  double L = 0.0, Bx = 0.0, Bk = 0.0, sq = 0.0, k0 = 0.0;
+  // Calls WindowPars on par (so it may reset par.azw / par.rgw).
+  explicit WKWeighting(AzimuthBlockPar& par);
+  // Range window term of wavenumber k (1 when rgw is 0).
+  double rangeTerm(double k) const;
+  // Whitening times azimuth window at (k, kx); P receives the pattern term.
+  double azimuthTerm(double k, double kx, double& P) const;
+};
