@@ -1,0 +1,157 @@
+#pragma once
+// The focusing chain of one stripmap scene: range focusing, Doppler centroid
+// estimation, geometric polynomials, azimuth focusing, the product record and
+// optionally a multi-looked product. Alternating-polarisation data run twice
+// and each channel is de-scalloped.
+#include <memory>
+#include <string>
+
+#include "base/fcomplex.h"
+
+class GeneralSAR;
+
+// Flat configuration of the chain, read from the parameter profile.
+struct SARFocuser_conf {
+  // "sarfocuserConfiguration"
+  int Incore = 0;
+  int Memory = 0;  // MiB
+  int Verbose = 0;
+  int ReportLevel = 0;
+  std::string ReportFilename;
+  std::string ProcessingConfFile;
+  double DCref = 0.0;
+  int DeleteTempFiles = 0;
+
+  // "DCestConf"
+  double RgBand = 0.0;
+  int Blocks = 0;
+  int Blockl = 0;
+  double AnLen = 0.0;
+  double Kthr = 0.0;
+  double Sthr = 0.0;
+  double Varthr = 0.0;
+  double Lookbf = 0.0;
+  double Lookbt = 0.0;
+  double Lookrp = 0.0;
+  double Lookrs = 0.0;
+  int Decfac = 0;
+  int Flength = 0;
+  double Dftstep = 0.0;
+  double Fftrgprc = 0.0;
+  double Fftazprc = 0.0;
+  double Peakwid = 0.0;
+  double Minamb = 0.0;
+  double Maxamb = 0.0;
+  int Nbestblocks = 0;
+  int Nummlbf = 0;
+  int Nwdarblocks = 0;
+  int Patchs = 0;
+  int Patchl = 0;
+  int Dswst = 0;
+  int Amb_flag = 0;
+  int Pol_Weights[7] = {1, 1, 1, 1, 1, 1, 1};
+
+  // "AzimuthConf"
+  double AntennaLength = 0.0;
+  int WhiteningFlag = 0;
+  double RangeWindowHammingParameter = 0.0;
+  double AzimuthWindowHammingParameter = 0.0;
+  double RangeLookBandwidth = 0.0;       // fraction of frg_hz
+  double AzimuthLookBandwidth = 0.0;     // fraction of prf_hz
+  double RangeTransitionBandwidth = 0.0;
+  double AzimuthTransitionBandwidth = 0.0;
+  int LinesInBlock = 0;
+  int SamplesInBlock = 0;
+  int RangeOverlap = 0;    // halved at reading
+  int AzimuthOverlap = 0;  // halved at reading
+  int PerformInterpolation = 0;
+  double StoltPadding = 0.0;
+  double ApplyAzShift = 0.0;  // 1.0: the whole image
+  double ApplyRgShift = 0.0;  // 1.0: the whole image
+
+  // "GeneralProcessingConf"
+  int Flag_rangefoc = 1;
+  int Flag_rgpatt = 0;
+  int Flag_azimuthfoc = 1;
+  int Flag_dcest = 1;
+  int Flag_ortog = 1;
+  int Flag_swstal = 1;
+  int Azblk = 1024;
+  int Multilook = 0;
+
+  // Set by the stage template once the block is filled for a run.
+  int Flag_set = 0;
+
+  // Clears the block to its reading defaults, then reads the section
+  // "sarfocuserConfiguration" of file and, through readconf, the profile it
+  // names (ProcessingConfFile). 0, or the profile status.
+  int readpar(const std::string& file);
+  // Reads "DCestConf", "AzimuthConf" and "GeneralProcessingConf" of file.
+  int readconf(const std::string& file);
+  // Back to the state readpar starts from: zeros, with Flag_ortog = 1,
+  // Flag_swstal = 1, Azblk = 1024, all Pol_Weights 1.
+  void clear();
+};
+
+struct SARFocuser_input {
+  std::string RawDataFile;
+  std::string ChirpFile;
+  std::string AntennaFile;
+  // Section "sarfocuserInput"; 10 without RawDataFile.
+  int readpar(const std::string& file);
+};
+
+struct SARFocuser_output {
+  std::string OutputFilename;
+  // Section "sarfocuserOutput"; 10 without OutputFilename.
+  int readpar(const std::string& file);
+};
+
+class SARFocuser {
+ public:
+  explicit SARFocuser(SARFocuser_conf* conf = nullptr);
+  ~SARFocuser();
+  SARFocuser(const SARFocuser&) = delete;
+  SARFocuser& operator=(const SARFocuser&) = delete;
+
+  // Focuses RawDataFile (or, when it does not exist, the two channels
+  // RawDataFile "1" and "2" of an alternating-polarisation scene). 0, 10 for
+  // a missing raw or chirp file, or the status of the failing stage.
+  int run();
+
+  // One raster through the chain (input names and OutputFilename set).
+  int process();
+  // Removes the periodic azimuth gain of burst-mode data from OutputFilename
+  // and writes OutputFilename + "_descallop" with its record.
+  int descallop();
+
+  void setConf(SARFocuser_conf* conf) { conf_ = conf; }
+  SARFocuser_conf* getConf() const { return conf_; }
+
+  std::string RawDataFile;
+  std::string AntennaFile;
+  std::string ChirpFile;
+  std::string OutputFilename;
+
+ private:
+  SARFocuser_conf* conf_ = nullptr;  // not owned
+};
+
+// Thin parameter calls on the profile library: (file, key, count, value,
+// 1, section). 0 when found.
+int GetParString(const std::string& file, const std::string& key, int count, std::string* value,
+                 int flag, const std::string& section);
+int GetParInt(const std::string& file, const std::string& key, int count, int* value, int flag,
+              const std::string& section);
+int GetParFloat(const std::string& file, const std::string& key, int count, float* value, int flag,
+                const std::string& section);
+int GetParDouble(const std::string& file, const std::string& key, int count, double* value,
+                 int flag, const std::string& section);
+int SetParString(const std::string& file, const std::string& key, int count,
+                 const std::string* value, int flag, const std::string& section);
+int SetParInt(const std::string& file, const std::string& key, int count, const int* value,
+              int flag, const std::string& section);
+int SetParFloat(const std::string& file, const std::string& key, int count, const float* value,
+                int flag, const std::string& section);
+int SetParDouble(const std::string& file, const std::string& key, int count, const double* value,
+                 int flag, const std::string& section);
