@@ -1,10 +1,94 @@
+// ERS-1/2 level-0 extraction from the CEOS leader and image file.
 #include "ingest/ers_extractor.h"
 
+#include <algorithm>
 #include <climits>
+#include <cmath>
+#include <cstdint>
+#include <cstdio>
+#include <cstdlib>
+#include <ctime>
+#include <fstream>
+#include <new>
 
+#include "base/status.h"
 #include "diag/report.h"
+#include "diag/waitbar.h"
+#include "ingest/ceos_fields.h"
+#include "orbit/general_sar_orbit.h"
+#include "product/time_base.h"
+
+namespace {
+
+constexpr double kSpeedOfLight = 299792458.0;
+// Sampling window start of a line from its window code, seconds.
+constexpr double kSwstStep = 2.10943e-07;
+constexpr double kSwstOffset = 0.005357529;
+constexpr double kRangeGateBias = -6.627e-06;
+constexpr int kImageDescriptor = 11644;
+constexpr int kRecordPrefix = 412;
+constexpr int kMaxSwstJump = 200;
+constexpr int kVectorBytes = 132;
+constexpr double kAbsentBias = -100.0;
+constexpr const char* kMonths[12] = {"JAN", "FEB", "MAR", "APR", "MAY", "JUN",
+                                     "JUL", "AUG", "SEP", "OCT", "NOV", "DEC"};
+
+int failure(const std::string& message, int status, int line, const char* function) {
+  orv_add_report(message, REPORT_ERROR, line, function, __FILE__);
+  return status;
+}
+#define ERS_FAIL(message, status) failure((message), (status), __LINE__, __func__)
+
+int calledError(int status, int line, const char* function) {
+  orv_add_report("Called function returned ERROR", REPORT_ERROR_CALL_TREE, line, function, __FILE__);
+  return status;
+}
+#define ERS_CALLED(status) calledError((status), __LINE__, __func__)
+
+std::string trimmed(const std::string& s) {
+  const auto first = s.find_first_not_of(' ');
+  if (first == std::string::npos) return {};
+  return s.substr(first, s.find_last_not_of(' ') - first + 1);
+}
+
+std::uint32_t be32(const unsigned char* p) {
+  return (std::uint32_t(p[0]) << 24) | (std::uint32_t(p[1]) << 16) | (std::uint32_t(p[2]) << 8) |
+         std::uint32_t(p[3]);
+}
+
+int be16(const unsigned char* p) { return (int(p[0]) << 8) | int(p[1]); }
+
+// Fixed fields of a file held in memory; a field past the end is a short read.
+class FieldReader {
+ public:
+  explicit FieldReader(const std::vector<char>& bytes) : bytes_(bytes) {}
+  bool has(long offset, int length) const {
+    return offset >= 0 && offset + length <= static_cast<long>(bytes_.size());
+  }
+  const char* at(long offset) const { return bytes_.data() + offset; }
+  std::string text(long offset, int length) const { return ceosText(at(offset), length); }
+  double real(long offset, int length) const { return FtoDouble(at(offset), length); }
+  double real2(long offset, int length) const { return FtoDouble2(at(offset), length); }
+  int integer(long offset, int length) const { return ch2int(at(offset), length); }
+
+ private:
+  const std::vector<char>& bytes_;
+};
+
+// Text date of the first state vector: "DD-MMM-YYYY hh:mm:ss.mmm000".
+std::string vectorStartText(int day, int month, const std::string& year, double secondsOfDay) {
+  const long ms = std::lround(secondsOfDay * 1000.0);  // half away from zero
+  const long h = ms / 3600000, m = (ms / 60000) % 60, s = (ms / 1000) % 60, f = ms % 1000;
+  char text[64];
+  std::snprintf(text, sizeof text, "%02d-%s-%s %02ld:%02ld:%02ld.%03ld000", day, kMonths[month - 1],
+                year.c_str(), h, m, s, f);
+  return text;
+}
+
+}  // namespace
 
 ATERSExtractor::ATERSExtractor() { createElementsVector(10); }
+
 ATERSExtractor::~ATERSExtractor() = default;
 
 void ATERSExtractor::refreshParameters() {
@@ -22,25 +106,283 @@ void ATERSExtractor::refreshParameters() {
 }
 
 int ATERSExtractor::createBuffers() { return createBuffersDefault(); }
+
 int ATERSExtractor::destroyBuffers() {
   setAllocationFlag(false);
   return 0;
 }
+
 int ATERSExtractor::checkpar() {
   checkAuxiliaryFile();
   return 0;
 }
+
 int ATERSExtractor::readpar(const std::string& file, int channel) {
   readAuxiliaryFile(file, channel, "ATERSExtractor");
   return 0;
 }
+
 int ATERSExtractor::writepar(const std::string& file, int channel) {
   return writeAuxiliaryFile(file, channel, "ATERSExtractor");
 }
-int ATERSExtractor::InitProcessing(const std::string&, int) { return 1; }
-int ATERSExtractor::run() { return 1; }
-int ATERSExtractor::FinalizeProcessing(const std::string&, int) { return 0; }
-int ATERSExtractor::runall(const std::string&, int) { return 1; }
-int ATERSExtractor::ExtractChirp() { return 1; }
-int ATERSExtractor::readLeader() { return 1; }
-int ATERSExtractor::readImage() { return 1; }
+
+int ATERSExtractor::InitProcessing(const std::string& file, int channel) {
+  init_report(0, "ATERSExtractor REPORT", ReportLevel);
+  if (int st = readpar(file, channel); st != 0) return ERS_CALLED(st);
+  if (int st = checkpar(); st != 0) return ERS_CALLED(st);
+  return 0;
+}
+
+int ATERSExtractor::FinalizeProcessing(const std::string&, int) {
+  exit_report();
+  return 0;
+}
+
+int ATERSExtractor::runall(const std::string& file, int channel) {
+  std::string target = ReportFilename;
+  if (getConfigurationFile(file, channel, "ATERSExtractor", target)) {
+    ReportFilename = target;
+    return 1;
+  }
+  if (int st = InitProcessing(file, channel); st != 0) return ERS_CALLED(st);
+  if (int st = run(); st != 0) return ERS_CALLED(st);
+  if (int st = FinalizeProcessing(file, channel); st != 0) return ERS_CALLED(st);
+  return 0;
+}
+
+int ATERSExtractor::run() {
+  if (int st = readLeader(); st != 0) return ERS_CALLED(st);
+  GeneralSAROrbit& orbit = rawData.orbit();
+  orbit.SVDestroy();
+  if (int st = orbit.GetStateVectorsERS(OrbitFilename, rawData.roi.SlowStartTime,
+                                        rawData.roi.SlowTimeLength, rawData.dataSetInfo.Description);
+      st != 0) {
+    orbit.SVDestroy();
+    return ERS_CALLED(st);
+  }
+  int st = readImage();
+  if (st == 0) st = rawData.writehdr();
+  if (st == 0 && !ChirpFile.empty()) st = ExtractChirp();
+  orbit.SVDestroy();
+  if (st != 0) return ERS_CALLED(st);
+  return 0;
+}
+
+int ATERSExtractor::readLeader() {
+  std::vector<char> bytes;
+  {
+    std::ifstream in(LeaFilename, std::ios::binary);
+    if (LeaFilename.empty() || !in) return ERS_FAIL("File not opened! " + LeaFilename, STATUS_NOT_OPENED);
+    bytes.assign(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+  }
+  const FieldReader f(bytes);
+  // Data set summary, then the head of the platform position record.
+  if (!f.has(0, 2788 + 22))
+    return ERS_FAIL("File reading failed! " + LeaFilename, STATUS_READ_FAILED);
+  auto bad = [this](const char* what) {
+    return std::string("Bad ") + what + " in the leader file " + LeaFilename;
+  };
+
+  SamplingConstants_Obj& smp = rawData.sampling;
+  SARPulse_Obj& pulse = rawData.pulse;
+  DataSetInfo_Obj& info = rawData.dataSetInfo;
+  ROI_Obj& roi = rawData.roi;
+
+  info.SceneID = trimmed(f.text(740, 32));
+  info.Description = f.text(1116, 4);
+  info.Polarization = std::string(1, f.at(1148)[0]) + "/" + std::string(1, f.at(1148)[1]);
+  info.OrbitNumber = trimmed(f.text(1164, 8));
+
+  smp.fc_hz = f.real(1212, 8) * 1000000000.0;
+  if (!(smp.fc_hz > 0.0)) return ERS_FAIL(bad("radar frequency"), STATUS_BAD_PARAMETER);
+  smp.lambda_m = kSpeedOfLight / smp.fc_hz;
+  chirpCoefficient_ = f.real2(1366, 16);
+  smp.Brg_hz = chirpCoefficient_;
+  const double rateMHz = f.real(1430, 16);
+  if (!(rateMHz > 0.0)) return ERS_FAIL(bad("range sampling rate"), STATUS_BAD_PARAMETER);
+  smp.frg_hz = rateMHz * 1000000.0;
+  pulse.PulseSamplingRate = smp.frg_hz;
+  smp.Trg_s = 1.0 / smp.frg_hz;
+  roi.FastTimeDelta = smp.Trg_s;
+  (void)f.real(2486, 16);  // range time of the first pixel: not used
+  (void)f.real(1446, 16);
+  pulse.PulseLength = f.real(1462, 16) / 1000000.0;
+  if (!(pulse.PulseLength > 0.0)) return ERS_FAIL(bad("pulse length"), STATUS_BAD_PARAMETER);
+  smp.Brg_hz = 2.0 * pulse.PulseLength * chirpCoefficient_;
+  pulse.Bandwidth = smp.Brg_hz;
+  biasI_ = f.real(1538, 16);
+  biasQ_ = f.real(1554, 16);
+  if (biasI_ < kAbsentBias) biasI_ = 0.0;
+  if (biasQ_ < kAbsentBias) biasQ_ = 0.0;
+  const double prf = f.real(1654, 16);
+  if (!(prf > 0.0)) return ERS_FAIL(bad("PRF"), STATUS_BAD_PARAMETER);
+  smp.prf_hz = prf;
+  smp.brf_hz = prf;
+  smp.pri_s = 1.0 / prf;
+  roi.SlowTimeDelta = smp.pri_s;
+  info.AcquisitionStation = trimmed(f.text(1766, 16));
+  roi.FastTimeLength = f.real(2518, 16);  // provisional, replaced by the image pass
+  const double first = ascii2sec85(f.text(2534, 24));
+  const double last = ascii2sec85(f.text(2582, 24));
+  if (!(first > 0.0)) return ERS_FAIL(bad("time of the first line"), STATUS_BAD_PARAMETER);
+  roi.SlowStartTime = first;
+  rawData.swath.Acquisition_Start_Time = first;
+  roi.SlowTimeLength = last - first;
+
+  // State vectors of the platform position record.
+  const int count = f.integer(2746, 4);
+  const std::string year = f.text(2750, 4);
+  const int month = f.integer(2754, 4);
+  const int day = std::atoi(f.text(2760, 2).c_str());
+  const double secondsOfDay = f.real2(2766, 22);
+  const double interval = f.real2(2788, 22);
+  if (count < 1) return ERS_FAIL(bad("number of state vectors"), STATUS_BAD_PARAMETER);
+  if (!f.has(2992, count * kVectorBytes))
+    return ERS_FAIL("File reading failed! " + LeaFilename, STATUS_READ_FAILED);
+  if (month < 1 || month > 12) return ERS_FAIL(bad("state vector month"), STATUS_BAD_PARAMETER);
+  const double t0 = ascii2sec85(vectorStartText(day, month, year, secondsOfDay));
+  GeneralSAROrbit& orbit = rawData.orbit();
+  orbit.setLambda(smp.lambda_m);
+  if (int st = orbit.SVCreate(t0, interval, count); st != 0) return ERS_CALLED(st);
+  for (int k = 0; k < count; ++k) {
+    const long base = 2992 + long(k) * kVectorBytes;
+    for (int j = 0; j < 3; ++j) {
+      orbit.pos[3 * std::size_t(k) + std::size_t(j)] = f.real2(base + 22 * j, 22);
+      orbit.vel[3 * std::size_t(k) + std::size_t(j)] = f.real2(base + 66 + 22 * j, 22);
+    }
+  }
+  return 0;
+}
+
+int ATERSExtractor::readImage() {
+  vectorsReady_ = false;
+  missingLines_ = 0;
+  std::ifstream in(ImgFilename, std::ios::binary);
+  if (ImgFilename.empty() || !in) return ERS_FAIL("File not opened! " + ImgFilename, STATUS_NOT_OPENED);
+  std::vector<char> descriptor(kImageDescriptor);
+  if (!in.read(descriptor.data(), kImageDescriptor))
+    return ERS_FAIL("File reading failed! " + ImgFilename, STATUS_READ_FAILED);
+  const int records = ch2int(descriptor.data() + 180, 6);
+  const int samples = ch2int(descriptor.data() + 248, 8);
+  if (records < 1 || samples < 1)
+    return ERS_FAIL("Bad record count or line length in the image file " + ImgFilename,
+                    STATUS_BAD_PARAMETER);
+
+  const int skip = static_cast<int>(static_cast<long long>(skipPercent) * records / 100);
+  int lines = records - skip;
+  if (extractPercent > 0 && extractPercent + skipPercent < 100)
+    lines = static_cast<int>(static_cast<long long>(records) * extractPercent / 100);
+  if (skip < 0 || lines < 0 || skip + lines > records)
+    return ERS_FAIL("Bad part of the scene to extract", STATUS_BAD_PARAMETER);
+
+  ROI_Obj& roi = rawData.roi;
+  DataSetInfo_Obj& info = rawData.dataSetInfo;
+  roi.SlowStartTime += skip * roi.SlowTimeDelta;
+  roi.Samples = samples;
+  roi.Lines = lines;
+
+  DataFile& out = rawData.dataFile;
+  out.filename = OutputFile;
+  out.NrOfPixelsPerLine = samples;
+  out.NrOfLinesPerImage = lines;
+  out.RowPrefix = 4;
+  out.CellType = FLOAT_COMPLEX;
+  out.HeaderOffset = 0;
+  out.ByteOrder = host_byte_order();
+  out.buffersize = 0;
+  rawData.rasterName = OutputFile;
+
+  const std::size_t recordBytes = kRecordPrefix + 2 * std::size_t(samples);
+  std::vector<unsigned char> record;
+  std::vector<float> row;
+  try {
+    record.resize(recordBytes);
+    row.resize(1 + 2 * std::size_t(samples));
+    swstVector.assign(std::size_t(lines), 0);
+    missingVector.assign(std::size_t(lines), 0);
+    counterVector.assign(std::size_t(lines), 0);
+  } catch (const std::bad_alloc&) {
+    return ERS_FAIL("Memory allocation failed for the ERS line buffers", STATUS_NO_MEMORY);
+  }
+  if (int st = out.open(1); st != 0) return ERS_CALLED(st);
+
+  const float biasI = static_cast<float>(biasI_), biasQ = static_cast<float>(biasQ_);
+  double swstMin = 1.0, swstMax = 0.0;
+  int previousCode = 0, lastPercent = -1;
+  int status = 0;
+  waitbar_open("Extracting ERS Raw Data");
+  const int total = skip + lines;
+  for (int pos = 0; pos < total; ++pos) {
+    const int percent = static_cast<int>(100.0 * pos / total);
+    if (percent != lastPercent) {
+      waitbar_update(0, static_cast<float>(percent));
+      lastPercent = percent;
+    }
+    if (!in.read(reinterpret_cast<char*>(record.data()), static_cast<std::streamsize>(recordBytes))) {
+      status = ERS_FAIL("File reading failed! " + ImgFilename + ": record " + std::to_string(pos + 1) +
+                            " is missing or short",
+                        STATUS_READ_FAILED);
+      break;
+    }
+    const int number = static_cast<int>(be32(record.data() + 12));
+    const int missing = number != pos + 1 ? 1 : 0;
+    missingLines_ += missing;
+    int code = be16(record.data() + 214);
+    if (pos > 0 && std::abs(code - previousCode) > kMaxSwstJump) code = previousCode;
+    previousCode = code;
+    const float swst = static_cast<float>(code * kSwstStep + kSwstOffset + kRangeGateBias);
+    if (pos < skip) continue;
+
+    row[0] = swst;
+    const unsigned char* iq = record.data() + kRecordPrefix;
+    float* px = row.data() + 1;
+    for (int s = 0; s < samples; ++s) {
+      px[2 * s] = static_cast<float>(iq[2 * s]) - 15.5f - biasI;
+      px[2 * s + 1] = static_cast<float>(iq[2 * s + 1]) - 15.5f - biasQ;
+    }
+    swstMin = std::min(swstMin, static_cast<double>(swst));
+    swstMax = std::max(swstMax, static_cast<double>(swst));
+    if (int st = out.write(row.data(), static_cast<int64_t>(row.size() * sizeof(float))); st != 0) {
+      status = ERS_CALLED(st);
+      break;
+    }
+    const std::size_t k = std::size_t(pos - skip);
+    swstVector[k] = code;
+    missingVector[k] = missing;
+    counterVector[k] = number;
+  }
+  waitbar_close();
+  const int closed = out.close();
+  if (status != 0) return status;
+  if (closed != 0) return ERS_CALLED(closed);
+
+  SamplingConstants_Obj& smp = rawData.sampling;
+  roi.FastStartTime = swstMin;
+  info.SWST_MIN = swstMin;
+  info.SWST_MAX = swstMax;
+  roi.FastTimeLength = samples * smp.Trg_s;
+  rawData.swath.Rgate_bias = kRangeGateBias;
+  info.SetImageType(DataSetInfo_Obj::IT_RAW_DATA);
+  info.SetAcqMode(DataSetInfo_Obj::AM_STRIPMAP);
+  info.SetUnitType(DataSetInfo_Obj::UT_VOLT);
+  info.SetProjection(DataSetInfo_Obj::PR_SLANT_RANGE);
+  info.MissingLines = missingLines_;
+  // Description holds four characters, so this is ERS2 for both satellites;
+  // the orbit reader decides on Description itself.
+  info.SetSensorType(info.Description == "ERS-1" ? DataSetInfo_Obj::ST_ERS1 : DataSetInfo_Obj::ST_ERS2);
+  const std::time_t now = std::time(nullptr);
+  char stamp[64] = {};
+  ctime_r(&now, stamp);
+  info.ProcessingDate = std::string(stamp).substr(0, 24);
+  std::string sense;
+  sec852ascii(roi.SlowStartTime, sense);
+  info.SenseDate = sense.substr(0, 27);
+  vectorsReady_ = true;
+  return 0;
+}
+
+int ATERSExtractor::ExtractChirp() {
+  if (int st = rawData.readhdr(OutputFile + ".hdr"); st != 0) return ERS_CALLED(st);
+  if (int st = rawData.pulse.writeChirp(ChirpFile); st != 0) return ERS_CALLED(st);
+  return 0;
+}
