@@ -1,0 +1,236 @@
+// Azimuth focusing driver: overlapping azimuth blocks through multirg,
+// stitched into the focused raster, with its start times and spacings.
+#include "core/azimuth_focus.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <cstring>
+#include <memory>
+#include <new>
+
+#include "base/status.h"
+#include "core/azimuth_block.h"
+#include "core/fft.h"
+#include "diag/report.h"
+#include "diag/waitbar.h"
+
+namespace {
+
+constexpr double kC = 299792458.0;
+
+struct FileCloser {
+  void operator()(std::FILE* f) const {
+    if (f) std::fclose(f);
+  }
+};
+using File = std::unique_ptr<std::FILE, FileCloser>;
+
+int fail(const char* message, int status, int line, const char* function) {
+  orv_add_report(message, REPORT_ERROR, line, function, __FILE__);
+  return status;
+}
+#define AF_FAIL(message, status) fail((message), (status), __LINE__, __func__)
+
+}  // namespace
+
+int azimuth_block_plan(int lines, int linesInBlock, int halfOverlap, AzimuthBlockPlan& plan) {
+  plan.overlap = 2 * halfOverlap;
+  plan.step = linesInBlock - plan.overlap;
+  if (plan.step <= 0) {
+    ORV_REPORT("Azimuth block not longer than the azimuth overlap", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  plan.last = (lines - plan.overlap) / plan.step;
+  plan.progressTotal = plan.last + (((lines - plan.overlap) % plan.step) != 0 ? 1 : 0);
+  return STATUS_OK;
+}
+
+void azimuth_focus_shifts(const AzimuthFocusConf& conf, int lines, int samples, double squint,
+                          double Req, double Veq, double prf_hz, double frg_hz, double& azShift,
+                          double& rgShift) {
+  const double spacing = 149896229.0 / frg_hz;
+  if (std::fabs(conf.ApplyAzShift) < lines) {
+    azShift = conf.ApplyAzShift;
+  } else {
+    const double rest =
+        conf.ApplyAzShift > 0 ? conf.ApplyAzShift - lines : conf.ApplyAzShift + lines;
+    const double automatic =
+        conf.PerformInterpolation != 0
+            ? std::tan(squint) * (Req + std::cos(squint) * (samples / 2) * spacing) / Veq
+            : std::tan(squint) * Req / Veq;
+    azShift = automatic + rest / prf_hz;
+  }
+  if (std::fabs(conf.ApplyRgShift) < samples) {
+    rgShift = conf.ApplyRgShift;
+  } else {
+    const double rest =
+        conf.ApplyRgShift > 0 ? conf.ApplyRgShift - samples : conf.ApplyRgShift + samples;
+    rgShift = 2.0 * (1.0 / std::cos(squint) - 1.0) * Req / kC + rest / frg_hz;
+  }
+}
+
+int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
+               const AzimuthFocusConf& conf) {
+  const int samples = scene.samples, lines = scene.lines;
+  const double frg = files.frg_hz, prf = files.prf_hz;
+  if (samples < 1 || lines < 1 || frg <= 0.0 || prf <= 0.0 || files.fc_hz <= 0.0)
+    return AF_FAIL("Bad raster sizes or sampling rates for azimuth focusing",
+                   STATUS_BAD_PARAMETER);
+  if (conf.SamplesInBlock <= 2 * conf.RangeOverlap)
+    return AF_FAIL("Range sub-block not longer than the range overlap", STATUS_BAD_PARAMETER);
+  if (2 * conf.RangeOverlap >= samples)
+    return AF_FAIL("Range overlap not shorter than the raster lines", STATUS_BAD_PARAMETER);
+  if (scene.inCore && !scene.buffer)
+    return AF_FAIL("No in-core buffer for azimuth focusing", STATUS_BAD_PARAMETER);
+
+  // Centroid at the scene centre.
+  const double* pdc = scene.polyDC;
+  const double x = (samples / 2) / frg + files.FastStartTime - pdc[7];
+  const double y = (lines / 2) / prf + files.SlowStartTime - pdc[8];
+  const double centroid = pdc[0] + pdc[1] * x + pdc[2] * y + pdc[3] * x * y + pdc[4] * x * x +
+                          pdc[5] * x * x * x + pdc[6] * x * x * x * x;
+
+  AzimuthBlockPar par;
+  par.verbose = scene.verbose;
+  par.lines = conf.LinesInBlock;
+  par.samples = samples;
+  par.fc = files.fc_hz;
+  par.frg = frg;
+  par.dc = centroid;
+  par.scale = 1.0;
+  par.reestimate = 0;
+  par.prf = prf;
+  par.fr0 = scene.polyFR[0];
+  par.fr1 = scene.polyFR[1];
+  par.fr2 = scene.polyFR[4];
+  par.t0 = files.FastStartTime;
+  par.trg0 = scene.polyFR[7];
+  par.AntennaLength = conf.AntennaLength;
+  par.azw = conf.AzimuthWindowHammingParameter;
+  par.rgw = conf.RangeWindowHammingParameter;
+  par.azlook = conf.AzimuthLookBandwidth;
+  par.rglook = conf.RangeLookBandwidth;
+  par.aztrans = conf.AzimuthTransitionBandwidth;
+  par.rgtrans = conf.RangeTransitionBandwidth;
+  par.whiten = conf.WhiteningFlag;
+  par.conj = 0;
+  par.interp = conf.PerformInterpolation;
+  par.pad = conf.StoltPadding;
+  par.dcref = scene.DCref != 0.0 ? scene.DCref : centroid;
+  par.bw = files.bandwidth_hz;
+  par.final = 0;
+
+  int st = MyComputeEqPar(par);
+  if (st != 0) {
+    ORV_REPORT_CALLED_ERROR();
+    return st;
+  }
+  scene.Veq = par.Veq;
+  scene.azSpacing = par.Veq / prf;
+  scene.rgSpacing = 149896229.0 / frg;
+  scene.centroid = centroid;
+  const double squint = std::asin(centroid * (kC / files.fc_hz) / 2.0 / par.Veq);
+
+  double azShift = 0.0, rgShift = 0.0;
+  azimuth_focus_shifts(conf, lines, samples, squint, par.Req, par.Veq, prf, frg, azShift,
+                       rgShift);
+  par.azshift = azShift;
+  par.rgshift = rgShift;
+
+  AzimuthBlockPlan plan;
+  st = azimuth_block_plan(lines, conf.LinesInBlock, conf.AzimuthOverlap, plan);
+  if (st != 0) return st;
+  const int A = plan.overlap;
+  const int fullRg = 2 * conf.RangeOverlap;
+  const int outSamples = samples - fullRg;
+
+  File in, out;
+  if (!scene.inCore) {
+    in.reset(std::fopen(files.input.c_str(), "rb"));
+    if (!in) {
+      ORV_REPORT("File not opened!", REPORT_ERROR);
+      ORV_REPORT(files.input, REPORT_ERROR);
+      return STATUS_NOT_OPENED;
+    }
+    out.reset(std::fopen(files.output.c_str(), "wb"));
+    if (!out) {
+      ORV_REPORT("File not opened!", REPORT_ERROR);
+      ORV_REPORT(files.output, REPORT_ERROR);
+      return STATUS_NOT_OPENED;
+    }
+  }
+  FFTBuffer blockBuf;
+  try {
+    blockBuf.resize(static_cast<std::size_t>(samples) * conf.LinesInBlock);
+  } catch (const std::bad_alloc&) {
+    return AF_FAIL("Out of memory for the azimuth block", STATUS_NO_MEMORY);
+  }
+  if (scene.verbose) waitbar_open("Azimuth Focusing");
+
+  long long readPos = 0;  // first input row of the block
+  long long outRow = 0;
+  const std::size_t rowBytes = sizeof(fcomplex) * samples;
+  for (int b = 0; b <= plan.last; ++b) {
+    const int blockLines = b < plan.last ? conf.LinesInBlock : lines - plan.step * plan.last;
+    if (blockLines <= A) break;
+    if (scene.inCore) {
+      std::memcpy(blockBuf.data(), scene.buffer + readPos * samples, rowBytes * blockLines);
+    } else {
+      if (fseeko(in.get(), static_cast<off_t>(readPos) * static_cast<off_t>(rowBytes),
+                 SEEK_SET) != 0 ||
+          std::fread(blockBuf.data(), rowBytes, blockLines, in.get()) !=
+              static_cast<std::size_t>(blockLines)) {
+        if (scene.verbose) waitbar_close();
+        ORV_REPORT("File reading failed!", REPORT_ERROR);
+        ORV_REPORT(files.input, REPORT_ERROR);
+        return STATUS_READ_FAILED;
+      }
+    }
+    const long long firstLine = readPos;
+    readPos += blockLines - A;
+
+    // Doppler centroid of the block as a polynomial in fast time.
+    const double yb = (blockLines / 2 + firstLine) / prf + files.SlowStartTime - pdc[8];
+    const double poly[5] = {pdc[0] + pdc[2] * yb, pdc[1] + pdc[3] * yb, pdc[4], pdc[5], pdc[6]};
+    par.lines = blockLines;
+    par.samples = samples;
+    par.data = blockBuf.data();
+    AzimuthBlockOut bo;
+    st = multirg(par, bo, conf.SamplesInBlock, fullRg, poly, pdc[7], b, plan.last + 1);
+    if (st != 0) {
+      if (scene.verbose) waitbar_close();
+      ORV_REPORT_CALLED_ERROR();
+      return st;
+    }
+
+    const int rows = blockLines - A;
+    for (int r = 0; r < rows; ++r) {
+      const fcomplex* src = blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * samples;
+      if (scene.inCore) {
+        std::memmove(scene.buffer + (outRow + r) * outSamples, src,
+                     sizeof(fcomplex) * outSamples);
+      } else if (std::fwrite(src, sizeof(fcomplex), outSamples, out.get()) !=
+                 static_cast<std::size_t>(outSamples)) {
+        if (scene.verbose) waitbar_close();
+        ORV_REPORT("File writing failed!", REPORT_ERROR);
+        ORV_REPORT(files.output, REPORT_ERROR);
+        return STATUS_WRITE_FAILED;
+      }
+    }
+    outRow += rows;
+  }
+  if (scene.verbose) waitbar_close();
+  if (out && std::fflush(out.get()) != 0) {
+    ORV_REPORT("File writing failed!", REPORT_ERROR);
+    return STATUS_WRITE_FAILED;
+  }
+
+  scene.outSamples = outSamples;
+  scene.outLines = std::max(0, lines - A);
+  scene.firstSampleTime = conf.RangeOverlap / frg + files.FastStartTime - rgShift;
+  scene.firstLineTime = conf.AzimuthOverlap / prf + files.SlowStartTime + azShift;
+  std::copy(scene.polyDC, scene.polyDC + 9, scene.polyDCOut);
+  std::copy(scene.polyFR, scene.polyFR + 9, scene.polyFROut);
+  return STATUS_OK;
+}

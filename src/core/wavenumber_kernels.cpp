@@ -1,0 +1,490 @@
+// Omega-K focusing of one azimuth block: equivalent geometry, wavenumber
+// grids, windows and the kernel without Stolt interpolation, plus the range
+// sub-blocking walk over a block.
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <cstring>
+#include <new>
+#include <vector>
+
+#include "base/status.h"
+#include "core/azimuth_block.h"
+#include "core/fft.h"
+#include "diag/report.h"
+#include "diag/waitbar.h"
+
+#if __has_include("core/stolt_interpolation.h")
+#include "core/stolt_interpolation.h"
+#define WK_HAVE_STOLT 1
+#endif
+
+namespace {
+
+constexpr double kC = 299792458.0;
+constexpr double kHalfC = 149896229.0;
+constexpr double kQuarterC = 74948114.5;
+constexpr double kFourPi = 12.566370614359172;
+constexpr double kTwoPi = 6.283185307179586;
+constexpr double kPi = 3.14159265358979323846;
+
+double rateAt(const AzimuthBlockPar& par, double t) {
+  const double x = t - par.trg0;
+  return par.fr0 + par.fr1 * x + par.fr2 * x * x;
+}
+
+double sinc(double u) {
+  if (u == 0.0) return 1.0;
+  const double a = kPi * u;
+  return std::sin(a) / a;
+}
+
+double squintOf(const AzimuthBlockPar& par) {
+  return std::asin(kC / par.fc * par.dc / 2.0 / par.Veq);
+}
+
+}  // namespace
+
+int MyComputeEqPar(AzimuthBlockPar& par) {
+  const double T = par.samples / par.frg;
+  const double lambda = kC / par.fc;
+  const double fn = rateAt(par, par.t0);
+  const double ff = rateAt(par, par.t0 + T);
+  if (!(fn != 0.0 && ff != 0.0 && fn != ff)) {
+    ORV_REPORT("Doppler rate does not vary over the block: equivalent geometry undefined",
+               REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  const double v = par.dc * lambda / 2.0;
+  par.Veq = std::sqrt(v * v + lambda * T * kQuarterC / (1.0 / fn - 1.0 / ff));
+  const double cs = std::cos(std::asin(v / par.Veq));
+  par.Req = -T * cs * kHalfC / (1.0 - fn / ff);
+  if (par.interp == 0) par.Req += cs * (par.samples / 2) * kC / (2.0 * par.frg);
+  return STATUS_OK;
+}
+
+void ComputeWaveNumbers(const AzimuthBlockPar& par, double& k0, double& kx, double& kz) {
+  k0 = kFourPi * par.fc / kC;
+  kx = kTwoPi * (par.dcref != 0.0 ? par.dcref : par.dc) / par.Veq;
+  kz = std::sqrt(k0 * k0 - kx * kx);
+}
+
+void WindowPars(AzimuthBlockPar& par, double& aperture, double& a, double& b, double& c,
+                double& d) {
+  const double kxd = kTwoPi * par.dc / par.Veq;
+  const double Bx = kTwoPi * par.prf / par.Veq;
+  const double Bk = kFourPi * par.frg / kC;
+  const double k0 = kFourPi * par.fc / kC;
+  aperture = std::fabs(std::asin((kxd + Bx / 2.0) / (k0 - Bk / 2.0)) -
+                       std::asin((kxd - Bx / 2.0) / (k0 + Bk / 2.0)));
+  a = b = c = d = 0.0;
+  if (par.prf < par.azlook) {
+    par.azw = 0.0;
+    std::fprintf(stderr, "Wrong azimuth hamming window parameters: no window applied.\n");
+  } else {
+    a = (par.azlook - par.aztrans) / 2.0 / par.prf;
+    b = par.aztrans / 2.0 / par.prf;
+  }
+  if (par.frg < par.rglook) {
+    par.rgw = 0.0;
+    std::fprintf(stderr, "Wrong range hamming window parameters: no window applied. \n");
+  } else {
+    c = (par.rglook - par.rgtrans) / 2.0 / par.frg;
+    d = par.rgtrans / 2.0 / par.frg;
+  }
+}
+
+double wk_raised_cosine(double excess, double width, double pedestal) {
+  if (excess <= 0.0) return 1.0;
+  if (excess < width) return pedestal + (1.0 - pedestal) * std::cos(kPi * excess / width);
+  return 0.0;
+}
+
+double wk_pattern_term(double L, double sq, double k, double kx, double Bx) {
+  const double sc = sinc(L * std::sin(sq - std::asin(kx / k)));
+  const double sm = sinc(L * std::sin(sq - std::asin((kx - Bx) / k)));
+  const double sp = sinc(L * std::sin(sq - std::asin((kx + Bx) / k)));
+  const double sc2 = sc * sc, sm2 = sm * sm, sp2 = sp * sp;
+  return sc2 * sc2 + sm2 * sm2 + sp2 * sp2;
+}
+
+WKWeighting::WKWeighting(AzimuthBlockPar& par) {
+  WindowPars(par, aperture, a, b, c, d);
+  whiten = par.whiten;
+  azw = par.azw;
+  rgw = par.rgw;
+  active = rgw != 0.0 || azw != 0.0 || whiten != 0;
+  L = par.AntennaLength * par.fc / kC;
+  Bx = kTwoPi * par.prf / par.Veq;
+  Bk = kFourPi * par.frg / kC;
+  sq = squintOf(par);
+  k0 = kFourPi * par.fc / kC;
+}
+
+double WKWeighting::rangeTerm(double k) const {
+  if (rgw == 0.0) return 1.0;
+  return wk_raised_cosine(std::fabs(k - k0) - c * Bk, d * Bk, rgw);
+}
+
+double WKWeighting::azimuthTerm(double k, double kx, double& P) const {
+  P = wk_pattern_term(L, sq, k, kx, Bx);
+  const double wh = whiten ? 1.0 / (std::sqrt(P) + 0.0001) : 1.0;
+  double aw = 1.0;
+  if (azw != 0.0)
+    aw = wk_raised_cosine(std::fabs(sq - std::asin(kx / k)) - a * aperture, b * aperture, azw);
+  return wh * aw;
+}
+
+void AzimuthGrid(const AzimuthBlockPar& par, double* kx, double* kx2, double* dk) {
+  double k0, kxc, kz;
+  ComputeWaveNumbers(par, k0, kxc, kz);
+  const double prf = par.prf;
+  const double d = par.dc - std::floor(par.dc / prf) * prf;
+  const double step = prf / par.lines;
+  for (int i = 0; i < par.lines; ++i) {
+    const double f = i * step - d + prf / 2.0;
+    const double fw = f - std::floor(f / prf) * prf - prf / 2.0 + par.dc;
+    kx[i] = fw * kTwoPi / par.Veq;
+    kx2[i] = kx[i] * kx[i];
+    dk[i] = k0 - std::sqrt(kx2[i] + kz * kz);
+  }
+}
+
+void ShiftDistances(const AzimuthBlockPar& par, double& az, double& rg) {
+  const double dr = kC / (2.0 * par.frg);
+  double k0, kx, kz;
+  ComputeWaveNumbers(par, k0, kx, kz);
+  const int half = par.samples / 2;
+  if (par.interp == 0)
+    az = kx * par.Req / kz;
+  else
+    az = kx / kz * (half * dr * kz / k0 + par.Req);
+  if (par.azshift != par.lines) az = par.Veq * par.azshift;
+  rg = (k0 / kz - 1.0) * par.Req;
+  if (par.rgshift != par.samples) rg = par.rgshift * kC / 2.0;
+  rg += par.Req;
+  if (par.interp == 0) rg += dr * half * (kz / k0 - 1.0);
+}
+
+void RngShift(const fcomplex* in, int n, double step, double k, fcomplex* out, int total,
+              double offset, double divisor) {
+  const float div = static_cast<float>(divisor);
+  const double sk = step * k;
+  const double ko = k * offset;
+  for (int i = 0; i < n; ++i) {
+    const double phase = i * sk + ko;
+    const float c = static_cast<float>(std::cos(phase));
+    const float s = static_cast<float>(std::sin(phase));
+    const float re = in[i].real(), im = in[i].imag();
+    out[i] = fcomplex((re * c - im * s) / div, (re * s + im * c) / div);
+  }
+  for (int i = std::max(n, 0); i < total; ++i) out[i] = fcomplex(0.0f, 0.0f);
+}
+
+int OutImagePar(const AzimuthBlockPar& par, int& fftlen, double& spacing, int& padded,
+                int& outsamples) {
+  const double dr = kC / (2.0 * par.frg);
+  const double sq = squintOf(par);
+  const double k0 = kFourPi * par.fc / kC;
+  const double kd = kTwoPi * par.dc / par.Veq;
+  const double hx = kPi * par.prf / par.Veq;
+  const double hk = kTwoPi * par.frg / kC;
+  if (k0 - hk < kd + hx) {
+    std::fprintf(stderr, "Squint angle too large: reached geometrical limit.");
+    return STATUS_BAD_CONDITION;
+  }
+  const double kp = k0 + hk, km = k0 - hk;
+  double G;
+  if (par.dc > 0.0)
+    G = kp * std::cos(std::asin((kd - hx) / kp)) - km * std::cos(std::asin((kd + hx) / km));
+  else
+    G = kp * std::cos(std::asin((kd + hx) / kp)) - km * std::cos(std::asin((kd - hx) / km));
+  const double w = kTwoPi / G;
+  spacing = std::max(par.scale * dr, w);
+  outsamples = static_cast<int>(std::ceil(std::cos(sq) * par.samples * dr / spacing));
+  fftlen = genpow(outsamples, 1);
+  if (par.interp != 1) {
+    padded = genpow(par.samples + 2 * static_cast<int>(std::ceil(par.samples * par.pad / 2.0)), 1);
+  } else {
+    const double G0 = kp * std::cos(std::asin(kd / kp)) - km * std::cos(std::asin(kd / km));
+    padded = static_cast<int>(G0 / (kTwoPi / spacing) * fftlen);
+  }
+  return STATUS_OK;
+}
+
+int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const double* dk, double az,
+           double rg) {
+  const int ns = par.samples, nl = par.lines;
+  if (ns < 1 || nl < 1 || !par.data) {
+    ORV_REPORT("Empty azimuth block", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  const double Bk = kFourPi * par.frg / kC;
+  const double dkr = Bk / ns;
+  const double dr = kC / (2.0 * par.frg);
+  double k0, kxc, kzc;
+  ComputeWaveNumbers(par, k0, kxc, kzc);
+
+  std::vector<double> table(ns), rwin;
+  try {
+    for (int i = 0; i < ns; ++i)
+      table[(ns / 2 + i) % ns] = i * dkr + k0 - std::floor(ns / 2) * dkr;
+    const WKWeighting wt(par);
+    const bool A = wt.active;
+    const float S = par.conj ? static_cast<float>(static_cast<double>(nl) * ns) : 1.0f;
+    if (par.rgw != 0.0) {
+      rwin.resize(ns);
+      for (int i = 0; i < ns; ++i) rwin[i] = wt.rangeTerm(table[i]);
+    }
+
+    fcomplex* data = par.data;
+    const int dir = par.conj ? FFT_BACKWARD_NORMALISED : FFT_FORWARD;
+    FFTPlan fwd, rowInv, colInv;
+    int st = fft_makep_c(fwd, ns, ns, nl, nl, dir, dir, 1);
+    if (st == 0) st = fft_makep_c(rowInv, ns, ns, nl, nl, FFT_BACKWARD_NORMALISED, FFT_NONE, 1);
+    if (st == 0) st = fft_makep_c(colInv, ns, ns, nl, nl, FFT_NONE, FFT_BACKWARD_NORMALISED, 1);
+    if (st != 0) {
+      ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
+      return STATUS_BAD_CONDITION;
+    }
+    pfft_c(fwd, data, data);
+
+    // Reference function, windows and whitening; energy sums per row so that
+    // the parallel run adds them in the serial order.
+    const double inBand = (par.bw / par.frg) * Bk / 2.0;
+    std::vector<double> rowN(nl, 0.0), rowD(nl, 0.0);
+    const int conj = par.conj;
+    const double Req = par.Req;
+#pragma omp parallel for schedule(static)
+    for (int j = 0; j < nl; ++j) {
+      fcomplex* row = data + static_cast<std::size_t>(j) * ns;
+      double N = 0.0, D = 0.0;
+      for (int i = 0; i < ns; ++i) {
+        fcomplex v = row[i];
+        if (conj) v = std::conj(v);
+        const double k = table[i];
+        const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * Req - (k - k0) * rg +
+                             (kx[j] - kxc) * az;
+        const float c = static_cast<float>(std::cos(phase));
+        const float s = static_cast<float>(std::sin(phase));
+        v = fcomplex(v.real() * c - v.imag() * s, v.real() * s + v.imag() * c);
+        float W = 1.0f;
+        if (A) {
+          double P;
+          const double aw = wt.azimuthTerm(k, kx[j], P);
+          const double rw = rwin.empty() ? 1.0 : rwin[i];
+          W = static_cast<float>(aw * rw);
+          if (std::fabs(k - k0) < inBand) {
+            D += P;
+            N += P * W * W;
+          }
+        }
+        const float ws = W * S;
+        row[i] = fcomplex(v.real() * ws, v.imag() * ws);
+      }
+      rowN[j] = N;
+      rowD[j] = D;
+    }
+    pfft_c(rowInv, data, data);
+    double N = 0.0, D = 0.0;
+    for (int j = 0; j < nl; ++j) {
+      N += rowN[j];
+      D += rowD[j];
+    }
+    const double g = (A && D > 0.0) ? std::sqrt(N / D) : 1.0;
+
+    const double off = -(ns / 2) * dr * std::cos(wt.sq);
+#pragma omp parallel for schedule(static)
+    for (int j = 0; j < nl; ++j) {
+      fcomplex* row = data + static_cast<std::size_t>(j) * ns;
+      RngShift(row, ns, dr, dk[j], row, ns, off, g);
+    }
+    pfft_c(colInv, data, data);
+    if (par.final == 1) {
+#pragma omp parallel for schedule(static)
+      for (int j = 0; j < nl; ++j) {
+        fcomplex* row = data + static_cast<std::size_t>(j) * ns;
+        RngShift(row, ns, dr, kzc - k0, row, ns, 0.0, 1.0);
+      }
+    }
+    fft_destp_c(fwd);
+    fft_destp_c(rowInv);
+    fft_destp_c(colInv);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Out of memory in the omega-K kernel", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  return STATUS_OK;
+}
+
+int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out) {
+  if (par.reestimate) {
+    // Per-block centroid re-estimation is not part of this library; the
+    // block keeps the centroid of the model.
+    ORV_REPORT("Centroid re-estimation per block not available: model centroid kept",
+               REPORT_WARNING);
+  }
+  int st = MyComputeEqPar(par);
+  if (st != 0) {
+    ORV_REPORT_CALLED_ERROR();
+    return st;
+  }
+  int fftlen = 0, padded = 0, outsamples = 0;
+  double spacing = 0.0;
+  st = OutImagePar(par, fftlen, spacing, padded, outsamples);
+  if (st != 0) return st;
+
+  std::vector<double> kx, kx2, dk;
+  try {
+    kx.resize(par.lines);
+    kx2.resize(par.lines);
+    dk.resize(par.lines);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Out of memory for the azimuth wavenumber grid", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  AzimuthGrid(par, kx.data(), kx2.data(), dk.data());
+  double az = 0.0, rg = 0.0;
+  ShiftDistances(par, az, rg);
+
+  out.lines = par.lines;
+  out.samples = par.samples;
+  out.spacing = kC / (2.0 * par.frg);
+  if (par.scale != 1.0 && par.interp > 0) {
+    out.samples = outsamples;
+    out.spacing = spacing;
+  }
+  out.dc = par.dc;
+  out.aztime = az / par.Veq;
+  out.rgtime = 2.0 * rg / kC;
+
+  if (par.interp == 0) {
+    st = FastWK(par, kx.data(), kx2.data(), dk.data(), az, rg);
+  } else {
+#ifdef WK_HAVE_STOLT
+    if (par.interp == 1)
+      st = ChirpInterpWK(par, padded, fftlen, outsamples, kx.data(), kx2.data(), dk.data(),
+                         spacing, az, rg);
+    else
+      st = LSInterpWK(par, padded, fftlen, outsamples, kx.data(), kx2.data(), dk.data(), spacing,
+                      az, rg);
+#else
+    ORV_REPORT("Stolt interpolation kernels not available in this build", REPORT_ERROR);
+    st = STATUS_BAD_CONDITION;
+#endif
+  }
+  if (st != 0) ORV_REPORT_CALLED_ERROR();
+  return st;
+}
+
+int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
+            const double poly[5], double tref, int block, int blocks) {
+  const int S = par.samples;
+  const int s = subSamples;
+  const int o = overlap;
+  const int nl = par.lines;
+  const double t0keep = par.t0;
+  fcomplex* const blockData = par.data;
+  auto dcAt = [&](double x) {
+    return poly[0] + poly[1] * x + poly[2] * x * x + poly[3] * x * x * x +
+           poly[4] * x * x * x * x;
+  };
+  auto restore = [&]() {
+    par.t0 = t0keep;
+    par.data = blockData;
+    par.samples = S;
+  };
+
+  if (s - o <= 0) {
+    ORV_REPORT("Range sub-block not longer than its overlap", REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+  const double dr = kC / (2.0 * par.frg);
+  par.dc = dcAt((S / par.frg) / 2.0 + par.t0 - tref);
+  int st = MyComputeEqPar(par);
+  if (st != 0) {
+    ORV_REPORT_CALLED_ERROR();
+    return st;
+  }
+  const double squint0 = std::asin(kC / par.fc * par.dc / 2.0 / par.Veq);
+  double k0, kxc, kzc;
+  ComputeWaveNumbers(par, k0, kxc, kzc);
+  const double dkz = kzc - k0;
+  const double Q = dkz != 0.0 ? ((o / 2) * dr + par.t0 * kC / 2.0) / dkz : 0.0;
+
+  const int nsub = (S - o + (s - o) - 1) / (s - o);
+  const std::size_t workSize = static_cast<std::size_t>(nl) * s;
+  if (workSize == 0 || nsub < 1) {
+    ORV_REPORT("cannot allocate memory", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  FFTBuffer work;
+  try {
+    work.resize(workSize);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("cannot allocate memory", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  par.data = work.data();
+  par.samples = s;
+
+  double E = 0.0, H = 0.0, r = 1.0;
+  for (int b = 0; b < nsub; ++b) {
+    const int f = b * (s - o);
+    const int ncopy = std::min(s, S - f);
+    std::fill(work.begin(), work.end(), fcomplex(0.0f, 0.0f));
+    for (int j = 0; j < nl; ++j)
+      std::memcpy(work.data() + static_cast<std::size_t>(j) * s,
+                  blockData + static_cast<std::size_t>(j) * S + f, sizeof(fcomplex) * ncopy);
+    par.t0 = t0keep + f / par.frg;
+    par.dc = dcAt((s / par.frg) / 2.0 + par.t0 - tref);
+
+    // Running range shift: keeps the sub-blocks on one range grid when the
+    // reference wavenumber changes from one sub-block to the next.
+    if (b == 0 || par.interp == 0) {
+      st = MyComputeEqPar(par);
+      if (st != 0) break;
+      const double kx = kTwoPi * par.dcref / par.Veq;
+      const double kz = std::sqrt(k0 * k0 - kx * kx);
+      par.rgshift += (std::cos(squint0) - kz / k0) * (o / 2) / par.frg;
+      E = 2.0 * (k0 / kz - 1.0) * par.Req / kC - par.rgshift;
+      H = 0.0;
+      r = kz / k0;
+    } else {
+      H += ((1.0 - r) * s - (1.0 - r / 2.0) * o) / par.frg;
+      st = MyComputeEqPar(par);
+      if (st != 0) break;
+      const double kx = kTwoPi * par.dcref / par.Veq;
+      const double kz = std::sqrt(k0 * k0 - kx * kx);
+      r = kz / k0;
+      H += r * (o / 2) / par.frg;
+      par.rgshift = 2.0 * (k0 / kz - 1.0) * par.Req / kC - H - E;
+    }
+
+    st = focazwk(par, out);
+    if (st != 0) break;
+    const int ncopyBack = std::min(s - o, S - o - f);
+    if (ncopyBack > 0) {
+      for (int j = 0; j < nl; ++j)
+        std::memcpy(blockData + static_cast<std::size_t>(j) * S + f,
+                    work.data() + static_cast<std::size_t>(j) * s + o / 2,
+                    sizeof(fcomplex) * ncopyBack);
+    }
+    if (par.verbose)
+      waitbar_update(0, static_cast<float>((static_cast<double>(block) * nsub + b) /
+                                           (static_cast<double>(blocks) * nsub) * 100.0));
+  }
+  if (st != 0) {
+    restore();
+    ORV_REPORT_CALLED_ERROR();
+    return st;
+  }
+  if (dkz != 0.0) {
+    for (int j = 0; j < nl; ++j) {
+      fcomplex* row = blockData + static_cast<std::size_t>(j) * S;
+      RngShift(row, S, out.spacing, dkz, row, S, Q, 1.0);
+    }
+  }
+  restore();
+  return STATUS_OK;
+}
