@@ -1,6 +1,112 @@
 #include "focus/sar_focuser.h"
 
+#include <cmath>
+#include <cstdio>
+#include <new>
+#include <vector>
+
+#include "base/status.h"
+#include "core/azimuth_focus.h"
+#include "core/fft.h"
+#include "core/range_focus.h"
 #include "diag/report.h"
+#include "diag/waitbar.h"
+#include "doppler/dc_driver.h"
+#include "orbit/general_sar_orbit.h"
+#include "orbit/geo_grid.h"
+#include "product/buffer_io.h"
+#include "product/general_sar.h"
+#include "product/product_aggregates.h"
+#include "product/profile.h"
+#include "product/roi.h"
+
+namespace {
+
+constexpr double kPi = 3.14159265358979323846;
+constexpr double kEqSpeedPlaceholder = 6900.0;
+
+int calledError(int status) {
+  ORV_REPORT_CALLED_ERROR();
+  return status;
+}
+
+double sincPi(double x) { return x == 0.0 ? 1.0 : std::sin(kPi * x) / (kPi * x); }
+
+bool opens(const std::string& name) {
+  if (name.empty()) return false;
+  std::FILE* f = std::fopen(name.c_str(), "rb");
+  if (!f) return false;
+  std::fclose(f);
+  return true;
+}
+
+void removeReported(const std::string& name) {
+  if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
+}
+
+// Values taken from the raw record for the kernels.
+struct ChainContext {
+  std::string reportFile;
+  std::string rawFile;
+  std::string chirpFile;
+  std::string outputFile;
+  std::string rgfocFile;
+  double fc_hz = 0.0;
+  double frg_hz = 0.0;
+  double prf_hz = 0.0;
+  double swstMin = 0.0;
+  double swstMax = 0.0;
+  double azimuthStart = 0.0;
+  double brg_hz = 0.0;
+  double antennaLength = 0.0;
+  int lines = 0;
+  int samples = 0;
+  double lookSign = 1.0;
+  double lambda_m = 0.0;
+};
+
+// Reads a profile value of one of the types below; the value is left as it
+// is when the key is absent.
+void readInt(const std::string& file, const std::string& section, const std::string& key,
+             int& value) {
+  int v = value;
+  if (GetMyProfileIntArray(section, key, &v, 1, file) == 0) value = v;
+}
+void readDouble(const std::string& file, const std::string& section, const std::string& key,
+                double& value) {
+  double v = value;
+  if (GetProfileDoubleArray(section, key, &v, 1, file) == 0) value = v;
+}
+bool hasKey(const std::string& file, const std::string& section, const std::string& key) {
+  return GetSetProfileChar(0, section, key, "", file) != nullptr;
+}
+
+}  // namespace
+
+// ---- kernels --------------------------------------------------------------------
+
+void polyToFlat(const poly& p, double out[9]) {
+  for (int i = 0; i < 7; ++i) out[i] = p.c[i];
+  out[7] = p.trg0;
+  out[8] = p.taz0;
+}
+
+void polyFromFlat(const double in[9], poly& p) {
+  for (int i = 0; i < 7; ++i) p.c[i] = in[i];
+  p.trg0 = in[7];
+  p.taz0 = in[8];
+}
+
+int estimateCentroid(DcEstInput& input, DcEstState& state, double poly[7]) {
+  return getnadcpoly(input, state, poly);
+}
+
+int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
+                 const AzimuthFocusConf& conf) {
+  return azimuthfoc(files, scene, conf);
+}
+
+// ---- configuration ----------------------------------------------------------
 
 void SARFocuser_conf::clear() {
   *this = SARFocuser_conf{};
@@ -10,14 +116,700 @@ void SARFocuser_conf::clear() {
   Azblk = 1024;
 }
 
-int SARFocuser_conf::readpar(const std::string&) { return 10; }
-int SARFocuser_conf::readconf(const std::string&) { return 10; }
-int SARFocuser_input::readpar(const std::string&) { return 10; }
-int SARFocuser_output::readpar(const std::string&) { return 10; }
+int SARFocuser_conf::readpar(const std::string& file) {
+  clear();
+  if (!opens(file)) {
+    ORV_REPORT("File not opened! (" + file + ")", REPORT_ERROR);
+    return STATUS_NOT_OPENED;
+  }
+  const std::string s = "sarfocuserConfiguration";
+  readInt(file, s, "Incore", Incore);
+  readInt(file, s, "Memory", Memory);
+  readInt(file, s, "Verbose", Verbose);
+  readInt(file, s, "ReportLevel", ReportLevel);
+  GetMyProfileString(s, "ReportFilename", ReportFilename, file);
+  GetMyProfileString(s, "ProcessingConfFile", ProcessingConfFile, file);
+  readDouble(file, s, "DCref", DCref);
+  readInt(file, s, "DeleteTempFiles", DeleteTempFiles);
+  return 0;
+}
+
+int SARFocuser_conf::readconf(const std::string& file) {
+  if (!opens(file)) {
+    ORV_REPORT("File not opened! (" + file + ")", REPORT_ERROR);
+    return STATUS_NOT_OPENED;
+  }
+  const std::string d = "DCestConf";
+  readDouble(file, d, "RgBand", RgBand);
+  readInt(file, d, "Blocks", Blocks);
+  readInt(file, d, "Blockl", Blockl);
+  readDouble(file, d, "AnLen", AnLen);
+  readDouble(file, d, "Kthr", Kthr);
+  readDouble(file, d, "Sthr", Sthr);
+  readDouble(file, d, "Varthr", Varthr);
+  readDouble(file, d, "Lookbf", Lookbf);
+  readDouble(file, d, "Lookbt", Lookbt);
+  readDouble(file, d, "Lookrp", Lookrp);
+  readDouble(file, d, "Lookrs", Lookrs);
+  readInt(file, d, "Decfac", Decfac);
+  readInt(file, d, "Flength", Flength);
+  readDouble(file, d, "Dftstep", Dftstep);
+  readDouble(file, d, "Fftrgprc", Fftrgprc);
+  readDouble(file, d, "Fftazprc", Fftazprc);
+  readDouble(file, d, "Peakwid", Peakwid);
+  readDouble(file, d, "Minamb", Minamb);
+  readDouble(file, d, "Maxamb", Maxamb);
+  readInt(file, d, "Nbestblocks", Nbestblocks);
+  readInt(file, d, "Nummlbf", Nummlbf);
+  readInt(file, d, "Nwdarblocks", Nwdarblocks);
+  readInt(file, d, "Patchs", Patchs);
+  readInt(file, d, "Patchl", Patchl);
+  readInt(file, d, "Dswst", Dswst);
+  readInt(file, d, "Amb_flag", Amb_flag);
+  {
+    int w[7] = {1, 1, 1, 1, 1, 1, 1};
+    if (hasKey(file, d, "Pol_Weights") && GetMyProfileIntArray(d, "Pol_Weights", w, 7, file) != 0)
+      for (int& x : w) x = 1;
+    for (int i = 0; i < 7; ++i) Pol_Weights[i] = w[i];
+  }
+
+  const std::string a = "AzimuthConf";
+  readDouble(file, a, "AntennaLength", AntennaLength);
+  readInt(file, a, "WhiteningFlag", WhiteningFlag);
+  readDouble(file, a, "RangeWindowHammingParameter", RangeWindowHammingParameter);
+  readDouble(file, a, "AzimuthWindowHammingParameter", AzimuthWindowHammingParameter);
+  readDouble(file, a, "RangeLookBandwidth", RangeLookBandwidth);
+  readDouble(file, a, "AzimuthLookBandwidth", AzimuthLookBandwidth);
+  readDouble(file, a, "RangeTransitionBandwidth", RangeTransitionBandwidth);
+  readDouble(file, a, "AzimuthTransitionBandwidth", AzimuthTransitionBandwidth);
+  readInt(file, a, "LinesInBlock", LinesInBlock);
+  readInt(file, a, "SamplesInBlock", SamplesInBlock);
+  if (hasKey(file, a, "RangeOverlap")) {
+    int v = 0;
+    readInt(file, a, "RangeOverlap", v);
+    RangeOverlap = v / 2;
+  }
+  if (hasKey(file, a, "AzimuthOverlap")) {
+    int v = 0;
+    readInt(file, a, "AzimuthOverlap", v);
+    AzimuthOverlap = v / 2;
+  }
+  readInt(file, a, "PerformInterpolation", PerformInterpolation);
+  readDouble(file, a, "StoltPadding", StoltPadding);
+  readDouble(file, a, "ApplyAzShift", ApplyAzShift);
+  readDouble(file, a, "ApplyRgShift", ApplyRgShift);
+
+  const std::string g = "GeneralProcessingConf";
+  Flag_rangefoc = 1;
+  Flag_rgpatt = 0;
+  Flag_azimuthfoc = 1;
+  Flag_dcest = 1;
+  Flag_ortog = 1;
+  Flag_swstal = 1;
+  Azblk = 1024;
+  Multilook = 0;
+  readInt(file, g, "Flag_rangefoc", Flag_rangefoc);
+  readInt(file, g, "Flag_rgpatt", Flag_rgpatt);
+  readInt(file, g, "Flag_azimuthfoc", Flag_azimuthfoc);
+  readInt(file, g, "Flag_dcest", Flag_dcest);
+  readInt(file, g, "Flag_ortog", Flag_ortog);
+  readInt(file, g, "Flag_swstal", Flag_swstal);
+  readInt(file, g, "Azblk", Azblk);
+  readInt(file, g, "Multilook", Multilook);
+  return 0;
+}
+
+int SARFocuser_input::readpar(const std::string& file) {
+  const std::string s = "sarfocuserInput";
+  if (GetMyProfileString(s, "RawDataFile", RawDataFile, file) != 0) {
+    ORV_REPORT("RawDataFile not defined in " + file, REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+  GetMyProfileString(s, "ChirpFile", ChirpFile, file);
+  GetMyProfileString(s, "AntennaFile", AntennaFile, file);
+  return 0;
+}
+
+int SARFocuser_output::readpar(const std::string& file) {
+  if (GetMyProfileString("sarfocuserOutput", "OutputFilename", OutputFilename, file) != 0) {
+    ORV_REPORT("OutputFilename not defined in " + file, REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+  return 0;
+}
+
+// ---- thin parameter calls -------------------------------------------------------
+
+int GetParString(const std::string& file, const std::string& key, int, std::string* value, int,
+                 const std::string& section) {
+  return GetMyProfileString(section, key, *value, file);
+}
+int GetParInt(const std::string& file, const std::string& key, int count, int* value, int,
+              const std::string& section) {
+  return GetMyProfileIntArray(section, key, value, count, file);
+}
+int GetParFloat(const std::string& file, const std::string& key, int count, float* value, int,
+                const std::string& section) {
+  return GetMyProfileFloatArray(section, key, value, count, file);
+}
+int GetParDouble(const std::string& file, const std::string& key, int count, double* value, int,
+                 const std::string& section) {
+  return GetProfileDoubleArray(section, key, value, count, file);
+}
+int SetParString(const std::string& file, const std::string& key, int, const std::string* value,
+                 int, const std::string& section) {
+  return WriteMyProfileString(section, key, *value, file);
+}
+int SetParInt(const std::string& file, const std::string& key, int count, const int* value, int,
+              const std::string& section) {
+  return WriteMyProfileIntArray(section, key, value, count, file);
+}
+int SetParFloat(const std::string& file, const std::string& key, int count, const float* value,
+                int, const std::string& section) {
+  return WriteMyProfileFloatArray(section, key, value, count, file);
+}
+int SetParDouble(const std::string& file, const std::string& key, int count, const double* value,
+                 int, const std::string& section) {
+  return WriteProfileDoubleArray(section, key, value, count, file);
+}
+
+// ---- the chain ------------------------------------------------------------------
 
 SARFocuser::SARFocuser(SARFocuser_conf* conf) : conf_(conf) {}
 SARFocuser::~SARFocuser() = default;
 
-int SARFocuser::run() { return 10; }
-int SARFocuser::process() { return 1; }
-int SARFocuser::descallop() { return 1; }
+int SARFocuser::run() {
+  if (!conf_) {
+    ORV_REPORT("Focusing configuration not set", REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+  if (opens(RawDataFile)) {
+    ORV_REPORT("STRIPMAP RAW DATA DETECTED, FOCUSSING...", REPORT_CHECKPOINT);
+    if (!opens(ChirpFile)) {
+      ORV_REPORT(" Chirp file does not exists! (" + ChirpFile + ")", 17);
+      return STATUS_BAD_PARAMETER;
+    }
+    conf_->Flag_rgpatt = 0;
+    const int status = process();
+    if (status != 0) return calledError(status);
+    return 0;
+  }
+
+  // Alternating polarisation: two channels "<raw>1" and "<raw>2".
+  if (!opens(RawDataFile + "1")) {
+    ORV_REPORT("Raw Data file does not exists!", REPORT_IMAGE_MISSING);
+    return STATUS_BAD_PARAMETER;
+  }
+  ORV_REPORT("AP RAW DATA DETECTED, FOCUSSING...", REPORT_CHECKPOINT);
+  const std::string raw = RawDataFile, chirp = ChirpFile, output = OutputFilename;
+  int status = 0;
+  for (int k = 1; k <= 2 && status == 0; ++k) {
+    const std::string n = std::to_string(k);
+    if (!opens(chirp + n)) {
+      ORV_REPORT("Chirp file does not exists!", 17);
+      status = STATUS_BAD_PARAMETER;
+      break;
+    }
+    RawDataFile = raw + n;
+    ChirpFile = chirp + n;
+    OutputFilename = output + n;
+    conf_->Flag_rgpatt = 0;
+    status = process();
+    if (status == 0) status = descallop();
+    if (status != 0) ORV_REPORT_CALLED_ERROR();
+  }
+  RawDataFile = raw;
+  ChirpFile = chirp;
+  OutputFilename = output;
+  return status;
+}
+
+int SARFocuser::process() {
+  SARFocuser_conf& conf = *conf_;
+  GeneralRAWData rawRecord;
+  ChainContext ctx;
+
+  ctx.reportFile = conf.ReportFilename;
+  ctx.rawFile = RawDataFile;
+  ctx.chirpFile = ChirpFile;
+  ctx.outputFile = OutputFilename;
+  if (conf.Flag_rangefoc) ctx.rgfocFile = OutputFilename + ".rgfoc";
+
+  if (int st = rawRecord.readhdr(RawDataFile + ".hdr"); st != 0) {
+    ORV_REPORT("Cannot read the raw data record " + RawDataFile + ".hdr", REPORT_ERROR);
+    return calledError(st);
+  }
+  DataFile chirpFile;
+  if (int st = chirpFile.read_hdr(ChirpFile); st != 0) {
+    ORV_REPORT("Cannot read the chirp header " + ChirpFile + ".hdr", REPORT_ERROR);
+    return calledError(st);
+  }
+
+  const SamplingConstants_Obj& smp = rawRecord.sampling;
+  const ROI_Obj& rawRoi = rawRecord.roi;
+  ctx.fc_hz = smp.fc_hz;
+  ctx.frg_hz = smp.frg_hz;
+  ctx.prf_hz = smp.prf_hz;
+  ctx.swstMin = rawRecord.dataSetInfo.SWST_MIN;
+  ctx.swstMax = rawRecord.dataSetInfo.SWST_MAX;
+  ctx.azimuthStart = rawRoi.SlowStartTime;
+  ctx.brg_hz = smp.Brg_hz;
+  ctx.lines = rawRoi.Lines;
+  ctx.samples = rawRoi.Samples;
+  const int lookSign = rawRecord.dataSetInfo.LookDirection == -1 ? -1 : 1;
+  ctx.lookSign = lookSign;
+  ctx.lambda_m = smp.lambda_m;
+  rawRecord.orbit().setLookSign(lookSign);
+  ctx.antennaLength = conf.AntennaLength;
+  if (ctx.frg_hz <= 0.0 || ctx.prf_hz <= 0.0 || ctx.lines < 1 || ctx.samples < 1) {
+    ORV_REPORT("Sampling values of the raw data record are wrong: " + RawDataFile + ".hdr",
+               REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+
+  // 1.0 is the sentinel of "the whole image".
+  if (conf.ApplyAzShift == 1.0) conf.ApplyAzShift = ctx.lines;
+  if (conf.ApplyRgShift == 1.0) conf.ApplyRgShift = ctx.samples;
+
+  // The whole replica in memory.
+  std::vector<fcomplex> chirp;
+  try {
+    chirp.assign(std::max(chirpFile.NrOfPixelsPerLine, 0), fcomplex(0.0f, 0.0f));
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Memory allocation failed", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  if (!chirp.empty()) {
+    BufferIO io;
+    io.file = &chirpFile;
+    io.first_column = 0;
+    io.columns = static_cast<int>(chirp.size());
+    io.first_row = 0;
+    io.rows = 1;
+    io.memory_type = FLOAT_COMPLEX;
+    const int st = io.readbuffer(chirp.data());
+    chirpFile.close();
+    if (st != 0) return calledError(st);
+  }
+
+  RangeFocParams rp;
+  rp.inputFile = ctx.rawFile;
+  rp.outputFile = ctx.rgfocFile;
+  rp.fs = ctx.frg_hz;
+  rp.swstMin = ctx.swstMin;
+  rp.swstMax = ctx.swstMax;
+  rp.prf = ctx.prf_hz;
+  rp.lines = ctx.lines;
+  rp.samples = ctx.samples;
+  RangeFocWork rw;
+  rw.verbose = conf.Verbose;
+  rw.replica = chirp.data();
+  rw.replicaLen = static_cast<int>(chirp.size());
+  rw.Flag_ortog = conf.Flag_ortog;
+  rw.prefix = rawRecord.dataFile.RowPrefix > 0 ? 1 : 0;
+  rw.incore = conf.Incore;
+  if (rawRecord.dataFile.RowPrefix != 0 && rawRecord.dataFile.RowPrefix != 4) {
+    ORV_REPORT("Raw raster rows must carry a 4-byte sampling window prefix: " + RawDataFile,
+               REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+  if (rawRecord.dataFile.HeaderOffset != 0) {
+    ORV_REPORT("Raw raster with a header block cannot be range focused: " + RawDataFile,
+               REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+
+  if (conf.Incore) {
+    conf.DeleteTempFiles = 0;
+    if (int st = init_buffer(rp, rw); st != 0) return calledError(st);
+  }
+
+  if (conf.Flag_rangefoc) {
+    ORV_REPORT("Range Focusing", REPORT_CHECKPOINT);
+    if (int st = rangefoc(rp, rw); st != 0) return calledError(st);
+    if (conf.DeleteTempFiles) {
+      removeReported(ctx.rawFile);
+      if (!ctx.reportFile.empty()) removeReported(ctx.reportFile);
+      removeReported(ctx.chirpFile);
+      removeReported(ctx.chirpFile + ".hdr");
+    }
+  }
+  const int rgSamples = rw.outSamples;
+  const int rgLines = rw.outLines;
+
+  // Doppler centroid and the geometric Doppler rate.
+  polyDC dcPoly;
+  polyFR frPoly;
+  dcPoly.trg0 = ctx.swstMin;
+  dcPoly.taz0 = ctx.azimuthStart;
+  frPoly.trg0 = ctx.swstMin;
+  frPoly.taz0 = ctx.azimuthStart;
+  if (conf.Flag_dcest) {
+    DcEstInput in;
+    in.rasterFile = ctx.rgfocFile;
+    in.outDir = ".";
+    in.samples = rgSamples;
+    in.lines = rgLines;
+    in.prf = ctx.prf_hz;
+    in.velocity = kEqSpeedPlaceholder;
+    in.timeOrigin = ctx.azimuthStart;
+    DcEstState state;
+    state.blocks = conf.Blocks;
+    state.blockl = conf.Blockl;
+    state.memory = static_cast<int64_t>(conf.Memory) << 20;
+    state.nBest = conf.Nbestblocks;
+    state.nWdar = conf.Nwdarblocks;
+    state.nMlbf = conf.Nummlbf;
+    state.anLen = conf.AnLen;
+    state.rgBand = conf.RgBand;
+    state.fc = ctx.fc_hz;
+    state.fs = ctx.frg_hz;
+    state.maxAmb = conf.Maxamb;
+    state.minAmb = conf.Minamb;
+    state.kThr = conf.Kthr;
+    state.sThr = conf.Sthr;
+    state.varTh = conf.Varthr;
+    state.lookBf = conf.Lookbf;
+    state.lookBt = conf.Lookbt;
+    state.lookRp = conf.Lookrp;
+    state.lookRs = conf.Lookrs;
+    state.fLength = conf.Flength;
+    state.decFac = conf.Decfac;
+    state.dftStep = conf.Dftstep;
+    state.peakWid = conf.Peakwid;
+    state.ambFlag = conf.Amb_flag;
+    for (int i = 0; i < 7; ++i) state.polMask[i] = conf.Pol_Weights[i];
+    state.patchs = conf.Patchs;
+    state.patchl = conf.Patchl;
+    state.fftRgPrc = conf.Fftrgprc;
+    state.fftAzPrc = conf.Fftazprc;
+    state.dswst = conf.Dswst;
+    state.verbose = conf.Verbose;
+    ORV_REPORT("DC Estimation", REPORT_CHECKPOINT);
+    double c[7] = {0, 0, 0, 0, 0, 0, 0};
+    if (int st = estimateCentroid(in, state, c); st != 0) return calledError(st);
+    for (int i = 0; i < 7; ++i) dcPoly.c[i] = c[i];
+
+    ORV_REPORT("GEOMETRIC POLYNOMIALS COMPUTATION", REPORT_CHECKPOINT);
+    GeneralSAROrbit& orbit = rawRecord.orbit();
+    const double tMid = ctx.azimuthStart + 0.5 * ctx.lines / ctx.prf_hz;
+    if (int st = orbit.updatePolys(tMid); st != 0) return calledError(st);
+    const double* pos = orbit.getCurPos();
+    if (!pos) {
+      ORV_REPORT("No orbit state vectors around the scene centre", REPORT_ERROR);
+      return STATUS_BAD_CONDITION;
+    }
+    double fr[3] = {0, 0, 0};
+    if (int st = getgeopoly(tMid, ctx.swstMin, rgSamples, ctx.frg_hz, pos, orbit.getCurT0(),
+                            orbit.dt, ctx.fc_hz, &dcPoly, ctx.lookSign, 3, fr, nullptr, nullptr);
+        st != 0)
+      return calledError(st);
+    frPoly.c[0] = fr[0];
+    frPoly.c[1] = fr[1];
+    frPoly.c[4] = fr[2];
+    if (conf.DeleteTempFiles) removeReported("./DCEST_resume.txt");
+  }
+
+  // Record of the range-focused raster.
+  if (conf.Flag_rangefoc) {
+    GeneralSLCData rg;
+    rawRecord.dataSetInfo.clone(&rg.dataSetInfo);
+    rg.dataSetInfo.SWST_MIN = rg.dataSetInfo.SWST_MAX = ctx.swstMin;
+    rg.dataSetInfo.Description = "StripMap Range Focused Image File";
+    rg.dataSetInfo.ProcessingSoftware = "SARFocuser v1.0";
+    rg.dataSetInfo.ProcessingCenter = "Orvane - Lumbrao";
+    rg.dataSetInfo.Swath = rawRecord.dataSetInfo.Swath;
+    rg.dataSetInfo.OrbitConfiguration = rawRecord.dataSetInfo.OrbitConfiguration;
+    rg.dataSetInfo.Polarization = rawRecord.dataSetInfo.Polarization;
+    rg.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
+    rg.rasterName = ctx.rgfocFile;
+    rg.dataFile.filename = ctx.rgfocFile;
+    rg.dataFile.RowPrefix = 0;
+    rg.dataFile.HeaderOffset = 0;
+    rg.dataFile.CellType = FLOAT_COMPLEX;
+    rg.dataFile.ByteOrder = 0;
+    rg.dataFile.NrOfPixelsPerLine = rgSamples;
+    rg.dataFile.NrOfLinesPerImage = rgLines;
+    rg.roi.SetFastAxe(ctx.swstMin, rawRoi.FastTimeDelta, rgSamples);
+    rg.roi.SetSlowAxe(ctx.azimuthStart, rawRoi.SlowTimeDelta, rgLines);
+    rg.polynomials.CreatePolys(1, 1);
+    rg.polynomials.DC[0] = dcPoly;
+    rg.polynomials.FR[0] = frPoly;
+    rg.attitude.Eq_speed = kEqSpeedPlaceholder;
+    rg.attitude.Mean_DC = -1.0;
+    rg.attitude.SquintAngle = -1.0;
+    rg.spectralWindows.AzMatchedFilterType = "HAMMING";
+    rg.spectralWindows.RgMatchedFilterType = "HAMMING";
+    rg.spectralWindows.RgMatchedFilterCoef = conf.RangeWindowHammingParameter;
+    rg.spectralWindows.AzMatchedFilterCoef = conf.AzimuthWindowHammingParameter;
+    rg.spectralWindows.RgLookBandwidth = conf.RangeLookBandwidth;
+    rg.spectralWindows.AzLookBandwidth = conf.AzimuthLookBandwidth;
+    rawRecord.orbit().clone(&rg.orbit());
+    if (int st = rg.orbit().SVGetGeoCoords(&rg.geoCoords, &rg.roi); st != 0)
+      return calledError(st);
+    rawRecord.sampling.clone(&rg.sampling);
+    rawRecord.pulse.clone(&rg.pulse);
+    rawRecord.swath.clone(&rg.swath);
+    if (int st = rg.writehdr(); st != 0) return calledError(st);
+    rg.destroyAll();
+  }
+
+  AzimuthFocusScene scene;
+  if (conf.Flag_azimuthfoc) {
+    if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
+    AzimuthFocusFiles files;
+    files.input = ctx.rgfocFile;
+    files.output = ctx.outputFile;
+    files.frg_hz = ctx.frg_hz;
+    files.fc_hz = ctx.fc_hz;
+    files.prf_hz = ctx.prf_hz;
+    files.FastStartTime = ctx.swstMin;
+    files.bandwidth_hz = ctx.brg_hz;
+    files.SlowStartTime = ctx.azimuthStart;
+    scene.verbose = conf.Verbose;
+    scene.samples = rgSamples;
+    scene.lines = rgLines;
+    polyToFlat(dcPoly, scene.polyDC);
+    polyToFlat(frPoly, scene.polyFR);
+    scene.DCref = conf.DCref;
+    scene.inCore = conf.Incore;
+    scene.buffer = conf.Incore ? rw.data.data() : nullptr;
+    AzimuthFocusConf ac;
+    ac.PerformInterpolation = conf.PerformInterpolation;
+    ac.StoltPadding = conf.StoltPadding;
+    ac.AntennaLength = conf.AntennaLength;
+    ac.WhiteningFlag = conf.WhiteningFlag;
+    ac.RangeWindowHammingParameter = conf.RangeWindowHammingParameter;
+    ac.AzimuthWindowHammingParameter = conf.AzimuthWindowHammingParameter;
+    ac.RangeLookBandwidth = conf.RangeLookBandwidth * ctx.frg_hz;
+    ac.AzimuthLookBandwidth = conf.AzimuthLookBandwidth * ctx.prf_hz;
+    ac.RangeTransitionBandwidth = conf.RangeTransitionBandwidth * ctx.frg_hz;
+    ac.AzimuthTransitionBandwidth = conf.AzimuthTransitionBandwidth * ctx.prf_hz;
+    ac.SamplesInBlock = conf.SamplesInBlock;
+    ac.LinesInBlock = conf.LinesInBlock;
+    ac.RangeOverlap = conf.RangeOverlap;
+    ac.AzimuthOverlap = conf.AzimuthOverlap;
+    ac.ApplyAzShift = conf.ApplyAzShift;
+    ac.ApplyRgShift = conf.ApplyRgShift;
+    ORV_REPORT("Azimuth Focusing", REPORT_CHECKPOINT);
+    char text[64];
+    std::snprintf(text, sizeof text, "DCref: %f", conf.DCref);
+    ORV_REPORT(text, REPORT_MESSAGE);
+    if (int st = focusAzimuth(files, scene, ac); st != 0) return calledError(st);
+    if (conf.DeleteTempFiles) {
+      removeReported(ctx.rgfocFile);
+      removeReported(ctx.rgfocFile + ".hdr");
+    }
+  }
+
+  if (conf.Incore) {
+    RangeFocParams out = rp;
+    out.outputFile = ctx.outputFile;
+    rw.outSamples = scene.outSamples;
+    rw.outLines = scene.outLines;
+    if (int st = dest_buffer(out, rw); st != 0) return calledError(st);
+  }
+
+  // Record of the focused product.
+  GeneralSAR product;
+  rawRecord.dataSetInfo.clone(&product.dataSetInfo);
+  DataSetInfo_Obj& info = product.dataSetInfo;
+  info.SWST_MIN = info.SWST_MAX = scene.firstSampleTime;
+  info.ExternalCalibrationFactor = 1.0;
+  info.Description = "StripMap level 1 Image File";
+  info.ProcessingSoftware = "SARFocuser v1.0";
+  info.ProcessingCenter = "Orvane - Lumbrao";
+  info.Swath = rawRecord.dataSetInfo.Swath;
+  info.OrbitConfiguration = rawRecord.dataSetInfo.OrbitConfiguration;
+  info.Polarization = rawRecord.dataSetInfo.Polarization;
+  info.SetImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
+
+  product.dataFile.filename = ctx.outputFile;
+  product.dataFile.NrOfPixelsPerLine = scene.outSamples;
+  product.dataFile.NrOfLinesPerImage = scene.outLines;
+  product.dataFile.RowPrefix = 0;
+  product.dataFile.HeaderOffset = 0;
+  product.dataFile.CellType = FLOAT_COMPLEX;
+  product.dataFile.ByteOrder = 0;
+
+  ROI_Obj& roi = product.roi.roi;
+  roi.SetFastAxe(scene.firstSampleTime, rawRoi.FastTimeDelta, scene.outSamples);
+  roi.SetSlowAxe(scene.firstLineTime, rawRoi.SlowTimeDelta, scene.outLines);
+
+  rawRecord.orbit().clone(&product.orbit());
+  product.polynomials.CreatePolys(1, 1, 1, 1, 1, 1);
+  polyFromFlat(scene.polyDCOut, product.polynomials.DC[0]);
+  polyFromFlat(scene.polyFROut, product.polynomials.FR[0]);
+  {
+    int st = product.orbit().SVGetTimeToAnglesPolys(&roi, &product.polynomials.DC[0],
+                                                    &product.polynomials.SL2THETA[0],
+                                                    &product.polynomials.SL2PHI[0]);
+    if (st == 0)
+      st = product.orbit().SVGetGroundToTimePolys(&roi, &product.polynomials.DC[0],
+                                                  &product.polynomials.SL2GR[0],
+                                                  &product.polynomials.GR2SL[0]);
+    if (st != 0) return calledError(st);
+  }
+  rawRecord.sampling.clone(&product.sampling);
+  rawRecord.pulse.clone(&product.pulse);
+  product.attitude.Eq_speed = scene.Veq;
+  product.attitude.Mean_DC = scene.centroid;
+  product.attitude.AntennaLength = conf.AntennaLength;
+  product.attitude.SquintAngle =
+      scene.Veq != 0.0
+          ? std::asin(-(ctx.lambda_m * scene.centroid) / (2.0 * scene.Veq)) * 180.0 / kPi
+          : 0.0;
+  SpectralWindows_Obj& w = product.spectralWindows;
+  w.AzMatchedFilterType = "HAMMING";
+  w.RgMatchedFilterType = "HAMMING";
+  w.RgMatchedFilterCoef = conf.RangeWindowHammingParameter;
+  w.AzMatchedFilterCoef = conf.AzimuthWindowHammingParameter;
+  w.RgLookBandwidth = conf.RangeLookBandwidth;
+  w.AzLookBandwidth = conf.AzimuthLookBandwidth;
+  SwathInfo& sw = product.swath;
+  sw.Acquisition_Start_Time = ctx.azimuthStart;
+  sw.Rank = sw.Bursts = sw.Order = sw.Swst_changes = -1;
+  sw.Echoes_per_burst = rawRecord.swath.Echoes_per_burst;
+  sw.Swst_changes_bursts.clear();
+  if (int st = product.orbit().SVGetGeoCoords(&product.geoCoords, &roi); st != 0)
+    return calledError(st);
+
+  ORV_REPORT("Writing headers", REPORT_CHECKPOINT);
+  for (GeneralSAR::GSObject o :
+       {GeneralSAR::GS_DATAFILE, GeneralSAR::GS_DATASETINFO, GeneralSAR::GS_ORBIT,
+        GeneralSAR::GS_GEOCOORDS, GeneralSAR::GS_POLYNOMIALS, GeneralSAR::GS_ROI,
+        GeneralSAR::GS_SAMPLING, GeneralSAR::GS_PULSE, GeneralSAR::GS_ATTITUDE,
+        GeneralSAR::GS_SPECTRALWINDOWS, GeneralSAR::GS_SWATH})
+    product.GSenable(o);
+  if (int st = product.GSwrite(ctx.outputFile + ".hdr"); st != 0) return calledError(st);
+  product.GSdestroy();
+  rawRecord.destroyAll();
+
+  if (conf.Multilook) {
+    ORV_REPORT("Multi-looked product not available in this build", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  return 0;
+}
+
+// ---- de-scalloping of burst-mode products ----------------------------------------
+
+int SARFocuser::descallop() {
+  constexpr int kBlock = 1024;
+  constexpr int kOverlap = 64;
+  constexpr int kStep = kBlock - kOverlap;  // 960 lines kept per block
+  constexpr int kHalf = kOverlap / 2;
+  constexpr int kTaps = 31;
+
+  GeneralSAR rec;
+  if (int st = rec.GSread(OutputFilename + ".hdr"); st != 0) return calledError(st);
+  if (!rec.GSexists(GeneralSAR::GS_DATAFILE) || !rec.GSexists(GeneralSAR::GS_ROI) ||
+      !rec.GSexists(GeneralSAR::GS_POLYNOMIALS)) {
+    ORV_REPORT("Record of " + OutputFilename + " lacks raster, region or polynomials",
+               REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+  DataFile in(rec.dataFile);
+  in.filename = OutputFilename;
+  in.buffersize = 0;
+  ROI_Obj& roi = rec.roi.roi;
+  const int N = in.NrOfLinesPerImage;
+  const int Nc = in.NrOfPixelsPerLine;
+  const double dt = roi.SlowTimeDelta;
+  if (Nc < 1 || dt <= 0.0) {
+    ORV_REPORT("Raster of " + OutputFilename + " has no samples or no line spacing", REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+  const double prf = 1.0 / dt;
+  const double E = rec.swath.Echoes_per_burst;
+  const double V = rec.attitude.Eq_speed;
+  const int B = (N - kOverlap) / kStep;
+
+  const std::string outName = OutputFilename + "_descallop";
+  DataFile out(in);
+  out.filename = outName;
+  out.RowPrefix = 0;
+  out.HeaderOffset = 0;
+  out.CellType = FLOAT_COMPLEX;
+  out.ByteOrder = 0;
+  out.NrOfLinesPerImage = std::max(B, 0) * kStep;
+
+  FFTBuffer block, filter;
+  try {
+    block.assign(static_cast<std::size_t>(kBlock) * Nc, fcomplex(0.0f, 0.0f));
+    filter.assign(kBlock, fcomplex(0.0f, 0.0f));
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Memory allocation failed", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  FFTPlan fwd, fwd1, inv;
+  if (fft_makep_c(fwd, Nc, Nc, kBlock, kBlock, FFT_NONE, FFT_FORWARD, 1) != 0 ||
+      fft_makep_c(fwd1, kBlock, kBlock, 1, 1, FFT_FORWARD, FFT_NONE, 1) != 0 ||
+      fft_makep_c(inv, Nc, Nc, kBlock, kBlock, FFT_NONE, FFT_BACKWARD_NORMALISED, 1) != 0) {
+    ORV_REPORT("Transform plans could not be made", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  if (int st = out.open(1); st != 0) return calledError(st);
+
+  int status = 0;
+  waitbar_open("De-scalloping...");
+  for (int b = 0; b < B && status == 0; ++b) {
+    waitbar_update(0, static_cast<float>(b) / B * 100.0f);
+    std::fill(block.begin(), block.end(), fcomplex(0.0f, 0.0f));
+    BufferIO rio;
+    rio.file = &in;
+    rio.first_column = 0;
+    rio.columns = Nc;
+    rio.first_row = b * kStep;
+    rio.rows = kBlock;
+    rio.memory_type = FLOAT_COMPLEX;
+    if ((status = rio.readbuffer(block.data())) != 0) break;
+    pfft_c(fwd, block.data(), block.data());
+    const double tb = (b + 0.5) * kStep * dt + roi.SlowStartTime;
+
+    for (int c = 0; c < Nc; ++c) {
+      const double tr = c * roi.FastTimeDelta + roi.FastStartTime;
+      const double ka = rec.polynomials.EvaluateFR(tr, tb);
+      const double fdc = rec.polynomials.EvaluateDC(tr, tb);
+      std::fill(filter.begin(), filter.end(), fcomplex(0.0f, 0.0f));
+      for (int k = -kTaps; k <= kTaps; ++k) {
+        const double x = 4.0 * ka * (-E) / (prf * prf) * k;
+        const double ph = 2.0 * kPi * k * fdc / prf;
+        const double s = sincPi(x);
+        filter[(k + kBlock) % kBlock] =
+            fcomplex(static_cast<float>(s * std::cos(ph)), static_cast<float>(s * std::sin(ph)));
+      }
+      pfft_c(fwd1, filter.data(), filter.data());
+      const double fo = fdc - std::floor(fdc / prf) * prf;
+      for (int i = 0; i < kBlock; ++i) {
+        const double f = i * prf / kBlock - fo + prf / 2.0;
+        const double fw = f - std::floor(f / prf) * prf - prf / 2.0;
+        const double y = (fw + fdc - fdc) * 4.5 / V;
+        const double s = sincPi(y);
+        const double g = std::abs(filter[i]) / (s * s);
+        block[static_cast<std::size_t>(i) * Nc + c] *= static_cast<float>(g);
+      }
+    }
+    pfft_c(inv, block.data(), block.data());
+    status = out.write(block.data() + static_cast<std::size_t>(kHalf) * Nc,
+                       static_cast<int64_t>(kStep) * Nc * sizeof(fcomplex));
+  }
+  waitbar_close();
+  in.close();
+  const int closed = out.close();
+  if (status == 0) status = closed;
+  if (status != 0) return calledError(status);
+
+  roi.SlowStartTime += kHalf * dt;
+  roi.Lines = std::max(B, 0) * kStep;
+  roi.SlowTimeLength = roi.Lines * dt;
+  rec.dataFile.filename = outName;
+  rec.dataFile.NrOfLinesPerImage = roi.Lines;
+  rec.dataFile.RowPrefix = 0;
+  rec.dataFile.HeaderOffset = 0;
+  rec.dataFile.CellType = FLOAT_COMPLEX;
+  rec.dataFile.ByteOrder = 0;
+  if (int st = rec.GSwrite(outName + ".hdr"); st != 0) return calledError(st);
+  rec.GSdestroy();
+  return 0;
+}

@@ -7,8 +7,11 @@
 #include <string>
 
 #include "base/fcomplex.h"
+#include "core/azimuth_focus.h"
+#include "doppler/dc_state.h"
 
 class GeneralSAR;
+class poly;
 
 // Flat configuration of the chain, read from the parameter profile.
 struct SARFocuser_conf {
@@ -155,3 +158,13 @@ int SetParFloat(const std::string& file, const std::string& key, int count, cons
                 int flag, const std::string& section);
 int SetParDouble(const std::string& file, const std::string& key, int count, const double* value,
                  int flag, const std::string& section);
+
+// Polynomial in the flat layout of the azimuth focuser: c0..c6, trg0, taz0.
+void polyToFlat(const poly& p, double out[9]);
+void polyFromFlat(const double in[9], poly& p);
+
+// The kernels of the chain as the stages call them: Doppler centroid
+// polynomial of a range-focused raster and azimuth focusing.
+int estimateCentroid(DcEstInput& input, DcEstState& state, double poly[7]);
+int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
+                 const AzimuthFocusConf& conf);

@@ -2,11 +2,35 @@
 
 #include <dirent.h>
 
+#include <algorithm>
+#include <cmath>
 #include <cstdio>
+#include <cstring>
+#include <new>
+#include <vector>
 
+#include "base/status.h"
+#include "core/azimuth_focus.h"
+#include "core/range_focuser.h"
 #include "diag/report.h"
+#include "orbit/general_sar_orbit.h"
+#include "product/buffer_io.h"
+#include "product/roi.h"
 
 namespace {
+
+constexpr double kPi = 3.14159265358979323846;
+constexpr double kEqSpeedPlaceholder = 6900.0;
+
+int calledError(int status) {
+  ORV_REPORT_CALLED_ERROR();
+  return status;
+}
+
+void removeReported(const std::string& name) {
+  if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
+}
+
 
 bool fileOpens(const std::string& name) {
   std::FILE* f = std::fopen(name.c_str(), "rb");
@@ -147,34 +171,511 @@ int stripmapGeneralFocuserModular::initialize_modular() {
   return 0;
 }
 
-int stripmapGeneralFocuserModular::run_modular() { return 1; }
-int stripmapGeneralFocuserModular::setConfFile(const std::string&, int) { return 1; }
-int stripmapGeneralFocuserModular::rangefoc(const std::string&, const std::string&,
-                                            const std::string&) { return 1; }
-int stripmapGeneralFocuserModular::dcEst(const std::string&) { return 1; }
-int stripmapGeneralFocuserModular::frEst(const std::string&) { return 1; }
-int stripmapGeneralFocuserModular::azfoc(const std::string&, const std::string&, double) {
-  return 1;
+int stripmapGeneralFocuserModular::run_modular() {
+  int status = initialize_modular();
+  if (status == 0) status = ingestion();
+  const std::string extracted = outputFilename + ".extracted";
+  const std::string chirp = outputFilename + ".chirp";
+  const std::string rgfoc = outputFilename + ".rgfoc";
+  if (status == 0) {
+    work.rawFile = extracted;
+    status = preprocessing();
+  }
+  if (status == 0) status = align_rawdata(work.rawFile);
+  if (status == 0) status = rangefoc(extracted, chirp, rgfoc);
+  if (status == 0) status = dcEst(rgfoc);
+  if (status == 0) status = frEst(rgfoc);
+  if (status == 0) status = azfoc(rgfoc, outputFilename, 0.0);
+  if (status == 0) status = postprocessing();
+  if (status == 0) status = finalize_modular();
+  if (status != 0) ORV_REPORT_CALLED_ERROR();
+  return status;
 }
-int stripmapGeneralFocuserModular::rangefoc() { return 1; }
-int stripmapGeneralFocuserModular::dcEst() { return 1; }
-int stripmapGeneralFocuserModular::frEst() { return 1; }
-int stripmapGeneralFocuserModular::azfoc(double) { return 1; }
-int stripmapGeneralFocuserModular::align_rawdata(const std::string&) { return 1; }
-int stripmapGeneralFocuserModular::align_rawdata() { return 1; }
-double stripmapGeneralFocuserModular::getDCshift(double, double) { return 0.0; }
+
+int stripmapGeneralFocuserModular::setConfFile(const std::string& file, int channel) {
+  if (int st = configuration.GSread(file, channel); st != 0) return calledError(st);
+  Memory = configuration.generalConf.Memory;
+  Incore = configuration.generalConf.Incore;
+  return 0;
+}
+
+int stripmapGeneralFocuserModular::rangefoc(const std::string& raw, const std::string& chirp,
+                                            const std::string& output) {
+  const generalProcessingConf& g = configuration.generalConf;
+  if (!g.Flag_rangefoc) return 0;
+  GeneralSAR record;
+  record.GSread(raw + ".hdr");
+  if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
+    ORV_REPORT("Raw data image does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  ATRangeFocuser rf;
+  rf.RawData = raw;
+  rf.ChirpFile = chirp;
+  rf.OutputFile = output;
+  rf.Memory = Memory;
+  rf.DataToSkip = 0;
+  rf.DataToProcess = 0;
+  rf.Flag_ortog = g.Flag_ortog;
+  if (int st = rf.run(); st != 0) return calledError(st);
+  if (g.EraseTemp) {
+    for (const std::string& f : {raw, raw + ".hdr", chirp, chirp + ".hdr"}) removeReported(f);
+  }
+  return 0;
+}
+
+int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
+  if (!configuration.generalConf.Flag_dcest) return 0;
+  std::string dir;
+  findDir(file, dir);
+  GeneralSAR record;
+  if (int st = record.GSread(file + ".hdr"); st != 0) return calledError(st);
+  if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
+    ORV_REPORT("Range focused image does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  record.polynomials.CreatePolys(1, 1);
+  const DCestConf& d = configuration.dcestConf;
+  DcEstInput in;
+  in.rasterFile = file;
+  in.outDir = dir;
+  in.samples = record.dataFile.NrOfPixelsPerLine;
+  in.lines = record.dataFile.NrOfLinesPerImage;
+  in.prf = record.sampling.prf_hz;
+  in.velocity = kEqSpeedPlaceholder;
+  in.byteOrder = record.dataFile.ByteOrder;
+  in.headerOffset = record.dataFile.HeaderOffset;
+  in.timeOrigin = record.roi.roi.SlowStartTime;
+  DcEstState state;
+  state.blocks = d.Blocks;
+  state.blockl = d.Blockl;
+  state.memory = static_cast<int64_t>(Memory) << 20;
+  state.nBest = d.Nbestblocks;
+  state.nWdar = d.Nwdarbloks;
+  state.nMlbf = d.Nummlbf;
+  state.anLen = d.AnLen;
+  state.rgBand = d.RgBand;
+  state.fc = record.sampling.fc_hz;
+  state.fs = record.sampling.frg_hz;
+  state.maxAmb = d.Maxamb;
+  state.minAmb = d.Minamb;
+  state.kThr = d.Kthr;
+  state.sThr = d.Sthr;
+  state.varTh = d.Varth;
+  state.lookBf = d.Lookbf;
+  state.lookBt = d.Lookbt;
+  state.lookRp = d.Lookrp;
+  state.lookRs = d.Lookrs;
+  state.fLength = d.Flength;
+  state.decFac = d.Decfac;
+  state.dftStep = d.Dftstep;
+  state.peakWid = d.Peakwid;
+  state.ambFlag = d.Amb_flag;
+  for (int i = 0; i < 7; ++i) state.polMask[i] = d.Pol_weights[i];
+  state.patchs = d.Patchs;
+  state.patchl = d.Patchl;
+  state.fftRgPrc = d.Fftrgprc;
+  state.fftAzPrc = d.Fftazprc;
+  state.dswst = d.Dswst;
+  double c[7] = {0, 0, 0, 0, 0, 0, 0};
+  if (int st = estimateCentroid(in, state, c); st != 0) return calledError(st);
+  polyDC& dc = record.polynomials.DC[0];
+  for (int i = 0; i < 7; ++i) dc.c[i] = c[i];
+  dc.trg0 = record.roi.roi.FastStartTime;
+  dc.taz0 = record.roi.roi.SlowStartTime;
+  record.GSenable(GeneralSAR::GS_POLYNOMIALS);
+  if (int st = record.GSwrite(file + ".hdr"); st != 0) return calledError(st);
+  record.GSdestroy();
+  return 0;
+}
+
+int stripmapGeneralFocuserModular::frEst(const std::string& file) {
+  if (!configuration.generalConf.Flag_dcest) return 0;
+  GeneralSAR record;
+  record.GSread(file + ".hdr");
+  if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
+    ORV_REPORT("Range focused image does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  if (!record.GSexists(GeneralSAR::GS_POLYNOMIALS) || record.polynomials.ndc < 1) {
+    ORV_REPORT("Doppler Centroid Estimation does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  if (!record.GSexists(GeneralSAR::GS_DATASETINFO)) {
+    ORV_REPORT("DataSetInfo does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  const int lookSign = record.dataSetInfo.LookDirection != -1 ? 1 : -1;
+  record.orbit().setLookSign(lookSign);
+  const polyDC dc = record.polynomials.DC[0];
+  record.polynomials.CreatePolys(1, 1);
+  record.polynomials.DC[0] = dc;
+  if (int st = record.orbit().SVGetFRpoly(&record.roi.roi, &record.polynomials.DC[0],
+                                          &record.polynomials.FR[0]);
+      st != 0)
+    return calledError(st);
+  record.GSenable(GeneralSAR::GS_POLYNOMIALS);
+  if (int st = record.GSwrite(file + ".hdr"); st != 0) return calledError(st);
+  record.GSdestroy();
+  return 0;
+}
+
+int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::string& output,
+                                         double azimuthShift) {
+  if (!configuration.generalConf.Flag_azimuthfoc) return 0;
+  GeneralSAR record;
+  record.GSread(input + ".hdr");
+  if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
+    ORV_REPORT("Range focused image does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  if (!record.GSexists(GeneralSAR::GS_POLYNOMIALS) || record.polynomials.ndc < 1) {
+    ORV_REPORT("Doppler Centroid Estimation does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  if (record.polynomials.nfr < 1) {
+    ORV_REPORT("Doppler Rate Estimation does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  if (!record.GSexists(GeneralSAR::GS_DATASETINFO)) {
+    ORV_REPORT("DataSetInfo does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  const AzimuthConf& a = configuration.azimuthConf;
+  const SamplingConstants_Obj& smp = record.sampling;
+  const ROI_Obj& roi = record.roi.roi;
+  const int lines = record.dataFile.NrOfLinesPerImage;
+  const int samples = record.dataFile.NrOfPixelsPerLine;
+
+  AzimuthFocusFiles files;
+  files.input = input;
+  files.output = output;
+  files.frg_hz = smp.frg_hz;
+  files.fc_hz = smp.fc_hz;
+  files.prf_hz = smp.prf_hz;
+  files.FastStartTime = roi.FastStartTime;
+  files.bandwidth_hz = smp.Brg_hz;
+  files.SlowStartTime = roi.SlowStartTime;
+  AzimuthFocusScene scene;
+  scene.samples = samples;
+  scene.lines = lines;
+  polyToFlat(record.polynomials.DC[0], scene.polyDC);
+  polyToFlat(record.polynomials.FR[0], scene.polyFR);
+  AzimuthFocusConf ac;
+  ac.PerformInterpolation = a.PerformInterpolation;
+  ac.StoltPadding = a.StoltPadding;
+  ac.AntennaLength = a.AntennaLength;
+  ac.WhiteningFlag = a.WhiteningFlag;
+  ac.RangeWindowHammingParameter = a.RangeWindowHammingParameter;
+  ac.AzimuthWindowHammingParameter = a.AzimuthWindowHammingParameter;
+  ac.RangeLookBandwidth = a.RangeLookBandwidth * smp.frg_hz;
+  ac.AzimuthLookBandwidth = a.AzimuthLookBandwidth * smp.prf_hz;
+  ac.RangeTransitionBandwidth = a.RangeTransitionBandwidth * smp.frg_hz;
+  ac.AzimuthTransitionBandwidth = a.AzimuthTransitionBandwidth * smp.prf_hz;
+  ac.SamplesInBlock = a.SamplesInBlock;
+  ac.LinesInBlock = a.LinesInBlock;
+  ac.RangeOverlap = a.RangeOverlap / 2;
+  ac.AzimuthOverlap = a.AzimuthOverlap / 2;
+  ac.ApplyAzShift = static_cast<double>(a.ApplyAzShift) * lines;
+  ac.ApplyRgShift = static_cast<double>(a.ApplyRgShift) * samples;
+  // The extra shift enlarges the magnitude on the side of the shift's sign.
+  ac.ApplyAzShift =
+      ac.ApplyAzShift < 0.0 ? ac.ApplyAzShift - azimuthShift : ac.ApplyAzShift + azimuthShift;
+  if (int st = focusAzimuth(files, scene, ac); st != 0) return calledError(st);
+
+  GeneralSAR product;
+  if (int st = product.GSread(input + ".hdr"); st != 0) return calledError(st);
+  product.dataFile.filename = output;
+  product.dataFile.NrOfPixelsPerLine = scene.outSamples;
+  product.dataFile.NrOfLinesPerImage = scene.outLines;
+  product.dataFile.RowPrefix = 0;
+  product.dataFile.HeaderOffset = 0;
+  product.dataFile.CellType = FLOAT_COMPLEX;
+  product.dataFile.ByteOrder = 0;
+  ROI_Obj& out = product.roi.roi;
+  out.SetFastAxe(scene.firstSampleTime, roi.FastTimeDelta, scene.outSamples);
+  out.SetSlowAxe(scene.firstLineTime, roi.SlowTimeDelta, scene.outLines);
+  product.polynomials.CreatePolys(1, 1);
+  polyFromFlat(scene.polyDCOut, product.polynomials.DC[0]);
+  polyFromFlat(scene.polyFROut, product.polynomials.FR[0]);
+  product.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
+  product.dataSetInfo.SWST_MIN = product.dataSetInfo.SWST_MAX = scene.firstSampleTime;
+  product.attitude.Eq_speed = scene.Veq;
+  product.attitude.Mean_DC = scene.centroid;
+  product.attitude.SquintAngle =
+      scene.Veq != 0.0
+          ? std::asin(-(smp.lambda_m * scene.centroid) / (2.0 * scene.Veq)) * 180.0 / kPi
+          : 0.0;
+  SpectralWindows_Obj& w = product.spectralWindows;
+  w.AzMatchedFilterType = "HAMMING";
+  w.RgMatchedFilterType = "HAMMING";
+  w.RgMatchedFilterCoef = a.RangeWindowHammingParameter;
+  w.AzMatchedFilterCoef = a.AzimuthWindowHammingParameter;
+  w.RgLookBandwidth = a.RangeLookBandwidth;
+  w.AzLookBandwidth = a.AzimuthLookBandwidth;
+  if (int st = product.orbit().SVGetGeoCoords(&product.geoCoords, &out); st != 0)
+    return calledError(st);
+  for (GeneralSAR::GSObject o :
+       {GeneralSAR::GS_POLYNOMIALS, GeneralSAR::GS_DATASETINFO, GeneralSAR::GS_ATTITUDE,
+        GeneralSAR::GS_SPECTRALWINDOWS, GeneralSAR::GS_GEOCOORDS})
+    product.GSenable(o);
+  if (int st = product.GSwrite(output + ".hdr"); st != 0) return calledError(st);
+  product.GSdestroy();
+  if (configuration.generalConf.EraseTemp) {
+    removeReported(input);
+    removeReported(input + ".hdr");
+  }
+  return 0;
+}
+
+int stripmapGeneralFocuserModular::rangefoc() {
+  if (!outputSelected_) return 1;
+  return rangefoc(work.rawFile, work.chirpFile, work.rgfocFile);
+}
+int stripmapGeneralFocuserModular::dcEst() {
+  if (!outputSelected_) return 1;
+  return dcEst(work.rgfocFile);
+}
+int stripmapGeneralFocuserModular::frEst() {
+  if (!outputSelected_) return 1;
+  return frEst(work.rgfocFile);
+}
+int stripmapGeneralFocuserModular::azfoc(double azimuthShift) {
+  if (!outputSelected_) return 1;
+  return azfoc(work.rgfocFile, work.outputFile, azimuthShift);
+}
+
+int stripmapGeneralFocuserModular::align_rawdata() { return align_rawdata(work.rawFile); }
+
+int stripmapGeneralFocuserModular::align_rawdata(const std::string& file) {
+  GeneralSAR record;
+  record.GSread(file + ".hdr");
+  if (!record.GSexists(GeneralSAR::GS_DATAFILE) || !record.GSexists(GeneralSAR::GS_DATASETINFO) ||
+      !record.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA)) {
+    ORV_REPORT("Input File is not a not aligned raw data file", REPORT_ERROR);
+    return 1;
+  }
+  DataFile in(record.dataFile);
+  in.filename = file;
+  in.buffersize = 0;
+  const int lines = in.NrOfLinesPerImage;
+  const int S = in.NrOfPixelsPerLine;
+  const double fs = record.sampling.frg_hz > 0.0 ? record.sampling.frg_hz
+                                                 : 1.0 / record.roi.roi.FastTimeDelta;
+  if (in.RowPrefix < 4 || lines < 1 || S < 1 || !(fs > 0.0) || !std::isfinite(fs)) {
+    ORV_REPORT("Raster info of the raw data file is wrong: " + file, REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
+
+  // Window starts of all lines from the row prefixes.
+  std::vector<float> swst(lines);
+  {
+    std::vector<char> prefixes(static_cast<std::size_t>(in.RowPrefix) * lines);
+    BufferIO io;
+    io.file = &in;
+    io.first_column = 0;
+    io.columns = S;
+    io.first_row = 0;
+    io.rows = lines;
+    io.memory_type = in.CellType;
+    if (int st = io.readprefix(prefixes.data()); st != 0) return calledError(st);
+    in.close();
+    for (int l = 0; l < lines; ++l)
+      std::memcpy(&swst[l], prefixes.data() + static_cast<std::size_t>(l) * in.RowPrefix, 4);
+  }
+  const DataSetInfo_Obj& info = record.dataSetInfo;
+  const bool bounded = info.SWST_MIN > 0.0 && info.SWST_MAX >= info.SWST_MIN;
+  const double tolerance = 0.5 / fs;
+  double lo = 0.0;
+  for (int l = 0; l < lines; ++l) {
+    const double t = swst[l];
+    const bool wrong = !std::isfinite(t) || t <= 0.0 ||
+                       (bounded && (t < info.SWST_MIN - tolerance || t > info.SWST_MAX + tolerance));
+    if (wrong) {
+      char text[64];
+      std::snprintf(text, sizeof text, "SWST of LINE %d IS WRONG!", l);
+      ORV_REPORT(text, REPORT_ERROR);
+      return STATUS_BAD_CONDITION;
+    }
+    if (l == 0 || t < lo) lo = t;
+  }
+  std::vector<int> shift(lines);
+  int D = 0;
+  for (int l = 0; l < lines; ++l) {
+    shift[l] = roundHalfAway((static_cast<double>(swst[l]) - lo) * fs);
+    D = std::max(D, shift[l]);
+  }
+
+  const std::string aligned = file + "_align";
+  DataFile out;
+  out.filename = aligned;
+  out.NrOfPixelsPerLine = S + D;
+  out.NrOfLinesPerImage = lines;
+  out.RowPrefix = 0;
+  out.HeaderOffset = 0;
+  out.CellType = FLOAT_COMPLEX;
+  out.ByteOrder = 0;
+  in.buffersize = 0;
+  std::vector<fcomplex> row(S), line(static_cast<std::size_t>(S) + D);
+  if (int st = out.open(1); st != 0) return calledError(st);
+  for (int l = 0; l < lines; ++l) {
+    BufferIO io;
+    io.file = &in;
+    io.first_column = 0;
+    io.columns = S;
+    io.first_row = l;
+    io.rows = 1;
+    io.memory_type = FLOAT_COMPLEX;
+    if (int st = io.readbuffer(row.data()); st != 0) return calledError(st);
+    std::fill(line.begin(), line.end(), fcomplex(0.0f, 0.0f));
+    std::copy(row.begin(), row.end(), line.begin() + shift[l]);
+    if (int st = out.write(line.data(), static_cast<int64_t>(line.size()) * sizeof(fcomplex));
+        st != 0)
+      return calledError(st);
+  }
+  in.close();
+  if (int st = out.close(); st != 0) return calledError(st);
+
+  if (std::rename(aligned.c_str(), file.c_str()) != 0) {
+    ORV_REPORT("Cannot rename " + aligned + " over " + file, REPORT_ERROR);
+    return STATUS_WRITE_FAILED;
+  }
+  record.dataFile.filename = file;
+  record.dataFile.NrOfPixelsPerLine = S + D;
+  record.dataFile.RowPrefix = 0;
+  record.dataFile.HeaderOffset = 0;
+  record.dataFile.CellType = FLOAT_COMPLEX;
+  record.dataFile.ByteOrder = 0;
+  ROI_Obj& roi = record.roi.roi;
+  roi.SetFastAxe(lo, roi.FastTimeDelta > 0.0 ? roi.FastTimeDelta : 1.0 / fs, S + D);
+  record.dataSetInfo.SWST_MIN = record.dataSetInfo.SWST_MAX = lo;
+  record.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RAW_DATA_ALIGNED);
+  std::remove((file + ".hdr").c_str());
+  if (int st = record.GSwrite(file + ".hdr"); st != 0) return calledError(st);
+  record.GSdestroy();
+  return 0;
+}
+
+double stripmapGeneralFocuserModular::getDCshift(double fdc, double fr) {
+  return fr != 0.0 ? -fdc / fr : 0.0;
+}
+
 void stripmapGeneralFocuserModular::findDir(const std::string& path, std::string& result) {
-  size_t pos = path.find_last_of('/');
-  result = pos == std::string::npos ? std::string(".") : path.substr(0, pos);
+  const std::size_t pos = path.find_last_of("/\\");
+  std::string dir = pos == std::string::npos ? std::string(".")
+                    : pos == 0               ? path.substr(0, 1)
+                                             : path.substr(0, pos);
+  result.swap(dir);
 }
-int stripmapGeneralFocuserModular::getFOCroi(const ROI_Obj&, const ROI_Obj&, int, int, ROI_Obj&) {
-  return 1;
+
+int stripmapGeneralFocuserModular::getFOCroi(const ROI_Obj& raw, const ROI_Obj& foc,
+                                             int apertureLines, int chirpSamples,
+                                             ROI_Obj& result) {
+  const int half = std::max(apertureLines, 0) / 2;
+  const int focFirstLine = raw.GetSlowIndex(foc.SlowStartTime);
+  const int focLines = raw.GetSlowRange(foc.SlowTimeLength);
+  const int focFirstSample = raw.GetFastIndex(foc.FastStartTime);
+  const int focSamples = raw.GetFastRange(foc.FastTimeLength);
+  const int firstLine = focFirstLine - half;
+  const int endLine = focFirstLine + focLines + half;
+  const int firstSample = focFirstSample;
+  const int endSample = focFirstSample + focSamples + std::max(chirpSamples - 1, 0);
+  if (focLines < 1 || focSamples < 1 || firstLine < 0 || endLine > raw.Lines || firstSample < 0 ||
+      endSample > raw.Samples) {
+    ORV_REPORT("Requested focused block cannot be obtained from the given extracted data",
+               REPORT_ERROR);
+    return 1;
+  }
+  result = raw;
+  result.SetFastAxe(raw.FastStartTime + firstSample * raw.FastTimeDelta, raw.FastTimeDelta,
+                    endSample - firstSample);
+  result.SetSlowAxe(raw.SlowStartTime + firstLine * raw.SlowTimeDelta, raw.SlowTimeDelta,
+                    endLine - firstLine);
+  return 0;
 }
-int stripmapGeneralFocuserModular::getRAWroi(const ROI_Obj&, const ROI_Obj&, int*, int*, int*,
-                                             int*) {
-  return 1;
+
+int stripmapGeneralFocuserModular::getRAWroi(const ROI_Obj& raw, const ROI_Obj& rawBlock,
+                                             int* firstLine, int* lines, int* firstSample,
+                                             int* samples) {
+  const int l0 = raw.GetSlowIndex(rawBlock.SlowStartTime);
+  const int l1 = l0 + raw.GetSlowRange(rawBlock.SlowTimeLength);
+  const int s0 = raw.GetFastIndex(rawBlock.FastStartTime);
+  const int s1 = s0 + raw.GetFastRange(rawBlock.FastTimeLength);
+  *firstLine = std::max(l0, 0);
+  *lines = std::min(l1, raw.Lines) - *firstLine;
+  *firstSample = std::max(s0, 0);
+  *samples = std::min(s1, raw.Samples) - *firstSample;
+  if (*lines < 1 || *samples < 1) {
+    ORV_REPORT("Requested raw block lies outside the raw data", REPORT_ERROR);
+    *lines = std::max(*lines, 0);
+    *samples = std::max(*samples, 0);
+    return 1;
+  }
+  return 0;
 }
-int stripmapGeneralFocuserModular::cutRAW(const std::string&, const std::string&,
-                                          const ROI_Obj&) {
-  return 1;
+
+int stripmapGeneralFocuserModular::cutRAW(const std::string& input, const std::string& output,
+                                          const ROI_Obj& region) {
+  GeneralSAR record;
+  record.GSread(input + ".hdr");
+  if (!record.GSexists(GeneralSAR::GS_DATAFILE) || !record.GSexists(GeneralSAR::GS_DATASETINFO) ||
+      !record.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA_ALIGNED)) {
+    ORV_REPORT("Raw Data must be range aligned!", REPORT_ERROR);
+    return 1;
+  }
+  ROI_Obj& roi = record.roi.roi;
+  int l0 = 0, nl = 0, s0 = 0, ns = 0;
+  if (int st = getRAWroi(roi, region, &l0, &nl, &s0, &ns); st != 0) return calledError(st);
+
+  DataFile in(record.dataFile);
+  in.filename = input;
+  in.buffersize = 0;
+  DataFile out;
+  out.filename = output;
+  out.NrOfPixelsPerLine = ns;
+  out.NrOfLinesPerImage = nl;
+  out.RowPrefix = 0;
+  out.HeaderOffset = 0;
+  out.CellType = FLOAT_COMPLEX;
+  out.ByteOrder = 0;
+  std::vector<fcomplex> block;
+  try {
+    block.resize(static_cast<std::size_t>(ns) * nl);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Memory allocation failed", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  BufferIO io;
+  io.file = &in;
+  io.first_column = s0;
+  io.columns = ns;
+  io.first_row = l0;
+  io.rows = nl;
+  io.memory_type = FLOAT_COMPLEX;
+  if (int st = io.readbuffer(block.data()); st != 0) return calledError(st);
+  in.close();
+  BufferIO wo;
+  wo.file = &out;
+  wo.first_column = 0;
+  wo.columns = ns;
+  wo.first_row = 0;
+  wo.rows = nl;
+  wo.memory_type = FLOAT_COMPLEX;
+  if (int st = wo.writebuffer(block.data()); st != 0) return calledError(st);
+  if (int st = out.close(); st != 0) return calledError(st);
+
+  const double fast0 = roi.FastStartTime + s0 * roi.FastTimeDelta;
+  roi.SetFastAxe(fast0, roi.FastTimeDelta, ns);
+  roi.SetSlowAxe(roi.SlowStartTime + l0 * roi.SlowTimeDelta, roi.SlowTimeDelta, nl);
+  record.dataSetInfo.SWST_MIN = record.dataSetInfo.SWST_MAX = fast0;
+  record.dataFile.filename = output;
+  record.dataFile.NrOfPixelsPerLine = ns;
+  record.dataFile.NrOfLinesPerImage = nl;
+  record.dataFile.RowPrefix = 0;
+  record.dataFile.HeaderOffset = 0;
+  record.dataFile.CellType = FLOAT_COMPLEX;
+  record.dataFile.ByteOrder = 0;
+  if (int st = record.GSwrite(output + ".hdr"); st != 0) return calledError(st);
+  record.GSdestroy();
+  return 0;
 }

@@ -1,0 +1,216 @@
+#include <string>
+#include <vector>
+
+#include "focus/stripmap_general_focuser.h"
+#include "focus_fixture.h"
+#include "product/data_set_info.h"
+
+namespace {
+
+// A sensor focuser whose stages only record that they ran; one of them can
+// be made to fail.
+class RecordingFocuser : public stripmapGeneralFocuserModular {
+ public:
+  int initialize() override { return step("initialize", stripmapGeneralFocuser::initialize()); }
+  int finalize() override { return step("finalize", 0); }
+  int ingestion(const std::string& raw, const std::string&, const std::string&) override {
+    return step("ingestion:" + raw, 0);
+  }
+  int ingestion() override { return step("ingestion", 0); }
+  int preprocessing() override { return step("preprocessing", 0); }
+  int postprocessing() override { return step("postprocessing", 0); }
+
+  int step(const std::string& name, int status) {
+    stages.push_back(name);
+    const std::string base = name.substr(0, name.find(':'));
+    return base == failAt ? failStatus : status;
+  }
+  std::vector<std::string> stages;
+  std::string failAt;
+  int failStatus = 0;
+};
+
+class StageTemplate : public FocusTest {
+ protected:
+  void SetUp() override {
+    FocusTest::SetUp();
+    writeText(path("scene.dat"), "x");
+    writeText(path("orbit.txt"), "x");
+    writeText(path("profile.hdr"), "[sarfocuserConfiguration]\nMemory = 64\n");
+  }
+  void fill(stripmapGeneralFocuser& f) {
+    f.level0Filename = path("scene.dat");
+    f.orbitFilename = path("orbit.txt");
+    f.configurationFilename = path("profile.hdr");
+    f.outputFilename = path("out");
+  }
+};
+
+TEST_F(StageTemplate, InitializeChecksNamesAndFilesInOrder) {
+  struct Case {
+    std::string field;
+    std::string value;
+    std::string message;
+  };
+  const std::vector<Case> cases = {
+      {"scene", "", "Data filename not selected!"},
+      {"orbit", "", "Orbit filename not selected!"},
+      {"conf", "", "Processing conf not selected!"},
+      {"orbit", "missing_orbit", "orbit file does not exist!"},
+      {"scene", "missing_scene", "data file does not exist!"},
+      {"conf", "missing_profile", "processing configuration file does not exist!"},
+      {"skip", "-1", "skip lines <0!"},
+      {"extract", "-1", "extract lines <0!"},
+  };
+  for (const Case& c : cases) {
+    RecordingFocuser f;
+    fill(f);
+    const std::string v = c.value.empty() ? "" : path(c.value);
+    if (c.field == "scene") f.level0Filename = v;
+    if (c.field == "orbit") f.orbitFilename = v;
+    if (c.field == "conf") f.configurationFilename = v;
+    if (c.field == "skip") f.skipLines = -1;
+    if (c.field == "extract") f.extractLines = -1;
+    EXPECT_EQ(f.initialize(), 1) << c.message;
+    EXPECT_TRUE(traced(c.message)) << c.message;
+  }
+  // Every check failed on its own message, never on an earlier one.
+  const std::string t = trace();
+  EXPECT_EQ(t.find("Data filename not selected!"), t.rfind("Data filename not selected!"));
+
+  RecordingFocuser ok;
+  fill(ok);
+  ok.conf().Flag_set = 1;
+  EXPECT_EQ(ok.initialize(), 0);
+  EXPECT_TRUE(ok.outputSelected());
+  EXPECT_EQ(ok.conf().Flag_set, 0);  // cleared at the end
+
+  // A scene directory passes the test.
+  RecordingFocuser dir;
+  fill(dir);
+  dir.level0Filename = working_;
+  dir.outputFilename.clear();
+  EXPECT_EQ(dir.initialize(), 0);
+  EXPECT_FALSE(dir.outputSelected());
+}
+
+TEST_F(StageTemplate, RunCallsStagesInOrderAndStopsAtTheFirstFailure) {
+  // Every stage passes; the chain then finds no raw raster and gives 10.
+  {
+    reports_ = false;
+    set_flg_report(0);  // the missing raw raster is fatal while reports are on
+    RecordingFocuser f;
+    fill(f);
+    EXPECT_EQ(f.run(), 10);
+    EXPECT_EQ(f.stages, (std::vector<std::string>{"initialize", "ingestion", "preprocessing"}));
+    EXPECT_EQ(f.conf().Flag_set, 1);
+    EXPECT_EQ(f.conf().Verbose, 1);
+    set_flg_report(1);
+  }
+  for (const std::string failing : {"ingestion", "preprocessing"}) {
+    RecordingFocuser f;
+    fill(f);
+    f.failAt = failing;
+    f.failStatus = 7;
+    EXPECT_EQ(f.run(), 7) << failing;
+    EXPECT_EQ(f.stages.back(), failing);
+    EXPECT_EQ(f.conf().Flag_set, 0) << "the chain must not be armed";
+  }
+  {
+    RecordingFocuser f;
+    fill(f);
+    f.initialize();
+    f.stages.clear();
+    f.failAt = "initialize";
+    f.failStatus = 4;
+    EXPECT_EQ(f.run(), 4);
+    EXPECT_EQ(f.stages, std::vector<std::string>{"initialize"});
+  }
+}
+
+TEST_F(StageTemplate, NamedRunAndChainGuards) {
+  RecordingFocuser f;
+  fill(f);
+  // The names of the named run would collide with a selected output.
+  EXPECT_EQ(f.run("a.raw", "a.chirp", "", "a.out"), 1);
+  EXPECT_EQ(f.stages,
+            (std::vector<std::string>{"initialize", "ingestion:a.raw", "preprocessing"}));
+
+  // sarfocuser() needs the block marked as set by run().
+  RecordingFocuser g;
+  fill(g);
+  g.outputFilename.clear();
+  ASSERT_EQ(g.initialize(), 0);
+  EXPECT_EQ(g.sarfocuser(), 1);
+  // Without a selected output the names go into the chain; the antenna name
+  // stays when none is given.
+  g.focuser().AntennaFile = "keep";
+  set_flg_report(0);
+  EXPECT_EQ(g.sarfocuser(path("none.raw"), path("none.chirp"), "", path("o")), 10);
+  EXPECT_EQ(g.focuser().RawDataFile, path("none.raw"));
+  EXPECT_EQ(g.focuser().ChirpFile, path("none.chirp"));
+  EXPECT_EQ(g.focuser().OutputFilename, path("o"));
+  EXPECT_EQ(g.focuser().AntennaFile, "keep");
+  // The modular steps without names need a selected output.
+  EXPECT_EQ(g.rangefoc(), 1);
+  EXPECT_EQ(g.dcEst(), 1);
+  EXPECT_EQ(g.frEst(), 1);
+  EXPECT_EQ(g.azfoc(0.0), 1);
+}
+
+TEST_F(StageTemplate, FindDirGivesTheDirectoryPart) {
+  std::string d;
+  stripmapGeneralFocuserModular::findDir("/data/scene/out.rgfoc", d);
+  EXPECT_EQ(d, "/data/scene");
+  stripmapGeneralFocuserModular::findDir("rel/out", d);
+  EXPECT_EQ(d, "rel");
+  stripmapGeneralFocuserModular::findDir("out.rgfoc", d);
+  EXPECT_EQ(d, ".");
+  stripmapGeneralFocuserModular::findDir("/out", d);
+  EXPECT_EQ(d, "/");
+  stripmapGeneralFocuserModular::findDir("C:\\scenes\\out", d);
+  EXPECT_EQ(d, "C:\\scenes");
+  d = "/a/b/c";
+  stripmapGeneralFocuserModular::findDir(d, d);  // in place
+  EXPECT_EQ(d, "/a/b");
+}
+
+TEST_F(StageTemplate, DopplerShiftIsBeamCentreToZeroDoppler) {
+  EXPECT_DOUBLE_EQ(stripmapGeneralFocuserModular::getDCshift(300.0, -2000.0), 0.15);
+  EXPECT_DOUBLE_EQ(stripmapGeneralFocuserModular::getDCshift(-300.0, -2000.0), -0.15);
+  EXPECT_DOUBLE_EQ(stripmapGeneralFocuserModular::getDCshift(300.0, 0.0), 0.0);
+}
+
+TEST_F(StageTemplate, ModularStepsSkipWhenTheirFlagIsOffAndCheckTheirInputs) {
+  RecordingFocuser f;
+  EXPECT_EQ(f.rangefoc("a", "b", "c"), 0);  // flags all off
+  EXPECT_EQ(f.dcEst("a"), 0);
+  EXPECT_EQ(f.frEst("a"), 0);
+  EXPECT_EQ(f.azfoc("a", "b", 0.0), 0);
+  f.configuration.generalConf.Flag_rangefoc = 1;
+  f.configuration.generalConf.Flag_dcest = 1;
+  f.configuration.generalConf.Flag_azimuthfoc = 1;
+  EXPECT_EQ(f.rangefoc(path("none"), "b", "c"), 1);
+  EXPECT_TRUE(traced("Raw data image does not exist!"));
+
+  // A range-focused raster without polynomials.
+  writeRaster(path("rg"), 2, 2, std::vector<fcomplex>(4), DataSetInfo_Obj::IT_RANGE_FOCUSED);
+  EXPECT_EQ(f.frEst(path("rg")), 1);
+  EXPECT_TRUE(traced("Doppler Centroid Estimation does not exist!"));
+  EXPECT_EQ(f.azfoc(path("rg"), path("out"), 0.0), 1);
+  EXPECT_EQ(f.frEst(path("nothing")), 1);
+  EXPECT_TRUE(traced("Range focused image does not exist!"));
+
+  // With a centroid but no rate, azimuth focusing refuses rather than
+  // estimating the rate itself.
+  GeneralSAR rec;
+  ASSERT_EQ(rec.GSread(path("rg") + ".hdr"), 0);
+  rec.polynomials.CreatePolys(1, 0);
+  rec.GSenable(GeneralSAR::GS_POLYNOMIALS);
+  ASSERT_EQ(rec.GSwrite(path("rg") + ".hdr"), 0);
+  EXPECT_EQ(f.azfoc(path("rg"), path("out"), 0.0), 1);
+  EXPECT_TRUE(traced("Doppler Rate Estimation does not exist!"));
+  EXPECT_FALSE(std::filesystem::exists(path("out.hdr")));
+}
+
+}  // namespace
