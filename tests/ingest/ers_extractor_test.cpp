@@ -1,0 +1,398 @@
+#include "ingest/ers_extractor.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+
+#include "ingest_test_util.h"
+#include "orbit/general_sar_orbit.h"
+#include "product/time_base.h"
+
+using ingest_test::blankWith;
+using ingest_test::TempFolder;
+using ingest_test::writeBytes;
+
+namespace {
+
+struct Line {
+  std::uint32_t number;
+  int code;
+  unsigned char i, q;  // every sample of the line
+};
+
+void be32(std::string& s, std::size_t at, std::uint32_t v) {
+  for (int k = 0; k < 4; ++k) s[at + k] = static_cast<char>((v >> (24 - 8 * k)) & 0xff);
+}
+
+// An image file: descriptor of 11644 bytes, then one 412 + 2 * samples
+// record per line; the sample bytes vary along the line (i + s, q + 2s).
+std::string imageFile(int samples, const std::vector<Line>& lines, int records = -1) {
+  std::string s = blankWith(11644, {{180, [&] {
+                                      char b[8];
+                                      std::snprintf(b, sizeof b, "%06d", records < 0 ? int(lines.size()) : records);
+                                      return std::string(b);
+                                    }()},
+                                    {248, [&] {
+                                      char b[12];
+                                      std::snprintf(b, sizeof b, "%08d", samples);
+                                      return std::string(b);
+                                    }()}});
+  for (const Line& l : lines) {
+    std::string r(412 + 2 * std::size_t(samples), '\0');
+    be32(r, 12, l.number);
+    r[214] = static_cast<char>(l.code >> 8);
+    r[215] = static_cast<char>(l.code & 0xff);
+    for (int k = 0; k < samples; ++k) {
+      r[412 + 2 * k] = static_cast<char>(l.i + k);
+      r[413 + 2 * k] = static_cast<char>(l.q + 2 * k);
+    }
+    s += r;
+  }
+  return s;
+}
+
+// Leader with the fields of the extractor; ERS-2, biases absent unless
+// given, five state vectors 10 s apart.
+std::string leader(const char* biasI = "-9999999.9999999", const char* biasQ = "-9999999.9999999") {
+  std::string s = blankWith(2992 + 5 * 132 + 100,
+                            {{740, "ORBIT=12345-FRAME=2925"},
+                             {1116, "ERS2            "},
+                             {1148, "VV"},
+                             {1164, "   12345"},
+                             {1212, "   5.300"},
+                             {1366, "   2.0889400e+11"},
+                             {1430, "      18.9624680"},
+                             {1462, "      37.1200000"},
+                             {1538, biasI},
+                             {1554, biasQ},
+                             {1654, "    1679.9020000"},
+                             {1766, "SIM-PAF"},
+                             {2534, "06-MAR-2005 10:00:00.500"},
+                             {2582, "06-MAR-2005 10:00:16.500"},
+                             {2746, "0005"},
+                             {2750, "2005"},
+                             {2754, "0003"},
+                             {2758, "  06"},
+                             {2766, " 3.599950000000000E+04"},
+                             {2788, " 1.000000000000000E+01"}});
+  for (int k = 0; k < 5; ++k) {
+    const double v[6] = {1.0e6 + 7000.0 * 10 * k, -2.0e6 - 1000.0 * k, 6.5e6 - 2500.0 * 10 * k,
+                         7000.0, -100.0, -2500.0};
+    for (int j = 0; j < 6; ++j) {
+      char b[32];
+      std::snprintf(b, sizeof b, "%22.15E", v[j]);
+      s.replace(2992 + 132 * std::size_t(k) + 22 * std::size_t(j), 22, b);
+    }
+  }
+  return s;
+}
+
+struct Row {
+  float swst;
+  std::vector<float> iq;
+};
+
+std::vector<Row> readRaster(const std::string& path, int samples) {
+  std::ifstream in(path, std::ios::binary);
+  std::vector<Row> rows;
+  std::vector<char> buf(4 + 8 * std::size_t(samples));
+  while (in.read(buf.data(), std::streamsize(buf.size()))) {
+    Row r;
+    std::memcpy(&r.swst, buf.data(), 4);
+    r.iq.resize(2 * std::size_t(samples));
+    std::memcpy(r.iq.data(), buf.data() + 4, 8 * std::size_t(samples));
+    rows.push_back(std::move(r));
+  }
+  return rows;
+}
+
+float swstOf(int code) { return static_cast<float>(code * 2.10943e-07 + 0.005357529 - 6.627e-06); }
+
+}  // namespace
+
+TEST(ERSExtractorTest, ElementTableAndParameterDocument) {
+  TempFolder dir;
+  ATERSExtractor a;
+  ASSERT_EQ(a.getNumberOfElements(), 10);
+  const char* names[] = {"Memory", "ReportFilename", "ReportLevel", "Incore", "Verbose",
+                         "ImgFilename", "LeaFilename", "OrbitFilename", "OutputFile", "ChirpFile"};
+  for (int k = 0; k < 10; ++k) EXPECT_EQ(a.getElement(k).name, names[k]);
+  EXPECT_EQ(a.ReportFilename, "ATERSExtractor.report");
+  EXPECT_EQ(a.Memory, 256);
+  EXPECT_EQ(a.getSwstVector(), nullptr);
+  a.ImgFilename = "/data/DAT_01.001";
+  a.LeaFilename = "/data/LEA_01.001";
+  a.OutputFile = "/work/out.extracted";
+  a.Memory = 512;
+  ASSERT_EQ(a.writepar(dir / "par.xml", 1), 0);
+  ATERSExtractor b;
+  ASSERT_EQ(b.readpar(dir / "par.xml", 1), 0);
+  EXPECT_EQ(b.ImgFilename, a.ImgFilename);
+  EXPECT_EQ(b.LeaFilename, a.LeaFilename);
+  EXPECT_EQ(b.OutputFile, a.OutputFile);
+  EXPECT_EQ(b.Memory, 512);
+  EXPECT_EQ(b.ChirpFile, "");
+}
+
+TEST(ERSExtractorTest, RealLeaderFields) {
+  if (!ingest_test::realDataPresent()) GTEST_SKIP() << "real data folder absent";
+  ATERSExtractor x;
+  x.LeaFilename = std::string(ingest_test::realData()) + "/ers1_2000_orbit44928/lea_01.001";
+  ASSERT_EQ(x.readLeader(), 0);
+  const GeneralRAWData& r = x.rawData;
+  EXPECT_EQ(r.dataSetInfo.Description, "ERS1");
+  EXPECT_EQ(r.dataSetInfo.SceneID, "ORBIT=44928-FRAM");
+  EXPECT_EQ(r.dataSetInfo.Polarization, "V/V");
+  EXPECT_EQ(r.dataSetInfo.OrbitNumber, "44928");
+  EXPECT_EQ(r.dataSetInfo.AcquisitionStation, "I-PAF");
+  EXPECT_DOUBLE_EQ(r.sampling.fc_hz, 5.3e9);
+  EXPECT_DOUBLE_EQ(r.sampling.lambda_m, 299792458.0 / 5.3e9);
+  EXPECT_DOUBLE_EQ(r.sampling.frg_hz, 18.962468e6);
+  EXPECT_DOUBLE_EQ(r.sampling.Trg_s, 1.0 / 18.962468e6);
+  EXPECT_DOUBLE_EQ(r.roi.FastTimeDelta, 1.0 / 18.962468e6);
+  EXPECT_DOUBLE_EQ(r.pulse.PulseSamplingRate, 18.962468e6);
+  EXPECT_DOUBLE_EQ(r.pulse.PulseLength, 37.12e-6);
+  EXPECT_DOUBLE_EQ(r.sampling.Brg_hz, 2.0 * 37.12e-6 * 2.08894e11);
+  EXPECT_DOUBLE_EQ(r.pulse.Bandwidth, r.sampling.Brg_hz);
+  EXPECT_DOUBLE_EQ(r.sampling.prf_hz, 1679.902);
+  EXPECT_DOUBLE_EQ(r.sampling.brf_hz, 1679.902);
+  EXPECT_DOUBLE_EQ(r.sampling.pri_s, 1.0 / 1679.902);
+  EXPECT_DOUBLE_EQ(r.roi.SlowTimeDelta, 1.0 / 1679.902);
+  const double first = ascii2sec85("17-FEB-2000 09:57:26.417");
+  EXPECT_DOUBLE_EQ(r.roi.SlowStartTime, first);
+  EXPECT_DOUBLE_EQ(r.swath.Acquisition_Start_Time, first);
+  EXPECT_DOUBLE_EQ(r.roi.SlowTimeLength, ascii2sec85("17-FEB-2000 09:57:43.084") - first);
+  GeneralSAROrbit& orbit = x.rawData.orbit();
+  ASSERT_EQ(orbit.nSV, 5);
+  EXPECT_DOUBLE_EQ(orbit.t0, ascii2sec85("17-FEB-2000 09:57:26.417000"));
+  EXPECT_DOUBLE_EQ(orbit.dt, 4.167);
+  EXPECT_DOUBLE_EQ(orbit.pos[0], 5156836.22);
+  EXPECT_DOUBLE_EQ(orbit.pos[1], 1457278.56);
+  EXPECT_DOUBLE_EQ(orbit.pos[2], 4746203.2);
+  EXPECT_DOUBLE_EQ(orbit.vel[0], 5183.1375);
+  EXPECT_DOUBLE_EQ(orbit.vel[1], -482.13441);
+  EXPECT_DOUBLE_EQ(orbit.vel[2], -5469.21494);
+
+  ATERSExtractor y;
+  y.LeaFilename = std::string(ingest_test::realData()) + "/ers2_2010_orbit77106/LEA_01.001";
+  ASSERT_EQ(y.readLeader(), 0);
+  EXPECT_EQ(y.rawData.dataSetInfo.Description, "ERS2");
+  EXPECT_EQ(y.rawData.dataSetInfo.AcquisitionStation, "D-PAF");
+  EXPECT_DOUBLE_EQ(y.rawData.sampling.prf_hz, 1679.9023438);
+  EXPECT_DOUBLE_EQ(y.rawData.orbit().t0, ascii2sec85("18-JAN-2010 17:49:28.684000"));
+  EXPECT_DOUBLE_EQ(y.rawData.orbit().pos[0], -1425570.155210402);
+}
+
+TEST(ERSExtractorTest, RealLeaderBiasesAndTruncatedImageHead) {
+  if (!ingest_test::realDataPresent()) GTEST_SKIP() << "real data folder absent";
+  TempFolder dir;
+  // The real leader's biases (-0.258, -0.095) on a small image file.
+  writeBytes(dir / "DAT_01.001", imageFile(4, {{1, 944, 16, 15}, {2, 944, 20, 10}}));
+  ATERSExtractor x;
+  x.LeaFilename = std::string(ingest_test::realData()) + "/ers1_2000_orbit44928/lea_01.001";
+  x.ImgFilename = dir / "DAT_01.001";
+  x.OutputFile = dir / "out.extracted";
+  ASSERT_EQ(x.readLeader(), 0);
+  ASSERT_EQ(x.readImage(), 0);
+  const auto rows = readRaster(dir / "out.extracted", 4);
+  ASSERT_EQ(rows.size(), 2u);
+  EXPECT_EQ(rows[0].iq[0], 16.0f - 15.5f - static_cast<float>(-0.258));
+  EXPECT_EQ(rows[0].iq[1], 15.0f - 15.5f - static_cast<float>(-0.095));
+  EXPECT_EQ(rows[1].iq[6], 23.0f - 15.5f - static_cast<float>(-0.258));
+  EXPECT_EQ(rows[1].iq[7], 16.0f - 15.5f - static_cast<float>(-0.095));
+
+  // The genuine image file ends inside record 1: a read failure, no vectors.
+  ATERSExtractor y;
+  y.LeaFilename = x.LeaFilename;
+  y.ImgFilename = std::string(ingest_test::realData()) + "/ers1_2000_orbit44928/dat_01.001";
+  y.OutputFile = dir / "real.extracted";
+  ASSERT_EQ(y.readLeader(), 0);
+  EXPECT_EQ(y.readImage(), 4);
+  EXPECT_EQ(y.getSwstVector(), nullptr);
+  EXPECT_EQ(y.getMissingVector(), nullptr);
+  EXPECT_EQ(y.getCounterVector(), nullptr);
+  // Its descriptor was read: 28000 records of 5616 samples.
+  EXPECT_EQ(y.rawData.roi.Lines, 28000);
+  EXPECT_EQ(y.rawData.roi.Samples, 5616);
+}
+
+TEST(ERSExtractorTest, ImagePassFlagsRepairsAndCounts) {
+  TempFolder dir;
+  writeBytes(dir / "LEA_01.001", leader());
+  // Record 3 is missing from the file; record 2's window code is corrupt.
+  writeBytes(dir / "DAT_01.001", imageFile(3, {{1, 900, 0, 31},
+                                               {2, 1150, 1, 30},
+                                               {4, 905, 2, 29},
+                                               {5, 1000, 3, 28},
+                                               {6, 1000, 4, 27},
+                                               {7, 700, 5, 26}}));
+  ATERSExtractor x;
+  x.LeaFilename = dir / "LEA_01.001";
+  x.ImgFilename = dir / "DAT_01.001";
+  x.OutputFile = dir / "out.extracted";
+  ASSERT_EQ(x.readLeader(), 0);
+  const double start = x.rawData.roi.SlowStartTime;
+  ASSERT_EQ(x.readImage(), 0);
+  ASSERT_EQ(x.getVectorLength(), 6);
+  const std::vector<int> swst(x.getSwstVector(), x.getSwstVector() + 6);
+  const std::vector<int> missing(x.getMissingVector(), x.getMissingVector() + 6);
+  const std::vector<int> counter(x.getCounterVector(), x.getCounterVector() + 6);
+  EXPECT_EQ(swst, (std::vector<int>{900, 900, 905, 1000, 1000, 1000}));
+  EXPECT_EQ(missing, (std::vector<int>{0, 0, 1, 1, 1, 1}));
+  EXPECT_EQ(counter, (std::vector<int>{1, 2, 4, 5, 6, 7}));
+  EXPECT_EQ(x.getMissingLines(), 4);
+
+  const auto rows = readRaster(dir / "out.extracted", 3);
+  ASSERT_EQ(rows.size(), 6u);
+  for (int k = 0; k < 6; ++k) EXPECT_EQ(rows[std::size_t(k)].swst, swstOf(swst[std::size_t(k)])) << k;
+  // Absent biases are 0: samples are the bytes less 15.5.
+  EXPECT_EQ(rows[2].iq, (std::vector<float>{-13.5f, 13.5f, -12.5f, 15.5f, -11.5f, 17.5f}));
+
+  const GeneralRAWData& r = x.rawData;
+  EXPECT_EQ(r.roi.Lines, 6);
+  EXPECT_EQ(r.roi.Samples, 3);
+  EXPECT_DOUBLE_EQ(r.roi.SlowStartTime, start);
+  EXPECT_DOUBLE_EQ(r.roi.FastStartTime, double(swstOf(900)));
+  EXPECT_DOUBLE_EQ(r.dataSetInfo.SWST_MIN, double(swstOf(900)));
+  EXPECT_DOUBLE_EQ(r.dataSetInfo.SWST_MAX, double(swstOf(1000)));
+  EXPECT_DOUBLE_EQ(r.roi.FastTimeLength, 3.0 / 18.962468e6);
+  EXPECT_DOUBLE_EQ(r.swath.Rgate_bias, -6.627e-06);
+  EXPECT_EQ(r.dataSetInfo.MissingLines, 4);
+  EXPECT_TRUE(r.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA));
+  EXPECT_TRUE(r.dataSetInfo.IsAcqMode(DataSetInfo_Obj::AM_STRIPMAP));
+  EXPECT_TRUE(r.dataSetInfo.IsUnitType(DataSetInfo_Obj::UT_VOLT));
+  EXPECT_TRUE(r.dataSetInfo.IsProjection(DataSetInfo_Obj::PR_SLANT_RANGE));
+  EXPECT_TRUE(r.dataSetInfo.IsSensorType(DataSetInfo_Obj::ST_ERS2));
+  EXPECT_EQ(r.dataSetInfo.ProcessingDate.size(), 24u);
+  std::string sense;
+  sec852ascii(start, sense);
+  EXPECT_EQ(r.dataSetInfo.SenseDate, sense.substr(0, 27));
+  EXPECT_EQ(r.dataFile.RowPrefix, 4);
+  EXPECT_EQ(r.dataFile.CellType, 0);
+  EXPECT_EQ(r.dataFile.NrOfPixelsPerLine, 3);
+  EXPECT_EQ(r.dataFile.NrOfLinesPerImage, 6);
+}
+
+TEST(ERSExtractorTest, PartOfTheSceneAndFirstRecordOffset) {
+  TempFolder dir;
+  writeBytes(dir / "LEA_01.001", leader("       1.0000000", "      -1.0000000"));
+  std::vector<Line> lines;
+  for (int k = 0; k < 10; ++k) lines.push_back({std::uint32_t(k + 2), 1000 + k, std::uint8_t(k), 0});
+  writeBytes(dir / "DAT_01.001", imageFile(2, lines));
+  auto extract = [&](int skip, int extract, ATERSExtractor& x) {
+    x.LeaFilename = dir / "LEA_01.001";
+    x.ImgFilename = dir / "DAT_01.001";
+    x.OutputFile = dir / "out.extracted";
+    x.skipPercent = skip;
+    x.extractPercent = extract;
+    EXPECT_EQ(x.readLeader(), 0);
+    const double t0 = x.rawData.roi.SlowStartTime;
+    EXPECT_EQ(x.readImage(), 0);
+    return x.rawData.roi.SlowStartTime - t0;
+  };
+  {
+    ATERSExtractor x;
+    const double shift = extract(30, 50, x);
+    EXPECT_NEAR(shift, 3.0 / 1679.902, 1e-6);  // times near 6e8 s keep about 1e-7 s
+    ASSERT_EQ(x.getVectorLength(), 5);
+    EXPECT_EQ(x.getCounterVector()[0], 5);
+    EXPECT_EQ(x.getSwstVector()[4], 1007);
+    // A first record numbered 2 flags every line, skipped ones counted too.
+    EXPECT_EQ(x.getMissingLines(), 8);
+    for (int k = 0; k < 5; ++k) EXPECT_EQ(x.getMissingVector()[k], 1);
+    const auto rows = readRaster(dir / "out.extracted", 2);
+    ASSERT_EQ(rows.size(), 5u);
+    EXPECT_EQ(rows[0].iq[0], 3.0f - 15.5f - 1.0f);
+    EXPECT_EQ(rows[0].iq[1], 0.0f - 15.5f + 1.0f);
+    EXPECT_DOUBLE_EQ(x.rawData.dataSetInfo.SWST_MIN, double(swstOf(1003)));
+  }
+  {
+    // Together beyond 100 percent: the rest of the scene after the skip.
+    ATERSExtractor x;
+    extract(10, 95, x);
+    EXPECT_EQ(x.getVectorLength(), 9);
+    EXPECT_EQ(x.rawData.roi.Lines, 9);
+  }
+}
+
+TEST(ERSExtractorTest, FailuresEndWithTheirStatus) {
+  TempFolder dir;
+  const std::string good = leader();
+  writeBytes(dir / "DAT_01.001", imageFile(2, {{1, 900, 0, 0}, {2, 900, 0, 0}}));
+  auto leaderStatus = [&](const std::string& bytes) {
+    writeBytes(dir / "LEA", bytes);
+    ATERSExtractor x;
+    x.LeaFilename = dir / "LEA";
+    return x.readLeader();
+  };
+  EXPECT_EQ(leaderStatus(good), 0);
+  EXPECT_EQ(leaderStatus(good.substr(0, 2000)), 4);
+  EXPECT_EQ(leaderStatus(good.substr(0, 2992 + 4 * 132)), 4);  // the last vector is cut
+  std::string bad = good;
+  bad.replace(1654, 16, "            0.00");
+  EXPECT_EQ(leaderStatus(bad), 10);
+  bad = good;
+  bad.replace(1430, 16, "                ");
+  EXPECT_EQ(leaderStatus(bad), 10);
+  bad = good;
+  bad.replace(2534, 24, "NOT A DATE AT ALL       ");
+  EXPECT_EQ(leaderStatus(bad), 10);
+  bad = good;
+  bad.replace(2754, 4, "0013");
+  EXPECT_EQ(leaderStatus(bad), 10);
+  ATERSExtractor none;
+  none.LeaFilename = dir / "absent";
+  EXPECT_EQ(none.readLeader(), 9);
+  EXPECT_EQ(none.run(), 9);
+
+  ATERSExtractor x;
+  writeBytes(dir / "LEA", good);
+  x.LeaFilename = dir / "LEA";
+  x.OutputFile = dir / "out";
+  ASSERT_EQ(x.readLeader(), 0);
+  x.ImgFilename = dir / "absent";
+  EXPECT_EQ(x.readImage(), 9);
+  writeBytes(dir / "short", std::string(5000, ' '));
+  x.ImgFilename = dir / "short";
+  EXPECT_EQ(x.readImage(), 4);
+  writeBytes(dir / "empty", std::string(11644, ' '));
+  x.ImgFilename = dir / "empty";
+  EXPECT_EQ(x.readImage(), 10);
+  // Fewer records than the descriptor says.
+  writeBytes(dir / "cut", imageFile(2, {{1, 900, 0, 0}}, 3));
+  x.ImgFilename = dir / "cut";
+  EXPECT_EQ(x.readImage(), 4);
+  EXPECT_EQ(x.getSwstVector(), nullptr);
+  // An orbit file that does not exist stops the run before the image pass.
+  x.ImgFilename = dir / "DAT_01.001";
+  x.OrbitFilename = dir / "no_orbit";
+  x.OutputFile = dir / "run_out";
+  EXPECT_NE(x.run(), 0);
+  EXPECT_FALSE(std::filesystem::exists(dir / "run_out"));
+}
+
+TEST(ERSExtractorTest, ChirpFromThePulse) {
+  TempFolder dir;
+  writeBytes(dir / "LEA_01.001", leader());
+  writeBytes(dir / "DAT_01.001", imageFile(2, {{1, 900, 0, 0}}));
+  ATERSExtractor x;
+  x.LeaFilename = dir / "LEA_01.001";
+  x.ImgFilename = dir / "DAT_01.001";
+  x.OutputFile = dir / "out.extracted";
+  x.ChirpFile = dir / "out.chirp";
+  ASSERT_EQ(x.readLeader(), 0);
+  ASSERT_EQ(x.readImage(), 0);
+  ASSERT_EQ(x.rawData.writehdr(), 0);
+  ASSERT_EQ(x.ExtractChirp(), 0);
+  // round(18.962468 MHz x 37.12 us) = 704 complex samples.
+  EXPECT_EQ(std::filesystem::file_size(dir / "out.chirp"), 704u * 8u);
+  EXPECT_TRUE(std::filesystem::exists(dir / "out.chirp.hdr"));
+  GeneralRAWData back;
+  ASSERT_EQ(back.readhdr(dir / "out.extracted.hdr"), 0);
+  EXPECT_DOUBLE_EQ(back.pulse.PulseLength, 37.12e-6);
+  EXPECT_EQ(back.roi.Lines, 1);
+  EXPECT_EQ(back.dataFile.RowPrefix, 4);
+}
