@@ -1,16 +1,415 @@
 #include "core/stolt_interpolation.h"
 
-#include "base/status.h"
-#include "diag/report.h"
+#include <algorithm>
+#include <cmath>
+#include <complex>
+#include <cstddef>
+#include <memory>
+#include <new>
+#include <numbers>
+#include <string>
+#include <vector>
 
-int ChirpInterpWK(AzimuthBlockPar&, int, int, int, const double*, const double*, const double*,
-                  double, double, double) {
-  ORV_REPORT("ChirpInterpWK: not available in this build", REPORT_ERROR);
-  return STATUS_BAD_CONDITION;
+#ifdef _OPENMP
+#include <omp.h>
+#endif
+
+#include "base/status.h"
+#include "core/fft.h"
+#include "diag/report.h"
+#include "numerics/filter_design.h"
+
+namespace {
+
+constexpr double kC = 299792458.0;
+constexpr double kPi = std::numbers::pi;
+constexpr double kTwoPi = 2.0 * std::numbers::pi;
+constexpr double kFourPi = 4.0 * std::numbers::pi;
+// Fractional positions of the least-squares filter table: (r - 50) / 100.
+constexpr int kFractions = 101;
+
+int threadCount() {
+#ifdef _OPENMP
+  return omp_get_max_threads();
+#else
+  return 1;
+#endif
 }
 
-int LSInterpWK(AzimuthBlockPar&, int, int, int, const double*, const double*, const double*,
-               double, double, double) {
-  ORV_REPORT("LSInterpWK: not available in this build", REPORT_ERROR);
-  return STATUS_BAD_CONDITION;
+int threadIndex() {
+#ifdef _OPENMP
+  return omp_get_thread_num();
+#else
+  return 0;
+#endif
+}
+
+// x * exp(j phase), the rotation narrowed to float.
+inline fcomplex rotate(fcomplex x, double phase) {
+  const float c = static_cast<float>(std::cos(phase));
+  const float s = static_cast<float>(std::sin(phase));
+  return fcomplex(x.real() * c - x.imag() * s, x.real() * s + x.imag() * c);
+}
+
+// Plain complex product (no special cases for infinities).
+inline fcomplex mul(fcomplex a, fcomplex b) {
+  return fcomplex(a.real() * b.real() - a.imag() * b.imag(),
+                  a.real() * b.imag() + a.imag() * b.real());
+}
+
+inline fcomplex scaled(fcomplex x, float f) { return fcomplex(x.real() * f, x.imag() * f); }
+
+// What both kernels derive from the block record before the row loop.
+struct StoltGrid {
+  double sq = 0.0;   // squint of the centroid
+  double dr = 0.0;   // input slant spacing, m
+  double Bk = 0.0;   // range wavenumber band
+  double k0 = 0.0, kxc = 0.0, kzc = 0.0;
+  double dkz = 0.0, kzs = 0.0, kze = 0.0;
+  std::vector<int> idx;     // transform position of output wavenumber q
+  std::vector<double> kz;   // output wavenumber grid, M values
+  fcomplex* result = nullptr;
+  int pitch = 0;            // row pitch of the result
+  int dir = FFT_FORWARD;    // transform direction code of the forward passes
+  double inBand = 0.0;      // half-width of the band of the gain sums
+
+  StoltGrid(const AzimuthBlockPar& par, int M, int n, double spacing) {
+    sq = std::asin(kC / par.fc * par.dc / 2.0 / par.Veq);
+    dr = kC / (2.0 * par.frg);
+    Bk = kFourPi * par.frg / kC;
+    ComputeWaveNumbers(par, k0, kxc, kzc);
+    idx.resize(M);
+    for (int i = 0; i < M; ++i) idx[i] = (M / 2 + i) % M;
+    dkz = (kTwoPi / spacing) / M;
+    kzs = std::sqrt(k0 * k0 - kxc * kxc) - std::floor(M / 2) * dkz;
+    kze = kzs + (M - 1) * dkz;
+    kz.resize(M);
+    for (int q = 0; q < M; ++q) kz[q] = kzs + q * dkz;
+    if (par.scale == 1.0) {
+      result = par.data;
+      pitch = par.samples;
+    } else {
+      result = par.out;
+      pitch = n;
+    }
+    dir = par.conj ? FFT_BACKWARD_NORMALISED : FFT_FORWARD;
+    inBand = (par.bw / par.frg) * Bk / 2.0;
+  }
+
+  // First and last output wavenumber index inside [lo, hi] (ihi < ilo: none).
+  void usable(double lo, double hi, int& ilo, int& ihi) const {
+    lo = std::max(lo, kzs);
+    hi = std::min(hi, kze);
+    ilo = static_cast<int>(std::ceil((lo - kzs) / dkz));
+    ihi = static_cast<int>(std::floor((hi - kzs) / dkz)) - 1;
+    ilo = std::max(ilo, 0);
+    ihi = std::min(ihi, static_cast<int>(kz.size()) - 1);
+  }
+
+  // n samples of the inverse-transformed line into row j of the result.
+  void store(int j, const fcomplex* line, int n) const {
+    fcomplex* row = result + static_cast<std::size_t>(j) * pitch;
+    std::copy(line, line + n, row);
+    std::fill(row + n, row + pitch, fcomplex(0.0f, 0.0f));
+  }
+};
+
+bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const char* who) {
+  const bool ok = par.lines >= 1 && par.samples >= 1 && padded >= 1 && M >= 1 && n >= 1 &&
+                  n <= M && (par.scale == 1.0 ? par.data && n <= par.samples
+                                              : par.data && par.out);
+  if (!ok) {
+    orv_add_report(std::string(who) + ": bad block or output grid sizes", REPORT_ERROR, __LINE__,
+                   who, __FILE__);
+  }
+  return ok;
+}
+
+// Inverse azimuth transform of the result, gain normalisation and the
+// optional removal of the residual k0 offset.
+int finishBlock(const AzimuthBlockPar& par, const StoltGrid& grid, int n, double g) {
+  const int nl = par.lines;
+  if (fft_c(grid.pitch, n, nl, nl, FFT_NONE, FFT_BACKWARD_NORMALISED, grid.result,
+            grid.result) != 0) {
+    ORV_REPORT("Cannot make the inverse azimuth transform of the block", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  const float gf = static_cast<float>(g);
+#pragma omp parallel for schedule(static)
+  for (int j = 0; j < nl; ++j) {
+    fcomplex* row = grid.result + static_cast<std::size_t>(j) * grid.pitch;
+    for (int i = 0; i < n; ++i) row[i] = fcomplex(row[i].real() / gf, row[i].imag() / gf);
+    if (par.final == 1) RngShift(row, n, grid.dr, grid.kzc - grid.k0, row, n, 0.0, 1.0);
+  }
+  return STATUS_OK;
+}
+
+double gainOf(bool active, const std::vector<double>& rowN, const std::vector<double>& rowD) {
+  if (!active) return 1.0;
+  double N = 0.0, D = 0.0;
+  for (std::size_t j = 0; j < rowN.size(); ++j) {
+    N += rowN[j];
+    D += rowD[j];
+  }
+  return D > 0.0 ? std::sqrt(N / D) : 1.0;
+}
+
+}  // namespace
+
+int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
+                  const double* kx2, const double* dk, double spacing, double az, double rg) {
+  if (!checkSizes(par, padded, M, n, __func__)) return STATUS_BAD_CONDITION;
+  const int nl = par.lines, ns = par.samples;
+  const int sign = par.conj ? -1 : 1;
+
+  std::vector<double> rowN, rowD;
+  std::vector<fcomplex> work;
+  std::unique_ptr<StoltGrid> gridOwner;
+  try {
+    gridOwner = std::make_unique<StoltGrid>(par, M, n, spacing);
+    rowN.assign(nl, 0.0);
+    rowD.assign(nl, 0.0);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Out of memory in the chirp-z Stolt kernel", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  const StoltGrid& grid = *gridOwner;
+  const WKWeighting wt(par);
+  const bool A = wt.active;
+  const float S = par.conj ? static_cast<float>(nl) : 1.0f;
+
+  // Input grid of the zoomed spectra, relative to k0.
+  const int Nin = static_cast<int>(std::lround(static_cast<double>(padded)));
+  const double dki = grid.Bk / padded;
+  const double kis = -std::floor(Nin / 2) * dki;
+  const double kie = kis + (Nin - 1) * dki;
+  const double Rp = par.Req / std::cos(grid.sq);
+
+  // Per-thread buffers: the zoomed spectrum (one zero guard sample) and the
+  // output line.
+  const int nt = threadCount();
+  const std::size_t perThread = static_cast<std::size_t>(Nin + 1) + M;
+  try {
+    work.assign(perThread * nt, fcomplex(0.0f, 0.0f));
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Out of memory in the chirp-z Stolt kernel", REPORT_ERROR);
+    return STATUS_NO_MEMORY_ALT;
+  }
+
+  CZTPlan czt;
+  FFTPlan inv;
+  if (czt_makep_c(czt, ns, Nin) != 0 ||
+      fft_makep_c(inv, M, M, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0 ||
+      fft_c(ns, ns, nl, nl, FFT_NONE, grid.dir, par.data, par.data) != 0) {
+    ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
+    czt_destp_c(czt);
+    fft_destp_c(inv);
+    return STATUS_BAD_CONDITION;
+  }
+
+  const int conj = par.conj;
+  const double Req = par.Req;
+  const double kzc = grid.kzc, k0 = grid.k0, kxc = grid.kxc;
+  int failed = 0;
+#pragma omp parallel for schedule(dynamic, 8)
+  for (int j = 0; j < nl; ++j) {
+    fcomplex* G = work.data() + perThread * threadIndex();
+    fcomplex* line = G + Nin + 1;
+    const double fr = dk[j] - std::trunc(dk[j] / dki) * dki;
+    const double a = kis - fr, b = kie - fr;
+    int ilo, ihi;
+    grid.usable(std::sqrt((a + k0) * (a + k0) - kx2[j]), std::sqrt((b + k0) * (b + k0) - kx2[j]),
+                ilo, ihi);
+    std::fill(line, line + M, fcomplex(0.0f, 0.0f));
+    double N = 0.0, D = 0.0;
+    if (ihi >= ilo) {
+      const fcomplex* row = par.data + static_cast<std::size_t>(j) * ns;
+      // Zoomed spectrum of the row on k0 + a + p dki, p = 0 .. Nin - 1.
+      if (pczt_c(czt, row, G, -kTwoPi / padded * sign, a * (kTwoPi / grid.Bk) * sign, 1) != 0)
+      {
+#pragma omp atomic write
+        failed = 1;
+      }
+      G[Nin] = fcomplex(0.0f, 0.0f);
+      const double tlo = (std::sqrt(grid.kz[ilo] * grid.kz[ilo] + kx2[j]) - k0 - a) / dki;
+      const double thi = (std::sqrt(grid.kz[ihi] * grid.kz[ihi] + kx2[j]) - k0 - a) / dki;
+      const int jlo = std::max(0, static_cast<int>(std::floor(tlo)));
+      const int jhi = std::min(Nin - 1, static_cast<int>(std::floor(thi)) + 1);
+      for (int p = jlo; p <= jhi; ++p) {
+        fcomplex v = G[p];
+        if (conj) v = std::conj(v);
+        const double k = k0 + a + p * dki;
+        const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * Req - (dk[j] + k - k0) * rg;
+        v = rotate(v, phase);
+        float W = 1.0f;
+        if (A) {
+          double P;
+          W = static_cast<float>(wt.azimuthTerm(k, kx[j], P));
+          if (std::fabs(k - k0) < grid.inBand) {
+            D += P;
+            N += P * W * W;
+          }
+        }
+        G[p] = scaled(v, W * S);
+      }
+      // Two-tap interpolation with the phase slope of content at the middle
+      // of the range window (minus half a turn per input step) taken out,
+      // then the row's azimuth and range references.
+      const double theta = (kx[j] - kxc) * az + dk[j] * Rp;
+      const float ct = static_cast<float>(std::cos(theta));
+      const float st = static_cast<float>(std::sin(theta));
+      const fcomplex et(ct, st);
+      for (int q = ilo; q <= ihi; ++q) {
+        const double t = (std::sqrt(grid.kz[q] * grid.kz[q] + kx2[j]) - k0 - a) / dki;
+        const double u = std::floor(t);
+        const double f = t - u;
+        const int iu = static_cast<int>(u);
+        if (iu < 0 || iu >= Nin) continue;
+        const fcomplex w1(static_cast<float>((1.0 - f) * std::cos(-kPi * f)),
+                          static_cast<float>((1.0 - f) * std::sin(-kPi * f)));
+        const fcomplex w2(static_cast<float>(f * std::cos(kPi * (1.0 - f))),
+                          static_cast<float>(f * std::sin(kPi * (1.0 - f))));
+        const fcomplex y = mul(w1, G[iu]) + mul(w2, G[iu + 1]);
+        line[grid.idx[q]] = mul(y, et);
+      }
+      pfft_c(inv, line, line);
+    }
+    rowN[j] = N;
+    rowD[j] = D;
+    grid.store(j, line, n);
+  }
+  czt_destp_c(czt);
+  fft_destp_c(inv);
+  if (failed) {
+    ORV_REPORT_CALLED_ERROR();
+    return STATUS_BAD_CONDITION;
+  }
+  const int st = finishBlock(par, grid, n, gainOf(A, rowN, rowD));
+  if (st != STATUS_OK) ORV_REPORT_CALLED_ERROR();
+  return st;
+}
+
+int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
+               const double* kx2, const double* dk, double spacing, double az, double rg) {
+  (void)dk;
+  if (!checkSizes(par, padded, M, n, __func__)) return STATUS_BAD_CONDITION;
+  const int H = par.interp;
+  if (H < 1 || padded < par.samples) {
+    ORV_REPORT("LSInterpWK: bad filter half-length or padded length", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  const int nl = par.lines, ns = par.samples;
+  const int taps = 2 * H + 1;
+
+  std::unique_ptr<StoltGrid> gridOwner;
+  std::vector<fcomplex> table, work;
+  std::vector<double> kin, rwin, rowN, rowD;
+  const int nt = threadCount();
+  const std::size_t perThread = static_cast<std::size_t>(padded + 2 * H) + M;
+  try {
+    gridOwner = std::make_unique<StoltGrid>(par, M, n, spacing);
+    table.resize(static_cast<std::size_t>(kFractions) * taps);
+    kin.resize(padded);
+    rowN.assign(nl, 0.0);
+    rowD.assign(nl, 0.0);
+    work.assign(perThread * nt, fcomplex(0.0f, 0.0f));
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Out of memory in the least-squares Stolt kernel", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  const StoltGrid& grid = *gridOwner;
+  int st = MakeGLS(table.data(), taps, kFractions);
+  if (st != STATUS_OK) {
+    ORV_REPORT_CALLED_ERROR();
+    return st;
+  }
+  const WKWeighting wt(par);
+  const bool A = wt.active;
+  const float S = par.conj ? static_cast<float>(static_cast<double>(nl) * padded) : 1.0f;
+
+  // Input grid of the padded spectra, absolute wavenumbers.
+  const int po = par.pad == 0.0 ? 0 : (padded - ns) / 2;
+  const double dki = grid.Bk / padded;
+  const double kis = grid.k0 - std::floor(padded / 2) * dki;
+  const double kie = kis + (padded - 1) * dki;
+  for (int i = 0; i < padded; ++i) kin[i] = kis + i * dki;
+  if (par.rgw != 0.0) {
+    rwin.resize(padded);
+    for (int i = 0; i < padded; ++i) rwin[i] = wt.rangeTerm(kin[i]);
+  }
+  const double R2 = par.Req - po * grid.dr * std::cos(grid.sq);
+  const double R3 = po * grid.dr * std::cos(grid.sq);
+
+  FFTPlan rowFwd, inv;
+  if (fft_makep_c(rowFwd, padded, padded, 1, 1, grid.dir, FFT_NONE, 1) != 0 ||
+      fft_makep_c(inv, M, M, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0 ||
+      fft_c(ns, ns, nl, nl, FFT_NONE, grid.dir, par.data, par.data) != 0) {
+    ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
+    fft_destp_c(rowFwd);
+    fft_destp_c(inv);
+    return STATUS_BAD_CONDITION;
+  }
+
+  const int conj = par.conj;
+  const double kzc = grid.kzc, k0 = grid.k0, kxc = grid.kxc;
+#pragma omp parallel for schedule(dynamic, 8)
+  for (int j = 0; j < nl; ++j) {
+    fcomplex* buf = work.data() + perThread * threadIndex();
+    fcomplex* line = buf + padded + 2 * H;
+    int ilo, ihi;
+    grid.usable(std::sqrt(kis * kis - kx2[j]), std::sqrt(kie * kie - kx2[j]), ilo, ihi);
+    std::fill(buf, buf + padded + 2 * H, fcomplex(0.0f, 0.0f));
+    std::fill(line, line + M, fcomplex(0.0f, 0.0f));
+    double N = 0.0, D = 0.0;
+    if (ihi >= ilo) {
+      const fcomplex* row = par.data + static_cast<std::size_t>(j) * ns;
+      fcomplex* spec = buf + H;
+      // The row starts the padded window; R2 moves its content to the middle
+      // of the window for the interpolation and R3 moves it back.
+      std::copy(row, row + ns, spec);
+      pfft_c(rowFwd, spec, spec);
+      fftshift(spec, padded);
+      const double azPhase = (kx[j] - kxc) * az;
+      for (int i = 0; i < padded; ++i) {
+        fcomplex v = spec[i];
+        if (conj) v = std::conj(v);
+        const double k = kin[i];
+        const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * R2 - (k - k0) * rg + azPhase;
+        v = rotate(v, phase);
+        float W = 1.0f;
+        if (A) {
+          double P;
+          const double aw = wt.azimuthTerm(k, kx[j], P);
+          const double rw = rwin.empty() ? 1.0 : rwin[i];
+          W = static_cast<float>(aw * rw);
+          if (std::fabs(k - k0) < grid.inBand) {
+            D += P;
+            N += P * W * W;
+          }
+        }
+        spec[i] = scaled(v, W * S);
+      }
+      for (int q = ilo; q <= ihi; ++q) {
+        const double x = std::fabs(std::sqrt(grid.kz[q] * grid.kz[q] + kx2[j]) - kis) / dki;
+        const double u = std::round(x);
+        const int iu = static_cast<int>(u);
+        if (iu < 0 || iu >= padded) continue;
+        const int r = static_cast<int>(std::round((x - u) / 0.01)) + 50;
+        const fcomplex* h = table.data() + static_cast<std::size_t>(r) * taps;
+        const fcomplex* s = buf + iu;
+        fcomplex y(0.0f, 0.0f);
+        for (int m = 0; m < taps; ++m) y += mul(h[m], s[m]);
+        line[grid.idx[q]] = rotate(y, (grid.kz[q] - kzc) * R3);
+      }
+      pfft_c(inv, line, line);
+    }
+    rowN[j] = N;
+    rowD[j] = D;
+    grid.store(j, line, n);
+  }
+  fft_destp_c(rowFwd);
+  fft_destp_c(inv);
+  st = finishBlock(par, grid, n, gainOf(A, rowN, rowD));
+  if (st != STATUS_OK) ORV_REPORT_CALLED_ERROR();
+  return st;
 }

@@ -1,0 +1,167 @@
+#include "core/stolt_interpolation.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <complex>
+#include <numbers>
+#include <vector>
+
+namespace {
+
+constexpr double kC = 299792458.0;
+constexpr double kPi = std::numbers::pi;
+
+// Periodic band-limited signal of period n samples with unit point responses
+// at the given fractional positions and a flat spectrum on |f| < band / 2
+// (cycles per sample), sampled at t = r * step for r = 0 .. count - 1.
+std::vector<fcomplex> bandLimited(int n, double band, const std::vector<double>& pos, int count,
+                                  double step = 1.0) {
+  std::vector<fcomplex> row(count);
+  const int half = static_cast<int>(std::floor(band * n / 2.0));
+  for (int r = 0; r < count; ++r) {
+    std::complex<double> s = 0.0;
+    for (double p : pos)
+      for (int m = -half; m <= half; ++m) s += std::polar(1.0 / n, 2 * kPi * m * (r * step - p) / n);
+    row[r] = fcomplex(static_cast<float>(s.real()), static_cast<float>(s.imag()));
+  }
+  return row;
+}
+
+// Error energy of `got` against `want` relative to the energy of `want`, dB.
+double errorDb(const fcomplex* got, const std::vector<fcomplex>& want, float gain = 1.0f) {
+  double e = 0.0, w = 0.0;
+  for (std::size_t i = 0; i < want.size(); ++i) {
+    e += std::norm(got[i] - gain * want[i]);
+    w += std::norm(want[i]);
+  }
+  return 10.0 * std::log10(e / w);
+}
+
+// One azimuth line at zero Doppler: the Stolt mapping is the identity, so
+// the kernels reduce to resampling the row spectrum onto the output grid.
+AzimuthBlockPar zeroDopplerLine(int samples) {
+  AzimuthBlockPar par;
+  par.lines = 1;
+  par.samples = samples;
+  par.fc = 5.3e9;
+  par.frg = 18.96e6;
+  par.prf = 1680.0;
+  par.Veq = 7100.0;
+  par.Req = 850e3;
+  par.AntennaLength = 10.0;
+  par.bw = 0.8 * par.frg;
+  return par;
+}
+
+TEST(StoltInterpolation, LeastSquaresTableResamplesTheRowSpectrum) {
+  // 200 samples padded to 288: the 200 output wavenumbers fall at fractions
+  // of the input step all over the table. The row must come back in place
+  // (the pad offset moves the content to the middle of the window for the
+  // interpolation and back), more exactly with 15 taps than with 3.
+  const int ns = 200;
+  const double dr = kC / (2 * 18.96e6);
+  const std::vector<double> targets = {20.0, 60.4, 108.0, 140.3, 180.9};
+  const auto want = bandLimited(ns, 0.8, targets, ns);
+  const double kx = 0.0, kx2 = 0.0, dk = 0.0;
+  double err[2];
+  int h = 0;
+  for (int taps : {1, 7}) {
+    auto par = zeroDopplerLine(ns);
+    par.interp = taps;
+    par.pad = 0.4;  // padded = genpow(280) = 288, pad offset 44
+    auto row = want;
+    par.data = row.data();
+    ASSERT_EQ(LSInterpWK(par, 288, 200, 200, &kx, &kx2, &dk, dr, 0.0, par.Req), 0);
+    err[h++] = errorDb(row.data(), want);
+  }
+  EXPECT_LT(err[1], -30.0);
+  EXPECT_LT(err[1], err[0] - 8.0);
+  // Without padding the row fills the window and still comes back in place.
+  auto par = zeroDopplerLine(ns);
+  par.interp = 7;
+  auto row = want;
+  par.data = row.data();
+  ASSERT_EQ(LSInterpWK(par, 200, 200, 200, &kx, &kx2, &dk, dr, 0.0, par.Req), 0);
+  EXPECT_LT(errorDb(row.data(), want), -30.0);
+}
+
+TEST(StoltInterpolation, LeastSquaresCoarserGridPacksRows) {
+  // scale 2: output spacing 2 dr on 100 samples packed at pitch 100 in `out`;
+  // a row band-limited to the coarser grid is resampled at every other input
+  // position (gain samples / M of the unnormalised resampling).
+  const int ns = 200, n = 100;
+  const double dr = kC / (2 * 18.96e6);
+  const std::vector<double> targets = {51.2, 120.7};
+  auto row = bandLimited(ns, 0.4, targets, ns);
+  const auto want = bandLimited(ns, 0.4, targets, n, 2.0);
+  std::vector<fcomplex> out(n, fcomplex(9.0f, 9.0f));
+  auto par = zeroDopplerLine(ns);
+  par.interp = 5;
+  par.pad = 0.4;
+  par.scale = 2.0;
+  par.data = row.data();
+  par.out = out.data();
+  const double kx = 0.0, kx2 = 0.0, dk = 0.0;
+  ASSERT_EQ(LSInterpWK(par, 288, n, n, &kx, &kx2, &dk, 2 * dr, 0.0, par.Req), 0);
+  EXPECT_LT(errorDb(out.data(), want, 2.0f), -24.0);
+}
+
+TEST(StoltInterpolation, ChirpZoomResamplesTheRowSpectrum) {
+  // The two-tap interpolator is exact for content at the middle of the
+  // zoomed window and good near it.
+  const int ns = 200;
+  const double dr = kC / (2 * 18.96e6);
+  const std::vector<double> targets = {101.3, 108.0, 114.6};
+  const auto want = bandLimited(ns, 0.8, targets, ns);
+  auto row = want;
+  auto par = zeroDopplerLine(ns);
+  par.interp = 1;
+  par.pad = 0.4;  // not used by the chirp-z kernel
+  par.data = row.data();
+  const double kx = 0.0, kx2 = 0.0, dk = 0.0;
+  ASSERT_EQ(ChirpInterpWK(par, 216, 200, 200, &kx, &kx2, &dk, dr, 0.0, par.Req), 0);
+  EXPECT_LT(errorDb(row.data(), want), -30.0);
+}
+
+TEST(StoltInterpolation, RowOutsideTheUsableBandIsZero) {
+  // An azimuth wavenumber so large that no input wavenumber reaches the
+  // output grid leaves the row empty, for both kernels.
+  const int ns = 64;
+  const double dr = kC / (2 * 18.96e6);
+  const double k0 = 4 * kPi * 5.3e9 / kC;
+  const double kx = 0.5 * k0, kx2 = kx * kx, dk = 0.0;
+  for (int mode : {1, 3}) {
+    auto par = zeroDopplerLine(ns);
+    par.interp = mode;
+    std::vector<fcomplex> row(ns, fcomplex(1.0f, -2.0f));
+    par.data = row.data();
+    const int st = mode == 1 ? ChirpInterpWK(par, 64, 64, 64, &kx, &kx2, &dk, dr, 0.0, par.Req)
+                             : LSInterpWK(par, 64, 64, 64, &kx, &kx2, &dk, dr, 0.0, par.Req);
+    ASSERT_EQ(st, 0) << mode;
+    for (const fcomplex& v : row) ASSERT_EQ(v, fcomplex(0.0f, 0.0f)) << mode;
+  }
+}
+
+TEST(StoltInterpolation, RefusesInconsistentSizes) {
+  auto par = zeroDopplerLine(64);
+  std::vector<fcomplex> row(64);
+  const double kx = 0.0, kx2 = 0.0, dk = 0.0;
+  const double dr = kC / (2 * par.frg);
+  par.interp = 4;
+  // No block.
+  EXPECT_EQ(LSInterpWK(par, 64, 64, 64, &kx, &kx2, &dk, dr, 0.0, par.Req), 1);
+  par.data = row.data();
+  // More output samples than the transform, or than the row holds.
+  EXPECT_EQ(LSInterpWK(par, 64, 64, 65, &kx, &kx2, &dk, dr, 0.0, par.Req), 1);
+  EXPECT_EQ(ChirpInterpWK(par, 64, 80, 80, &kx, &kx2, &dk, dr, 0.0, par.Req), 1);
+  // Padded shorter than the row.
+  EXPECT_EQ(LSInterpWK(par, 60, 64, 64, &kx, &kx2, &dk, dr, 0.0, par.Req), 1);
+  // A separate output grid without an output block.
+  par.scale = 2.0;
+  EXPECT_EQ(ChirpInterpWK(par, 64, 32, 32, &kx, &kx2, &dk, 2 * dr, 0.0, par.Req), 1);
+}
+
+
+// appended debug
+}  // namespace
