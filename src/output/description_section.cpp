@@ -53,7 +53,7 @@ tesv_description_section makeProductHeader() {
 
 std::string descriptionDoubleText(double value) {
   if (std::isnan(value)) return "NaN";
-  if (std::isinf(value)) return value > 0 ? "inf" : "-inf";
+  if (std::isinf(value)) return value > 0 ? "INF" : "-INF";
   char buffer[64];
   auto result = std::to_chars(buffer, buffer + sizeof buffer, value);
   return std::string(buffer, result.ptr);

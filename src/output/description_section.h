@@ -120,9 +120,9 @@ class tesv_description_section {
 tesv_description_section makeProductHeader();
 
 // Text of a double as the header files hold it: the shortest form that reads
-// back to the same value, "NaN" for not-a-number.
+// back to the same value, "NaN" for not-a-number, "INF" and "-INF".
 std::string descriptionDoubleText(double value);
-// Parses a whole text as a number ("NaN", "nan", "inf" accepted). false when
+// Parses a whole text as a number ("NaN", "nan", "INF", "inf" accepted). false when
 // the text is not entirely a number.
 bool parseDescriptionDouble(const std::string& text, double& value);
 bool parseDescriptionInt(const std::string& text, long long& value);
