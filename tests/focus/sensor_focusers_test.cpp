@@ -1,0 +1,173 @@
+#include <string>
+
+#include "focus/level0_focusers.h"
+#include "focus/sar_focuser.h"
+#include "focus_fixture.h"
+#include "ingest/ers_extractor.h"
+
+namespace {
+
+class SensorFocusers : public FocusTest {
+ protected:
+  void SetUp() override {
+    FocusTest::SetUp();
+    writeText(path("scene.dat"), std::string(100, 'x'));
+    writeText(path("scene.lea"), std::string(100, 'y'));
+    writeText(path("orbit.txt"), "x");
+    writeText(path("profile.hdr"), "[AzimuthConf]\nRangeOverlap = 40\n");
+  }
+  void fill(stripmapGeneralFocuser& f) {
+    f.level0Filename = path("scene.dat");
+    f.orbitFilename = path("orbit.txt");
+    f.configurationFilename = path("profile.hdr");
+    f.outputFilename = path("out");
+    f.skipLines = 10;
+    f.extractLines = 95;
+  }
+};
+
+TEST_F(SensorFocusers, ErsInitializeNamesTheExtractorAndTheChain) {
+  ersLevel0Focuser f;
+  fill(f);
+  EXPECT_EQ(f.initialize(), 1);
+  EXPECT_TRUE(traced("LEA filename not selected!"));
+  f.LEAFilename = path("none.lea");
+  EXPECT_EQ(f.initialize(), 1);
+  EXPECT_TRUE(traced("LEA file does not exist!"));
+
+  f.LEAFilename = path("scene.lea");
+  ASSERT_EQ(f.initialize(), 0);
+  EXPECT_TRUE(traced("Initialization completed"));
+  const ATERSExtractor& x = *f.extractor();
+  EXPECT_EQ(x.ImgFilename, path("scene.dat"));
+  EXPECT_EQ(x.LeaFilename, path("scene.lea"));
+  EXPECT_EQ(x.OrbitFilename, path("orbit.txt"));
+  EXPECT_EQ(x.OutputFile, path("out.extracted"));
+  EXPECT_EQ(x.ChirpFile, path("out.chirp"));
+  EXPECT_EQ(x.extractPercent, 95);
+  EXPECT_EQ(x.skipPercent, 10);
+  EXPECT_EQ(f.focuser().RawDataFile, path("out.extracted"));
+  EXPECT_EQ(f.focuser().ChirpFile, path("out.chirp"));
+  EXPECT_EQ(f.focuser().AntennaFile, "antenna not exist");
+  EXPECT_EQ(f.focuser().OutputFilename, path("out"));
+  EXPECT_EQ(f.conf().Memory, 256);
+  EXPECT_EQ(f.conf().RangeOverlap, 20);
+  EXPECT_EQ(f.conf().Flag_rangefoc, 1);
+  EXPECT_EQ(f.conf().Flag_set, 0);
+  EXPECT_FALSE(traced("Memory set to default value"));  // only ENVISAT says so
+}
+
+TEST_F(SensorFocusers, ErsRunStopsAtAFailingExtractor) {
+  ersLevel0Focuser f;
+  fill(f);
+  f.LEAFilename = path("scene.lea");  // not a CEOS leader
+  testing::internal::CaptureStdout();
+  const int status = f.run();
+  const std::string printed = testing::internal::GetCapturedStdout();
+  EXPECT_NE(status, 0);
+  EXPECT_TRUE(traced("Starting ingestion"));
+  EXPECT_FALSE(traced("ERS image extracted"));
+  EXPECT_FALSE(traced("ERS focuser doesn't do anything in the preprocessor module"));
+  EXPECT_FALSE(traced("Range Focusing"));
+  EXPECT_EQ(printed.find("- finalize"), std::string::npos);
+  EXPECT_FALSE(std::filesystem::exists(path("out.rgfoc")));
+  EXPECT_FALSE(std::filesystem::exists(path("out")));
+
+  // An empty LEA name fails before anything is extracted.
+  ersLevel0Focuser g;
+  fill(g);
+  EXPECT_EQ(g.run(), 1);
+  EXPECT_FALSE(std::filesystem::exists(path("out.extracted")));
+
+  // The named ingestion refuses when an output was selected.
+  EXPECT_EQ(g.initialize(), 1);
+  EXPECT_EQ(g.ingestion("r", "c", "a"), 1);
+}
+
+TEST_F(SensorFocusers, ErsStagesReportAndFinalizePrints) {
+  ersLevel0Focuser f;
+  EXPECT_EQ(f.preprocessing(), 0);
+  EXPECT_EQ(f.postprocessing(), 0);
+  EXPECT_TRUE(traced("ERS focuser doesn't do anything in the preprocessor module"));
+  EXPECT_TRUE(traced("ERS focuser doesn't do anything in the postprocessor module"));
+  testing::internal::CaptureStdout();
+  EXPECT_EQ(f.finalize(), 0);
+  EXPECT_EQ(testing::internal::GetCapturedStdout(), "- finalize \n");
+}
+
+TEST_F(SensorFocusers, EnvisatAndRadarsatFailCleanlyWithoutExtractor) {
+  envisatLevel0Focuser e;
+  fill(e);
+  EXPECT_EQ(e.initialize(), 1);
+  EXPECT_TRUE(traced("ASA_INS filename not selected!"));
+  e.ASA_INSFilename = path("ins");
+  EXPECT_EQ(e.initialize(), 1);
+  EXPECT_TRUE(traced("enviextractor object not allocated!"));
+  EXPECT_EQ(e.run(), 1);
+  EXPECT_EQ(e.ingestion(), 1);
+  EXPECT_TRUE(traced("ASAR extraction not available in this build"));
+  EXPECT_EQ(e.preprocessing(), 0);
+  EXPECT_TRUE(traced("No preprocessing has to be performed."));
+
+  radarsatLevel0Focuser r;
+  fill(r);
+  r.leaderFilename = path("scene.lea");
+  EXPECT_EQ(r.run(), 1);
+  EXPECT_TRUE(traced("radarextract object not allocated!"));
+  EXPECT_EQ(r.ingestion(), 1);
+  EXPECT_TRUE(traced("RADARSAT extraction not available in this build"));
+  EXPECT_EQ(r.finalize(), 0);
+  EXPECT_TRUE(traced("finalized..."));
+  EXPECT_EQ(r.postprocessing(), 0);
+  EXPECT_TRUE(traced("RADARSAT focuser doesn't do anything in the postprocessor module"));
+}
+
+TEST_F(SensorFocusers, ChainRunFindsItsInputsOrFails) {
+  SARFocuser_conf conf;
+  conf.clear();
+  SARFocuser chain(&conf);
+  // A raw raster without its chirp: 10 and no output.
+  writeText(path("raw"), "r");
+  chain.RawDataFile = path("raw");
+  chain.ChirpFile = path("chirp");
+  chain.OutputFilename = path("out");
+  EXPECT_EQ(chain.run(), 10);
+  EXPECT_TRUE(traced("STRIPMAP RAW DATA DETECTED, FOCUSSING..."));
+  EXPECT_FALSE(traced("Range Focusing"));
+
+  // The raw name as given wins over the alternating-polarisation channels.
+  writeText(path("raw1"), "r");
+  writeText(path("chirp1"), "c");
+  EXPECT_EQ(chain.run(), 10);
+  EXPECT_FALSE(traced(" AP RAW DATA DETECTED"));
+
+  // Only channel files: the alternating form, which needs both chirps.
+  chain.RawDataFile = path("ap");
+  chain.ChirpFile = path("apchirp");
+  writeText(path("ap1"), "r");
+  EXPECT_EQ(chain.run(), 10);
+  EXPECT_TRUE(traced(" AP RAW DATA DETECTED, FOCUSSING..."));
+  EXPECT_EQ(chain.RawDataFile, path("ap"));  // names restored
+
+  // A raw raster and chirp that exist but hold no record.
+  writeText(path("chirp"), "c");
+  chain.RawDataFile = path("raw");
+  chain.ChirpFile = path("chirp");
+  EXPECT_NE(chain.run(), 0);
+  EXPECT_FALSE(std::filesystem::exists(path("out.rgfoc")));
+}
+
+TEST_F(SensorFocusers, MissingRawDataIsFatalWhileReportsAreOn) {
+  SARFocuser_conf conf;
+  conf.clear();
+  SARFocuser chain(&conf);
+  chain.RawDataFile = path("none");
+  chain.ChirpFile = path("none.chirp");
+  chain.OutputFilename = path("out");
+  GTEST_FLAG_SET(death_test_style, "threadsafe");
+  EXPECT_EXIT(chain.run(), testing::ExitedWithCode(1305605 & 0xff), "");
+  set_flg_report(0);
+  EXPECT_EQ(chain.run(), 10);
+}
+
+}  // namespace
