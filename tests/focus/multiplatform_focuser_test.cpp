@@ -385,6 +385,7 @@ TEST(ErsProfile, ChainReadsTheErsValues) {
   EXPECT_DOUBLE_EQ(conf.AzimuthLookBandwidth, 0.8);
   EXPECT_DOUBLE_EQ(conf.ApplyAzShift, 1.0);
   EXPECT_EQ(conf.WhiteningFlag, 1);
+  EXPECT_DOUBLE_EQ(conf.AntennaLength, 9.45);
   EXPECT_EQ(conf.Flag_rangefoc, 1);
   EXPECT_EQ(conf.Flag_dcest, 1);
   EXPECT_EQ(conf.Flag_azimuthfoc, 1);

@@ -1,0 +1,117 @@
+// ERS jobs that cannot be focused: each ends with the code and the report
+// the host expects, with the files named, and never with a crash. Also the
+// orbit arc found by itself from the archive folder.
+#include <gtest/gtest.h>
+
+#include "e2e_support.h"
+#include "focus/level0_focusers.h"
+#include "focus/multiplatform_focuser.h"
+#include "job/focuser_handover.h"
+
+using namespace e2e;
+
+namespace {
+
+// A small scene: the failures below stop before focusing.
+SceneDescription smallScene() {
+  SceneDescription s = ersScene(256, 1024, 300.0);
+  s.clutterSigma = 1.0;
+  s.pixelTargets.push_back({128.0, 500.0, 0.0, 4.0});
+  return s;
+}
+
+// The run stopped at a stage: code 130560 in the _error file and the log,
+// the failing call named, the stop reported without a crash.
+void expectStageFailure(const FocuserRun& run, const std::string& call) {
+  EXPECT_FALSE(run.signalled);
+  EXPECT_EQ(run.exitStatus, EC_STAGE_FAILED & 0xFF);
+  EXPECT_EQ(run.errorCode, 130560) << run.errorFile;
+  EXPECT_TRUE(contains(run.log, "[ERROR ID : 130560]")) << run.log;
+  EXPECT_TRUE(contains(run.log, "  " + call + " \n")) << run.log;
+  EXPECT_TRUE(contains(run.log, "FOCUSSING STAGE FAILED")) << run.log;
+}
+
+}  // namespace
+
+TEST(ErsOrbitLookup, ArcFoundFromTheArchiveFolderWhenNoOrbitIsGiven) {
+  Folder dir("orbit");
+  SceneFiles files;
+  std::string error;
+  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+
+  ATmultiplatformFocuser f;
+  f.platform = "ERS";
+  f.level0Filename = files.image;
+  f.auxFile2 = files.leader;
+  f.auxDirectory1 = files.orbitArchive;
+  f.processingConfFilename = std::string(resourcesDir()) + "parameters_ERS.hdr";
+  f.outputFilename = dir / "out";
+  ASSERT_EQ(f.InitProcessing(), 0);
+  auto* ers = dynamic_cast<ersLevel0Focuser*>(f.sensorFocuser());
+  ASSERT_NE(ers, nullptr);
+  EXPECT_EQ(ers->orbitFilename, files.orbit);
+  EXPECT_EQ(f.auxFile1, files.orbit);
+  EXPECT_EQ(ers->LEAFilename, files.leader);
+  EXPECT_EQ(f.FinalizeProcessing("headerfile", 0), 0);
+
+  // Through the job's hand-over the found arc comes back into the job.
+  std::unique_ptr<JobFocuser> job = makeJobFocuser();
+  job->job.platform = "ERS";
+  job->job.level0Filename = files.image;
+  job->job.auxFile2 = files.leader;
+  job->job.auxDirectory1 = files.orbitArchive;
+  job->job.processingConfFilename = f.processingConfFilename;
+  job->job.outputFilename = dir / "out";
+  EXPECT_EQ(job->checkpar(), 0);
+  EXPECT_EQ(job->InitProcessing(), 0);
+  EXPECT_EQ(job->job.auxFile1, files.orbit);
+  EXPECT_EQ(job->FinalizeProcessing("headerfile", 0), 0);
+}
+
+TEST(ErsJobFailures, MissingLeaderStopsBeforeExtraction) {
+  Folder dir("leader");
+  SceneFiles files;
+  std::string error;
+  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+
+  // Not named in the job.
+  std::vector<std::string> p = ersJob(files, dir / "out");
+  p[7] = "NotOK";
+  writeJob(dir / "job.txt", p);
+  FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  expectStageFailure(run, "InitProcessing()");
+  EXPECT_TRUE(contains(run.log, "Error in defining Ers leader file")) << run.log;
+  EXPECT_FALSE(fs::exists(dir / "out.extracted"));
+
+  // Named, but not there.
+  fs::remove(files.leader);
+  writeJob(dir / "job.txt", ersJob(files, dir / "out"));
+  run = runFocuser(dir.str(), dir / "job.txt");
+  expectStageFailure(run, "run()");
+  EXPECT_TRUE(contains(run.log, "LEA file does not exist!")) << run.log;
+  EXPECT_FALSE(fs::exists(dir / "out.extracted"));
+}
+
+TEST(ErsJobFailures, ArcListThatDoesNotCoverTheSceneIsReported) {
+  Folder dir("arc");
+  SceneFiles files;
+  std::string error;
+  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  // Move every arc of the list ten years back.
+  const std::string list = files.orbitArchive + "/ERS1/PRECISE/arclist";
+  std::string text = readText(list);
+  ASSERT_TRUE(contains(text, " 10")) << text;
+  const std::regex year(R"( 10(\d\d\d\d))");
+  writeText(list, std::regex_replace(text, year, " 00$1"));
+
+  std::vector<std::string> p = ersJob(files, dir / "out");
+  p[6] = "NotOK";
+  p[11] = files.orbitArchive;
+  writeJob(dir / "job.txt", p);
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  expectStageFailure(run, "InitProcessing()");
+  EXPECT_TRUE(contains(run.log, "No ERS orbit arc found for the scene in " + files.orbitArchive))
+      << run.log;
+  EXPECT_TRUE(contains(run.log, "INPUT FILE 1")) << run.log;
+  EXPECT_FALSE(fs::exists(dir / "out.extracted"));
+}
