@@ -1,0 +1,271 @@
+// The ERS extractor on scenes written by the simulator, clean and damaged.
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "ingest/ers_extractor.h"
+#include "ingest/sar_product.h"
+#include "orbit/general_sar_orbit.h"
+#include "product/product_aggregates.h"
+#include "product/time_base.h"
+#include "sim/raw_scene.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr int kLines = 300;
+constexpr int kSamples = 1024;
+
+class ErsSceneTest : public testing::Test {
+ protected:
+  void SetUp() override {
+    const auto* info = testing::UnitTest::GetInstance()->current_test_info();
+    dir_ = fs::path(testing::TempDir()) /
+           ("ingest_sim_" + std::to_string(getpid()) + "_" + info->name());
+    fs::remove_all(dir_);
+    fs::create_directories(dir_);
+    std::string error;
+    ASSERT_TRUE(SceneDescription::load(TESSIVOR_SOURCE_DIR "/tests/sim/data/ers2_small_scene.txt", scene_, error))
+        << error;
+    scene_.lines = kLines;
+    scene_.samples = kSamples;
+    scene_.odrRecords = 120;
+    scene_.pixelTargets = {{150.0, 600.0, 0.0, 4.0}};
+  }
+  void TearDown() override {
+    std::error_code ec;
+    fs::remove_all(dir_, ec);
+  }
+
+  // Writes the scene and returns its simulator.
+  std::unique_ptr<RawSceneSimulator> write() {
+    auto sim = std::make_unique<RawSceneSimulator>(scene_);
+    std::string error;
+    EXPECT_EQ(sim->writeErsScene(dir_.string(), error), 0) << error;
+    return sim;
+  }
+
+  void aim(ATERSExtractor& x, const RawSceneSimulator& sim) const {
+    x.LeaFilename = sim.leaderPath(dir_.string());
+    x.ImgFilename = sim.imagePath(dir_.string());
+    x.OrbitFilename = sim.odrPath(dir_.string());
+    x.OutputFile = out();
+    x.ChirpFile = out() + ".chirp";
+  }
+
+  std::string out() const { return (dir_ / "scene.extracted").string(); }
+
+  // Quantised bytes of every simulated line.
+  static std::vector<unsigned char> quantised(const RawSceneSimulator& sim) {
+    std::vector<fcomplex> echoes;
+    sim.renderLines(0, kLines, echoes);
+    std::vector<unsigned char> bytes(2 * std::size_t(kLines) * kSamples);
+    for (int k = 0; k < kLines; ++k)
+      sim.quantiseLine(echoes.data() + std::size_t(k) * kSamples, bytes.data() + 2 * std::size_t(k) * kSamples);
+    return bytes;
+  }
+
+  static std::vector<float> rasterRows(const std::string& path) {
+    std::ifstream in(path, std::ios::binary);
+    std::vector<char> bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+    std::vector<float> v(bytes.size() / 4);
+    std::memcpy(v.data(), bytes.data(), v.size() * 4);
+    return v;
+  }
+
+  static float prefixOf(int code) { return static_cast<float>(ersSwstSeconds(code)); }
+
+  fs::path dir_;
+  SceneDescription scene_;
+};
+
+}  // namespace
+
+TEST_F(ErsSceneTest, CleanSceneRasterRecordAndVectors) {
+  scene_.swstChangeLine = 200;
+  scene_.swstChangeCodes = 4;
+  const auto sim = write();
+  ATERSExtractor x;
+  aim(x, *sim);
+  ASSERT_EQ(x.run(), 0);
+
+  // The raster is the simulated I/Q less 15.5 (no biases), each line
+  // prefixed with its window start.
+  const std::vector<unsigned char> iq = quantised(*sim);
+  const std::vector<float> raster = rasterRows(out());
+  const std::size_t row = 1 + 2 * std::size_t(kSamples);
+  ASSERT_EQ(raster.size(), row * kLines);
+  int mismatches = 0;
+  for (int k = 0; k < kLines; ++k) {
+    const float* r = raster.data() + row * std::size_t(k);
+    if (r[0] != prefixOf(sim->swstCodeOf(k))) ++mismatches;
+    for (int s = 0; s < 2 * kSamples; ++s)
+      if (r[1 + s] != static_cast<float>(iq[2 * std::size_t(k) * kSamples + std::size_t(s)]) - 15.5f) ++mismatches;
+  }
+  EXPECT_EQ(mismatches, 0);
+
+  ASSERT_EQ(x.getVectorLength(), kLines);
+  for (int k = 0; k < kLines; ++k) {
+    EXPECT_EQ(x.getSwstVector()[k], sim->swstCodeOf(k)) << k;
+    EXPECT_EQ(x.getMissingVector()[k], 0) << k;
+    EXPECT_EQ(x.getCounterVector()[k], k + 1) << k;
+  }
+
+  // The record written with the raster, read back.
+  GeneralRAWData r;
+  ASSERT_EQ(r.readhdr(out() + ".hdr"), 0);
+  EXPECT_EQ(r.roi.Lines, kLines);
+  EXPECT_EQ(r.roi.Samples, kSamples);
+  EXPECT_EQ(r.dataFile.NrOfPixelsPerLine, kSamples);
+  EXPECT_EQ(r.dataFile.RowPrefix, 4);
+  EXPECT_NEAR(r.roi.SlowStartTime, scene_.startTime, 1e-6);
+  EXPECT_NEAR(r.roi.SlowTimeDelta, 1.0 / scene_.prfHz, 1e-15);
+  EXPECT_NEAR(r.roi.FastTimeDelta, 1.0 / scene_.samplingRateHz, 1e-18);
+  EXPECT_NEAR(r.roi.FastStartTime, double(prefixOf(sim->swstCode())), 1e-12);
+  EXPECT_NEAR(r.dataSetInfo.SWST_MIN, double(prefixOf(sim->swstCode())), 1e-12);
+  EXPECT_NEAR(r.dataSetInfo.SWST_MAX, double(prefixOf(sim->swstCode() + 4)), 1e-12);
+  EXPECT_NEAR(r.sampling.prf_hz, scene_.prfHz, 1e-6);
+  EXPECT_NEAR(r.sampling.frg_hz, scene_.samplingRateHz, 1e-3);
+  EXPECT_NEAR(r.sampling.fc_hz, scene_.carrierHz, 1.0);
+  EXPECT_NEAR(r.pulse.PulseLength, scene_.pulseLength, 1e-12);
+  EXPECT_NEAR(r.pulse.Bandwidth, 2.0 * scene_.pulseLength * scene_.chirpCoefficient, 1.0);
+  EXPECT_EQ(r.dataSetInfo.Description, "ERS2");
+  // 32 bytes from the start of the identifier field: its 16 blanks, then
+  // the first 16 characters of the designator, as on the archive leaders.
+  EXPECT_EQ(r.dataSetInfo.SceneID, "ORBIT=77106-FRAM");
+  EXPECT_EQ(r.dataSetInfo.OrbitNumber, "77106");
+  EXPECT_EQ(r.dataSetInfo.MissingLines, 0);
+  EXPECT_TRUE(r.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA));
+  EXPECT_TRUE(r.dataSetInfo.IsSensorType(DataSetInfo_Obj::ST_ERS2));
+  EXPECT_NEAR(r.swath.Rgate_bias, -6.627e-06, 1e-18);
+
+  // The orbit comes from the precise arc and follows the simulated one.
+  GeneralSAROrbit& orbit = r.orbit();
+  ASSERT_GT(orbit.nSV, 4);
+  const double t = sim->lineTime(kLines / 2);
+  double pos[3];
+  ASSERT_EQ(orbit.SVGetPos(t, pos), 0);
+  const auto sv = sim->orbit().at(t);
+  const double d = std::hypot(pos[0] - sv.pos[0], pos[1] - sv.pos[1], pos[2] - sv.pos[2]);
+  EXPECT_LT(d, 2.0);
+
+  // The generated chirp: round(fs T) samples.
+  EXPECT_EQ(fs::file_size(out() + ".chirp"), std::uintmax_t(sim->replicaLength()) * 8u);
+}
+
+TEST_F(ErsSceneTest, DroppedLineAndCorruptWindowCode) {
+  scene_.dropLines = {100};
+  scene_.corruptSwstLines = {50};
+  scene_.corruptSwstDelta = 1000;
+  const auto sim = write();
+  ATERSExtractor x;
+  aim(x, *sim);
+  ASSERT_EQ(x.run(), 0);
+  const int n = kLines - 1;
+  ASSERT_EQ(x.getVectorLength(), n);
+  // The corrupt code is replaced by the previous one.
+  EXPECT_EQ(x.getSwstVector()[50], sim->swstCodeOf(49));
+  const std::vector<float> raster = rasterRows(out());
+  const std::size_t row = 1 + 2 * std::size_t(kSamples);
+  EXPECT_EQ(raster[row * 50], prefixOf(sim->swstCodeOf(49)));
+  // From the gap on, every line is flagged (the test is not resynchronised).
+  for (int k = 0; k < n; ++k) EXPECT_EQ(x.getMissingVector()[k], k < 100 ? 0 : 1) << k;
+  EXPECT_EQ(x.getCounterVector()[99], 100);
+  EXPECT_EQ(x.getCounterVector()[100], 102);
+  EXPECT_EQ(x.getMissingLines(), n - 100);
+  GeneralRAWData r;
+  ASSERT_EQ(r.readhdr(out() + ".hdr"), 0);
+  EXPECT_EQ(r.dataSetInfo.MissingLines, n - 100);
+  EXPECT_EQ(r.roi.Lines, n);
+  // The window statistics do not see the corrupt code.
+  EXPECT_NEAR(r.dataSetInfo.SWST_MAX, double(prefixOf(sim->swstCode())), 1e-12);
+}
+
+TEST_F(ErsSceneTest, PartOfTheScene) {
+  const auto sim = write();
+  ATERSExtractor x;
+  aim(x, *sim);
+  x.ChirpFile.clear();
+  x.skipPercent = 25;
+  x.extractPercent = 50;
+  ASSERT_EQ(x.run(), 0);
+  EXPECT_FALSE(fs::exists(out() + ".chirp"));
+  ASSERT_EQ(x.getVectorLength(), kLines / 2);
+  EXPECT_EQ(x.getCounterVector()[0], kLines / 4 + 1);
+  const std::vector<unsigned char> iq = quantised(*sim);
+  const std::vector<float> raster = rasterRows(out());
+  const std::size_t row = 1 + 2 * std::size_t(kSamples);
+  ASSERT_EQ(raster.size(), row * (kLines / 2));
+  const std::size_t first = 2 * std::size_t(kLines / 4) * kSamples;
+  EXPECT_EQ(raster[1], static_cast<float>(iq[first]) - 15.5f);
+  EXPECT_EQ(raster[row * 10 + 7], static_cast<float>(iq[first + 20 * kSamples + 6]) - 15.5f);
+  GeneralRAWData r;
+  ASSERT_EQ(r.readhdr(out() + ".hdr"), 0);
+  EXPECT_NEAR(r.roi.SlowStartTime, sim->lineTime(kLines / 4), 1e-6);
+}
+
+TEST_F(ErsSceneTest, DamagedFilesEndWithStatus) {
+  {
+    // Image file cut inside a record.
+    scene_.truncateImageBytes = 11644 + (412 + 2 * kSamples) * 10 + 100;
+    const auto sim = write();
+    ATERSExtractor x;
+    aim(x, *sim);
+    EXPECT_EQ(x.run(), 4);
+    EXPECT_EQ(x.getSwstVector(), nullptr);
+    EXPECT_FALSE(fs::exists(out() + ".hdr"));
+  }
+  scene_.truncateImageBytes = 0;
+  {
+    // Leader missing.
+    const auto sim = write();
+    fs::remove(sim->leaderPath(dir_.string()));
+    ATERSExtractor x;
+    aim(x, *sim);
+    EXPECT_EQ(x.run(), 9);
+  }
+  {
+    // A PRF field that holds no number.
+    scene_.leaderPatches = {{1654, "     NOT A VALUE"}};
+    const auto sim = write();
+    fs::remove(out());
+    ATERSExtractor x;
+    aim(x, *sim);
+    EXPECT_EQ(x.run(), 10);
+    EXPECT_FALSE(fs::exists(out()));
+  }
+  scene_.leaderPatches.clear();
+  {
+    // An arc of another time does not cover the scene: the orbit reader fails.
+    const auto sim = write();
+    const std::string real = TESSIVOR_REALDATA_DIR "/orbits/ers2_ODR.015";
+    if (fs::exists(real)) {
+      ATERSExtractor x;
+      aim(x, *sim);
+      x.OrbitFilename = real;
+      EXPECT_NE(x.run(), 0);
+      EXPECT_FALSE(fs::exists(out() + ".hdr"));
+    }
+    // The image file missing.
+    fs::remove(sim->imagePath(dir_.string()));
+    ATERSExtractor y;
+    aim(y, *sim);
+    EXPECT_EQ(y.run(), 9);
+  }
+}
+
+TEST_F(ErsSceneTest, OrbitArcFoundFromTheArchive) {
+  const auto sim = write();
+  Ers_level0 product;
+  ASSERT_EQ(product.setfileName(fs::path(sim->leaderPath(dir_.string())).parent_path().string()), 0);
+  ASSERT_EQ(product.getAuxFiles(3, (dir_ / "orbits").string()), 0);
+  EXPECT_EQ(product.getOrbitFilename(), sim->odrPath(dir_.string()));
+  EXPECT_EQ(product.isAuxValid(3), 1);
+}
