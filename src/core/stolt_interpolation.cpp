@@ -114,6 +114,61 @@ struct StoltGrid {
   }
 };
 
+// Chirp-z zoom of rows of M samples onto K output points,
+//   X[k] = sum_n x[n] exp(j n (a k - b)),
+// with the kernel spectrum and the post-chirp made once for a block (a is
+// fixed there); only the pre-chirp depends on the row through b. Work
+// buffers come from the caller so that every thread transforms buffers of
+// the same alignment.
+class Zoom {
+ public:
+  int make(int M, int K, double a) {
+    M_ = M;
+    K_ = K;
+    a_ = a;
+    L_ = genpow(M + K - 1, 1);
+    if (fft_makep_c(fwd_, L_, L_, 1, 1, FFT_FORWARD, FFT_NONE, 1) != 0 ||
+        fft_makep_c(inv_, L_, L_, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0)
+      return STATUS_BAD_CONDITION;
+    kernel_.assign(L_, fcomplex(0.0f, 0.0f));
+    post_.resize(K);
+    for (int k = 0; k < K; ++k) post_[k] = unit(ph(k));
+    for (int m = 0; m <= M + K - 2; ++m) kernel_[m] = unit(-ph(m + 1 - M));
+    pfft_c(fwd_, kernel_.data(), kernel_.data());
+    return STATUS_OK;
+  }
+  ~Zoom() {
+    fft_destp_c(fwd_);
+    fft_destp_c(inv_);
+  }
+  int length() const { return L_; }
+  // x: M samples; out: K samples; work: length() aligned samples.
+  void run(const fcomplex* x, fcomplex* out, double b, fcomplex* work) const {
+    for (int n = 0; n < M_; ++n) work[n] = mul(x[n], unit(ph(n) - n * b));
+    std::fill(work + M_, work + L_, fcomplex(0.0f, 0.0f));
+    pfft_c(fwd_, work, work);
+    for (int i = 0; i < L_; ++i) work[i] = mul(work[i], kernel_[i]);
+    pfft_c(inv_, work, work);
+    for (int k = 0; k < K_; ++k) out[k] = mul(work[k + M_ - 1], post_[k]);
+  }
+
+ private:
+  double ph(long long n) const { return static_cast<double>(n) * static_cast<double>(n) * a_ / 2.0; }
+  static fcomplex unit(double p) {
+    return fcomplex(static_cast<float>(std::cos(p)), static_cast<float>(std::sin(p)));
+  }
+  int M_ = 0, K_ = 0, L_ = 0;
+  double a_ = 0.0;
+  FFTPlan fwd_, inv_;
+  FFTBuffer kernel_;
+  std::vector<fcomplex> post_;
+};
+
+// Per-thread row buffers, each aligned for the transforms.
+struct RowBuffers {
+  FFTBuffer a, b;
+};
+
 bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const char* who) {
   const bool ok = par.lines >= 1 && par.samples >= 1 && padded >= 1 && M >= 1 && n >= 1 &&
                   n <= M && (par.scale == 1.0 ? par.data && n <= par.samples
@@ -163,7 +218,6 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
   const int sign = par.conj ? -1 : 1;
 
   std::vector<double> rowN, rowD;
-  std::vector<fcomplex> work;
   std::unique_ptr<StoltGrid> gridOwner;
   try {
     gridOwner = std::make_unique<StoltGrid>(par, M, n, spacing);
@@ -185,36 +239,39 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
   const double kie = kis + (Nin - 1) * dki;
   const double Rp = par.Req / std::cos(grid.sq);
 
-  // Per-thread buffers: the zoomed spectrum (one zero guard sample) and the
-  // output line.
-  const int nt = threadCount();
-  const std::size_t perThread = static_cast<std::size_t>(Nin + 1) + M;
+  // Per-thread buffers: the zoomed spectrum (one zero guard sample) with the
+  // zoom work area, and the output line.
+  Zoom zoom;
+  std::vector<RowBuffers> buffers;
+  FFTPlan inv;
   try {
-    work.assign(perThread * nt, fcomplex(0.0f, 0.0f));
+    if (zoom.make(ns, Nin, -kTwoPi / padded * sign) != STATUS_OK ||
+        fft_makep_c(inv, M, M, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0 ||
+        fft_c(ns, ns, nl, nl, FFT_NONE, grid.dir, par.data, par.data) != 0) {
+      ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
+      fft_destp_c(inv);
+      return STATUS_BAD_CONDITION;
+    }
+    buffers.resize(threadCount());
+    for (RowBuffers& rb : buffers) {
+      rb.a.assign(static_cast<std::size_t>(Nin + 1) + zoom.length(), fcomplex(0.0f, 0.0f));
+      rb.b.assign(M, fcomplex(0.0f, 0.0f));
+    }
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Out of memory in the chirp-z Stolt kernel", REPORT_ERROR);
-    return STATUS_NO_MEMORY_ALT;
-  }
-
-  CZTPlan czt;
-  FFTPlan inv;
-  if (czt_makep_c(czt, ns, Nin) != 0 ||
-      fft_makep_c(inv, M, M, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0 ||
-      fft_c(ns, ns, nl, nl, FFT_NONE, grid.dir, par.data, par.data) != 0) {
-    ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
-    czt_destp_c(czt);
     fft_destp_c(inv);
-    return STATUS_BAD_CONDITION;
+    return STATUS_NO_MEMORY_ALT;
   }
 
   const int conj = par.conj;
   const double Req = par.Req;
   const double kzc = grid.kzc, k0 = grid.k0, kxc = grid.kxc;
-  int failed = 0;
 #pragma omp parallel for schedule(dynamic, 8)
   for (int j = 0; j < nl; ++j) {
-    fcomplex* G = work.data() + perThread * threadIndex();
-    fcomplex* line = G + Nin + 1;
+    RowBuffers& rb = buffers[threadIndex()];
+    fcomplex* line = rb.b.data();
+    fcomplex* zoomWork = rb.a.data();
+    fcomplex* G = zoomWork + zoom.length();
     const double fr = dk[j] - std::trunc(dk[j] / dki) * dki;
     const double a = kis - fr, b = kie - fr;
     int ilo, ihi;
@@ -225,11 +282,7 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
     if (ihi >= ilo) {
       const fcomplex* row = par.data + static_cast<std::size_t>(j) * ns;
       // Zoomed spectrum of the row on k0 + a + p dki, p = 0 .. Nin - 1.
-      if (pczt_c(czt, row, G, -kTwoPi / padded * sign, a * (kTwoPi / grid.Bk) * sign, 1) != 0)
-      {
-#pragma omp atomic write
-        failed = 1;
-      }
+      zoom.run(row, G, a * (kTwoPi / grid.Bk) * sign, zoomWork);
       G[Nin] = fcomplex(0.0f, 0.0f);
       const double tlo = (std::sqrt(grid.kz[ilo] * grid.kz[ilo] + kx2[j]) - k0 - a) / dki;
       const double thi = (std::sqrt(grid.kz[ihi] * grid.kz[ihi] + kx2[j]) - k0 - a) / dki;
@@ -278,12 +331,7 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
     rowD[j] = D;
     grid.store(j, line, n);
   }
-  czt_destp_c(czt);
   fft_destp_c(inv);
-  if (failed) {
-    ORV_REPORT_CALLED_ERROR();
-    return STATUS_BAD_CONDITION;
-  }
   const int st = finishBlock(par, grid, n, gainOf(A, rowN, rowD));
   if (st != STATUS_OK) ORV_REPORT_CALLED_ERROR();
   return st;
@@ -302,17 +350,23 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
   const int taps = 2 * H + 1;
 
   std::unique_ptr<StoltGrid> gridOwner;
-  std::vector<fcomplex> table, work;
+  std::vector<fcomplex> table;
   std::vector<double> kin, rwin, rowN, rowD;
-  const int nt = threadCount();
-  const std::size_t perThread = static_cast<std::size_t>(padded + 2 * H) + M;
+  std::vector<RowBuffers> buffers;
+  // The padded spectrum starts at an aligned position after a guard of at
+  // least H zeros, and is followed by H zeros.
+  const int guard = (H + 7) / 8 * 8;
   try {
     gridOwner = std::make_unique<StoltGrid>(par, M, n, spacing);
     table.resize(static_cast<std::size_t>(kFractions) * taps);
     kin.resize(padded);
     rowN.assign(nl, 0.0);
     rowD.assign(nl, 0.0);
-    work.assign(perThread * nt, fcomplex(0.0f, 0.0f));
+    buffers.resize(threadCount());
+    for (RowBuffers& rb : buffers) {
+      rb.a.assign(static_cast<std::size_t>(guard) + padded + H, fcomplex(0.0f, 0.0f));
+      rb.b.assign(M, fcomplex(0.0f, 0.0f));
+    }
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Out of memory in the least-squares Stolt kernel", REPORT_ERROR);
     return STATUS_NO_MEMORY;
@@ -354,8 +408,10 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
   const double kzc = grid.kzc, k0 = grid.k0, kxc = grid.kxc;
 #pragma omp parallel for schedule(dynamic, 8)
   for (int j = 0; j < nl; ++j) {
-    fcomplex* buf = work.data() + perThread * threadIndex();
-    fcomplex* line = buf + padded + 2 * H;
+    RowBuffers& rb = buffers[threadIndex()];
+    fcomplex* spec = rb.a.data() + guard;
+    fcomplex* buf = spec - H;  // tap m of output u reads buf[u + m]
+    fcomplex* line = rb.b.data();
     int ilo, ihi;
     grid.usable(std::sqrt(kis * kis - kx2[j]), std::sqrt(kie * kie - kx2[j]), ilo, ihi);
     std::fill(buf, buf + padded + 2 * H, fcomplex(0.0f, 0.0f));
@@ -363,7 +419,6 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
     double N = 0.0, D = 0.0;
     if (ihi >= ilo) {
       const fcomplex* row = par.data + static_cast<std::size_t>(j) * ns;
-      fcomplex* spec = buf + H;
       // The row starts the padded window; R2 moves its content to the middle
       // of the window for the interpolation and R3 moves it back.
       std::copy(row, row + ns, spec);
