@@ -134,15 +134,19 @@ inline std::vector<fcomplex> makeVaryingClutter(const Radar& rd, const Centroid&
 }
 
 // Clutter of unit power at an absolute centroid `dcPrf` (PRF units) plus
-// white noise at snrDb.
+// white noise at snrDb; `points` bright scatterers of amplitude `pointAmp`
+// against a reflectivity cell of unit power at random places.
 inline std::vector<fcomplex> makeChirpedClutter(const Radar& rd, double dcPrf, int samples,
-                                                int lines, double snrDb, unsigned seed) {
+                                                int lines, double snrDb, unsigned seed,
+                                                int points = 0, double pointAmp = 0.0) {
   const double c = 299792458.0;
   const double pi = std::numbers::pi;
   std::mt19937 rng(seed);
   std::normal_distribution<float> n01(0.0f, 1.0f);
   FFTBuffer data(static_cast<size_t>(samples) * lines);
-  for (auto& v : data) v = fcomplex(n01(rng), n01(rng));
+  for (auto& v : data) v = fcomplex(n01(rng), n01(rng)) * static_cast<float>(std::sqrt(0.5));
+  std::uniform_int_distribution<size_t> where(0, data.size() - 1);
+  for (int i = 0; i < points; ++i) data[where(rng)] += static_cast<float>(pointAmp);
   fft_c(samples, samples, lines, lines, FFT_FORWARD, FFT_FORWARD, data.data(), data.data());
   const double fdc = dcPrf * rd.prf;
   const double k2 = std::pow(c / (2.0 * rd.velocity), 2);
@@ -172,10 +176,13 @@ inline std::vector<fcomplex> makeChirpedClutter(const Radar& rd, double dcPrf, i
   }
   fft_c(samples, samples, lines, lines, FFT_BACKWARD_NORMALISED, FFT_BACKWARD_NORMALISED,
         data.data(), data.data());
+  // Noise against the clutter power alone (the reflectivity had unit power).
   double p = 0.0;
+  const size_t clutterCells = data.size();
   for (const auto& v : data) p += std::norm(v);
-  p /= static_cast<double>(data.size());
-  const float scale = static_cast<float>(1.0 / std::sqrt(p));
+  p /= static_cast<double>(clutterCells);
+  const double pointPower = double(points) * pointAmp * pointAmp / double(clutterCells);
+  const float scale = static_cast<float>(1.0 / std::sqrt(p / (1.0 + pointPower)));
   const float noise = static_cast<float>(std::sqrt(std::pow(10.0, -snrDb / 10.0) / 2.0));
   std::vector<fcomplex> out(data.size());
   for (size_t i = 0; i < data.size(); ++i) out[i] = data[i] * scale + noise * fcomplex(n01(rng), n01(rng));
