@@ -12,6 +12,7 @@
 #include <new>
 
 #include "base/status.h"
+#include "diag/ckerr.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
 #include "ingest/ceos_fields.h"
@@ -151,6 +152,7 @@ int ATERSExtractor::runall(const std::string& file, int channel) {
 }
 
 int ATERSExtractor::run() {
+  CheckedCall cc("ATERSExtractor::run()");
   if (int st = readLeader(); st != 0) return ERS_CALLED(st);
   GeneralSAROrbit& orbit = rawData.orbit();
   orbit.SVDestroy();
@@ -169,6 +171,7 @@ int ATERSExtractor::run() {
 }
 
 int ATERSExtractor::readLeader() {
+  CheckedCall cc("ATERSExtractor::readLeader()");
   std::vector<char> bytes;
   {
     std::ifstream in(LeaFilename, std::ios::binary);
@@ -255,6 +258,7 @@ int ATERSExtractor::readLeader() {
 }
 
 int ATERSExtractor::readImage() {
+  CheckedCall cc("ATERSExtractor::readImage()");
   vectorsReady_ = false;
   missingLines_ = 0;
   std::ifstream in(ImgFilename, std::ios::binary);
@@ -382,6 +386,7 @@ int ATERSExtractor::readImage() {
 }
 
 int ATERSExtractor::ExtractChirp() {
+  CheckedCall cc("ATERSExtractor::ExtractChirp()");
   if (int st = rawData.readhdr(OutputFile + ".hdr"); st != 0) return ERS_CALLED(st);
   if (int st = rawData.pulse.writeChirp(ChirpFile); st != 0) return ERS_CALLED(st);
   return 0;

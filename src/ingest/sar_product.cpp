@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "base/status.h"
+#include "diag/ckerr.h"
 #include "diag/report.h"
 #include "ingest/product_types.h"
 #include "product/antenna_pattern.h"
@@ -74,6 +75,7 @@ using DirHandle = std::unique_ptr<DIR, DirCloser>;
 // The newest product of one ENVISAT type valid at time in a directory.
 int searchAuxProduct(double time, const std::string& path, int (EnvisatTypes::*test)() const,
                      const char* notFound, std::string& found) {
+  CheckedCall cc("searchAuxProduct()");
   DirHandle dir(path.empty() ? nullptr : opendir(path.c_str()));
   if (!dir) return STATUS_BAD_CONDITION;
   std::string best;
@@ -122,6 +124,7 @@ int Ers_DEOS::getTimeStop(double*) { return 0; }
 int Ers_DEOS::getTimeStart(double*) { return 0; }
 
 int Ers_DEOS::getDEOS(double time, int satellite, const std::string& path) {
+  CheckedCall cc("Ers_DEOS::getDEOS()");
   if ((satellite != 0 && satellite != 1) || time < 0.0 || path.empty()) return 1;
   // The same list serves both satellites.
   const std::string list = path + "/ERS1/PRECISE/arclist";
@@ -173,6 +176,7 @@ int Ers_level0::getTimeStop(double* t) {
 }
 
 int Ers_level0::getAuxFiles(int selector, const std::string& path) {
+  CheckedCall cc("Ers_level0::getAuxFiles()");
   if (selector != 3) return 0;
   const ErsTypes types(fileName_);
   ROI_Obj roi;
@@ -275,6 +279,7 @@ int Envisat_DorVor::getTimeStop(double* t) {
 }
 
 int Envisat_DorVor::getDorVor(double time, const std::string& path) {
+  CheckedCall cc("Envisat_DorVor::getDorVor()");
   if (time < 0.0 || path.empty()) return 1;
   DirHandle dir(opendir(path.c_str()));
   if (!dir) return 1;
@@ -313,6 +318,7 @@ int Envisat_level0::getTimeStop(double* t) {
 }
 
 int Envisat_level0::getAuxFiles(int selector, const std::string& path) {
+  CheckedCall cc("Envisat_level0::getAuxFiles()");
   double start = 0.0;
   if (int st = getTimeStart(&start); st != 0) {
     ORV_REPORT_CALLED_ERROR();

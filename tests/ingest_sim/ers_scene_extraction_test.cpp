@@ -269,3 +269,32 @@ TEST_F(ErsSceneTest, OrbitArcFoundFromTheArchive) {
   EXPECT_EQ(product.getOrbitFilename(), sim->odrPath(dir_.string()));
   EXPECT_EQ(product.isAuxValid(3), 1);
 }
+
+TEST_F(ErsSceneTest, WholeRunFromAParameterDocument) {
+  const auto sim = write();
+  const std::string doc = (dir_ / "job.xml").string();
+  {
+    ATERSExtractor setup;
+    aim(setup, *sim);
+    setup.ReportFilename = (dir_ / "ers.report").string();
+    ASSERT_EQ(setup.writepar(doc, 1), 0);
+  }
+  ATERSExtractor x;
+  ASSERT_EQ(x.runall(doc, 1), 0);
+  EXPECT_EQ(x.LeaFilename, sim->leaderPath(dir_.string()));
+  EXPECT_EQ(x.getVectorLength(), kLines);
+  EXPECT_TRUE(fs::exists(out() + ".hdr"));
+  EXPECT_TRUE(fs::exists(out() + ".chirp"));
+
+  // A document that points to a configuration file is left to it: nothing runs.
+  const std::string conf = (dir_ / "conf.xml").string();
+  std::ofstream(conf) << "<OrvaneXmlDoc><NumberOfChannels>1</NumberOfChannels><Description>x</Description>"
+                         "<Channel Number=\"1\"><ATERSExtractor>"
+                         "<ConfigurationFile>other.xml</ConfigurationFile>"
+                         "</ATERSExtractor></Channel></OrvaneXmlDoc>";
+  fs::remove(out());
+  ATERSExtractor y;
+  EXPECT_EQ(y.runall(conf, 1), 1);
+  EXPECT_FALSE(fs::exists(out()));
+  EXPECT_EQ(y.getSwstVector(), nullptr);
+}
