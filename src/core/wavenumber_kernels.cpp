@@ -11,13 +11,9 @@
 #include "base/status.h"
 #include "core/azimuth_block.h"
 #include "core/fft.h"
+#include "core/stolt_interpolation.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
-
-#if __has_include("core/stolt_interpolation.h")
-#include "core/stolt_interpolation.h"
-#define WK_HAVE_STOLT 1
-#endif
 
 namespace {
 
@@ -361,17 +357,12 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out) {
   if (par.interp == 0) {
     st = FastWK(par, kx.data(), kx2.data(), dk.data(), az, rg);
   } else {
-#ifdef WK_HAVE_STOLT
     if (par.interp == 1)
       st = ChirpInterpWK(par, padded, fftlen, outsamples, kx.data(), kx2.data(), dk.data(),
                          spacing, az, rg);
     else
       st = LSInterpWK(par, padded, fftlen, outsamples, kx.data(), kx2.data(), dk.data(), spacing,
                       az, rg);
-#else
-    ORV_REPORT("Stolt interpolation kernels not available in this build", REPORT_ERROR);
-    st = STATUS_BAD_CONDITION;
-#endif
   }
   if (st != 0) ORV_REPORT_CALLED_ERROR();
   return st;

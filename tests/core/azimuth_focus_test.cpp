@@ -112,7 +112,9 @@ Focused focusScene(const Geometry& g, const AzimuthFocusConf& conf) {
 
 void checkTargets(const Geometry& g, const AzimuthFocusConf& conf, const Focused& f) {
   const double lam = g.lambda();
-  const double pa = conf.AzimuthWindowHammingParameter, pr = conf.RangeWindowHammingParameter;
+  // The chirp-z kernel leaves the range window out.
+  const double pa = conf.AzimuthWindowHammingParameter;
+  const double pr = conf.PerformInterpolation == 1 ? 1.0 : conf.RangeWindowHammingParameter;
   const double azlook = conf.AzimuthLookBandwidth, rglook = conf.RangeLookBandwidth;
   const Profile thAz = theoryProfile([&](double u) {
     const double f = std::fabs(u * g.prf);
@@ -162,6 +164,19 @@ TEST(AzimuthFocusPointTargets, ErsLikeCentroidFocusesAtZeroDoppler) {
   EXPECT_DOUBLE_EQ(f.scene.rgSpacing, 149896229.0 / g.frg);
   EXPECT_DOUBLE_EQ(f.scene.centroid, 300.0);
   checkTargets(g, conf, f);
+}
+
+TEST(AzimuthFocusPointTargets, StoltKernelsThroughTheDriver) {
+  Geometry g;
+  g.dc = 300.0;
+  for (int interp : {1, 7}) {
+    SCOPED_TRACE(testing::Message() << "PerformInterpolation " << interp);
+    AzimuthFocusConf conf = sceneConf(g);
+    conf.PerformInterpolation = interp;
+    conf.StoltPadding = 0.4;
+    const Focused f = focusScene(g, conf);
+    checkTargets(g, conf, f);
+  }
 }
 
 TEST(AzimuthFocusPointTargets, CentroidNearHalfPrfFocusesAtZeroDoppler) {
