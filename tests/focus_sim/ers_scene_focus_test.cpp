@@ -1,0 +1,191 @@
+// A simulated ERS scene through the ERS focuser: extraction, range
+// focusing, Doppler estimation, geometry and azimuth focusing to an SLC
+// with its record.
+#include <gtest/gtest.h>
+#include <stdlib.h>
+#include <unistd.h>
+
+#include <cmath>
+#include <complex>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "diag/ckerr.h"
+#include "diag/environment.h"
+#include "diag/report.h"
+#include "focus/level0_focusers.h"
+#include "product/data_set_info.h"
+#include "product/general_sar.h"
+#include "sim/raw_scene.h"
+
+namespace {
+
+class ErsSceneFocus : public ::testing::Test {
+ protected:
+  void SetUp() override {
+    const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
+    dir_ = std::filesystem::path(::testing::TempDir()) /
+           ("tessivor_focus_sim_" + std::to_string(getpid()) + "_" + info->name());
+    std::filesystem::remove_all(dir_);
+    std::filesystem::create_directories(dir_);
+    working_ = dir_.string() + "/";
+    setenv("TESSIVOR_WORKING_DIR", working_.c_str(), 1);
+    setenv("TESSIVOR_WORKING_FILE", "progress.txt", 1);
+    setenv("TESSIVOR_CEOS_DES_FILES_DIR", TESSIVOR_SOURCE_DIR "/resources/", 1);
+    setenv("TESSIVOR_TRACING", "ACTIVE", 1);
+    resetEnvironment();
+    exit_ckerr();
+    initEnvironment();
+    init_ckerr_locking();
+    init_report(0, "TEST", 1);
+    cwd_ = std::filesystem::current_path();
+    std::filesystem::current_path(dir_);  // the Doppler log lands in "."
+  }
+  void TearDown() override {
+    std::filesystem::current_path(cwd_);
+    resetEnvironment();
+    exit_ckerr();
+    set_flg_report(0);
+    std::filesystem::remove_all(dir_);
+  }
+
+  static SceneDescription scene() {
+    std::string error;
+    SceneDescription s;
+    EXPECT_TRUE(SceneDescription::load(TESSIVOR_SOURCE_DIR "/tests/sim/data/ers2_small_scene.txt",
+                                       s, error))
+        << error;
+    s.samples = 2048;
+    s.pixelTargets = {{1500.25, 300.5, 0.0, 4.0},
+                      {2048.0, 1000.0, 120.0, 4.0},
+                      {2600.75, 1250.25, 0.0, 4.0}};
+    return s;
+  }
+
+  // The ERS profile of the resources with the range registration kept as
+  // range-compressed (no automatic range shift).
+  std::string profile() const {
+    std::ifstream in(TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr");
+    std::ofstream out(working_ + "parameters_ERS.hdr");
+    std::string line;
+    while (std::getline(in, line)) {
+      if (line.rfind("ApplyRgShift", 0) == 0) line = "ApplyRgShift = 0.0";
+      out << line << "\n";
+    }
+    return working_ + "parameters_ERS.hdr";
+  }
+
+  std::string trace() const {
+    std::ifstream in(working_ + "Process.trace");
+    return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+  }
+
+  std::filesystem::path dir_, cwd_;
+  std::string working_;
+};
+
+// Peak of |x| in a window of the SLC around (line, sample).
+void findPeak(const std::string& raster, int samples, int lines, double line, double sample,
+              int* peakLine, int* peakSample) {
+  std::ifstream in(raster, std::ios::binary);
+  const int l0 = std::max(0, static_cast<int>(line) - 16);
+  const int l1 = std::min(lines, static_cast<int>(line) + 17);
+  const int s0 = std::max(0, static_cast<int>(sample) - 16);
+  const int s1 = std::min(samples, static_cast<int>(sample) + 17);
+  double best = -1.0;
+  std::vector<std::complex<float>> row(samples);
+  for (int l = l0; l < l1; ++l) {
+    in.seekg(static_cast<std::streamoff>(l) * samples * 8);
+    in.read(reinterpret_cast<char*>(row.data()), static_cast<std::streamsize>(samples) * 8);
+    for (int s = s0; s < s1; ++s)
+      if (std::abs(row[s]) > best) {
+        best = std::abs(row[s]);
+        *peakLine = l;
+        *peakSample = s;
+      }
+  }
+}
+
+TEST_F(ErsSceneFocus, SimulatedSceneBecomesAFocusedProduct) {
+  RawSceneSimulator sim(scene());
+  std::string error;
+  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+
+  ersLevel0Focuser f;
+  f.level0Filename = sim.imagePath(dir_.string());
+  f.LEAFilename = sim.leaderPath(dir_.string());
+  f.orbitFilename = sim.odrPath(dir_.string());
+  f.configurationFilename = profile();
+  f.outputFilename = working_ + "out";
+  testing::internal::CaptureStdout();
+  const int status = f.run();
+  const std::string printed = testing::internal::GetCapturedStdout();
+  ASSERT_EQ(status, 0) << trace();
+  EXPECT_NE(printed.find("- finalize \n"), std::string::npos);
+  // The stages in their order.
+  const std::string t = trace();
+  size_t at = 0;
+  for (const char* stage :
+       {"Initialization completed", "Starting ingestion", "ERS image extracted",
+        "ERS focuser doesn't do anything in the preprocessor module",
+        "STRIPMAP RAW DATA DETECTED, FOCUSSING...", "Range Focusing", "DC Estimation",
+        "GEOMETRIC POLYNOMIALS COMPUTATION", "Azimuth Focusing", "Writing headers",
+        "sar focuser ended successfully", "ERS focuser doesn't do anything in the postprocessor"}) {
+    const size_t next = t.find(stage, at);
+    EXPECT_NE(next, std::string::npos) << stage;
+    if (next != std::string::npos) at = next;
+  }
+  for (const char* name : {"out", "out.hdr", "out.extracted", "out.extracted.hdr", "out.chirp",
+                           "out.rgfoc", "out.rgfoc.hdr"})
+    EXPECT_TRUE(std::filesystem::exists(working_ + name)) << name;
+
+  // Range-focused record.
+  GeneralSAR rg;
+  ASSERT_EQ(rg.GSread(working_ + "out.rgfoc.hdr"), 0);
+  EXPECT_TRUE(rg.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED));
+  EXPECT_EQ(rg.dataSetInfo.Description, "StripMap Range Focused Image File");
+  EXPECT_EQ(rg.dataFile.NrOfPixelsPerLine, 2048 - sim.replicaLength() + 1);
+  EXPECT_NEAR(rg.polynomials.EvaluateDC(rg.roi.roi.FastStartTime, rg.roi.roi.SlowStartTime),
+              180.0, 0.02 * sim.scene().prfHz);
+  // ERS Doppler rate: about -2000 to -2200 Hz/s.
+  const double fr = rg.polynomials.EvaluateFR(rg.roi.roi.FastStartTime, rg.roi.roi.SlowStartTime);
+  EXPECT_LT(fr, -1900.0);
+  EXPECT_GT(fr, -2300.0);
+
+  // Focused record.
+  GeneralSAR slc;
+  ASSERT_EQ(slc.GSread(working_ + "out.hdr"), 0);
+  const DataSetInfo_Obj& info = slc.dataSetInfo;
+  EXPECT_TRUE(info.IsImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED));
+  EXPECT_EQ(info.Description, "StripMap level 1 Image File");
+  EXPECT_EQ(info.ProcessingSoftware, "SARFocuser v1.0");
+  EXPECT_EQ(info.ProcessingCenter, "Orvane - Lumbrao");
+  EXPECT_EQ(slc.spectralWindows.AzMatchedFilterType, "HAMMING");
+  EXPECT_NEAR(slc.attitude.Mean_DC, 180.0, 0.02 * sim.scene().prfHz);
+  EXPECT_GT(slc.attitude.Eq_speed, 6800.0);
+  EXPECT_LT(slc.attitude.Eq_speed, 7300.0);
+  EXPECT_EQ(slc.swath.Rank, -1);
+  EXPECT_NE(slc.geoCoords.center.lat, -999.0);
+  const ROI_Obj& roi = slc.roi.roi;
+  const int samples = slc.dataFile.NrOfPixelsPerLine, lines = slc.dataFile.NrOfLinesPerImage;
+  ASSERT_GT(samples, 0);
+  ASSERT_GT(lines, 0);
+  EXPECT_EQ(std::filesystem::file_size(working_ + "out"),
+            static_cast<std::uintmax_t>(samples) * lines * 8);
+
+  // Every target is focused within a pixel of its zero-Doppler truth.
+  for (const TargetTruth& t : sim.truth()) {
+    const double line = (t.azimuthTime - roi.SlowStartTime) / roi.SlowTimeDelta;
+    const double sample =
+        (t.rangeTime - roi.FastStartTime) / roi.FastTimeDelta + sim.rangePeakOffset();
+    int pl = -1, ps = -1;
+    findPeak(working_ + "out", samples, lines, line, sample, &pl, &ps);
+    EXPECT_NEAR(pl, line, 1.0) << "target at raw line " << t.line;
+    EXPECT_NEAR(ps, sample, 1.0) << "target at raw line " << t.line;
+  }
+}
+
+}  // namespace
