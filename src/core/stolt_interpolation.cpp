@@ -98,6 +98,11 @@ struct StoltGrid {
 
   // First and last output wavenumber index inside [lo, hi] (ihi < ilo: none).
   void usable(double lo, double hi, int& ilo, int& ihi) const {
+    if (std::isnan(lo) || std::isnan(hi)) {  // row beyond the geometric limit
+      ilo = 0;
+      ihi = -1;
+      return;
+    }
     lo = std::max(lo, kzs);
     hi = std::min(hi, kze);
     ilo = static_cast<int>(std::ceil((lo - kzs) / dkz));
@@ -169,8 +174,10 @@ struct RowBuffers {
   FFTBuffer a, b;
 };
 
-bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const char* who) {
+bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
+                const double* kx2, const double* dk, const char* who) {
   const bool ok = par.lines >= 1 && par.samples >= 1 && padded >= 1 && M >= 1 && n >= 1 &&
+                  kx && kx2 && dk &&
                   n <= M && (par.scale == 1.0 ? par.data && n <= par.samples
                                               : par.data && par.out);
   if (!ok) {
@@ -213,7 +220,7 @@ double gainOf(bool active, const std::vector<double>& rowN, const std::vector<do
 
 int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
                   const double* kx2, const double* dk, double spacing, double az, double rg) {
-  if (!checkSizes(par, padded, M, n, __func__)) return STATUS_BAD_CONDITION;
+  if (!checkSizes(par, padded, M, n, kx, kx2, dk, __func__)) return STATUS_BAD_CONDITION;
   const int nl = par.lines, ns = par.samples;
   const int sign = par.conj ? -1 : 1;
 
@@ -339,8 +346,7 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
 
 int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
                const double* kx2, const double* dk, double spacing, double az, double rg) {
-  (void)dk;
-  if (!checkSizes(par, padded, M, n, __func__)) return STATUS_BAD_CONDITION;
+  if (!checkSizes(par, padded, M, n, kx, kx2, dk, __func__)) return STATUS_BAD_CONDITION;
   const int H = par.interp;
   if (H < 1 || padded < par.samples) {
     ORV_REPORT("LSInterpWK: bad filter half-length or padded length", REPORT_ERROR);
