@@ -339,11 +339,6 @@ int SARFocuser::process() {
     ORV_REPORT("Cannot read the raw data record " + RawDataFile + ".hdr", REPORT_ERROR);
     return calledError(st);
   }
-  DataFile chirpFile;
-  if (int st = chirpFile.read_hdr(ChirpFile); st != 0) {
-    ORV_REPORT("Cannot read the chirp header " + ChirpFile + ".hdr", REPORT_ERROR);
-    return calledError(st);
-  }
 
   const SamplingConstants_Obj& smp = rawRecord.sampling;
   const ROI_Obj& rawRoi = rawRecord.roi;
@@ -372,6 +367,11 @@ int SARFocuser::process() {
   if (conf.ApplyRgShift == 1.0) conf.ApplyRgShift = ctx.samples;
 
   // The whole replica in memory.
+  DataFile chirpFile;
+  if (int st = chirpFile.read_hdr(ChirpFile); st != 0) {
+    ORV_REPORT("Cannot read the chirp header " + ChirpFile + ".hdr", REPORT_ERROR);
+    return calledError(st);
+  }
   std::vector<fcomplex> chirp;
   try {
     chirp.assign(std::max(chirpFile.NrOfPixelsPerLine, 0), fcomplex(0.0f, 0.0f));
@@ -485,6 +485,10 @@ int SARFocuser::process() {
     state.fftAzPrc = conf.Fftazprc;
     state.dswst = conf.Dswst;
     state.verbose = conf.Verbose;
+    if (conf.Incore) {
+      state.inMemory = 1;
+      state.data = rw.data.data();
+    }
     ORV_REPORT("DC Estimation", REPORT_CHECKPOINT);
     double c[7] = {0, 0, 0, 0, 0, 0, 0};
     if (int st = estimateCentroid(in, state, c); st != 0) return calledError(st);

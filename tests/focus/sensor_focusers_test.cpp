@@ -4,6 +4,7 @@
 #include "focus/sar_focuser.h"
 #include "focus_fixture.h"
 #include "ingest/ers_extractor.h"
+#include "product/data_set_info.h"
 
 namespace {
 
@@ -168,6 +169,35 @@ TEST_F(SensorFocusers, MissingRawDataIsFatalWhileReportsAreOn) {
   EXPECT_EXIT(chain.run(), testing::ExitedWithCode(1305605 & 0xff), "");
   set_flg_report(0);
   EXPECT_EQ(chain.run(), 10);
+}
+
+}  // namespace
+
+namespace {
+
+TEST_F(SensorFocusers, WholeImageShiftSentinelIsExactlyOne) {
+  const int lines = 10, samples = 8;
+  writeRaster(path("raw"), lines, samples, std::vector<fcomplex>(lines * samples),
+              DataSetInfo_Obj::IT_RAW_DATA, std::vector<float>(lines, 1.0e-4f));
+  writeText(path("chirp"), "no header beside it");
+  SARFocuser_conf conf;
+  conf.clear();
+  SARFocuser chain(&conf);
+  chain.RawDataFile = path("raw");
+  chain.ChirpFile = path("chirp");
+  chain.OutputFilename = path("out");
+  // The chain stops at the replica, after the shifts were taken.
+  conf.ApplyAzShift = 1.0;
+  conf.ApplyRgShift = 1.0;
+  EXPECT_NE(chain.run(), 0);
+  EXPECT_DOUBLE_EQ(conf.ApplyAzShift, lines);
+  EXPECT_DOUBLE_EQ(conf.ApplyRgShift, samples);
+  conf.ApplyAzShift = 1.000001;
+  conf.ApplyRgShift = -1.0;
+  EXPECT_NE(chain.run(), 0);
+  EXPECT_DOUBLE_EQ(conf.ApplyAzShift, 1.000001);
+  EXPECT_DOUBLE_EQ(conf.ApplyRgShift, -1.0);
+  EXPECT_FALSE(std::filesystem::exists(path("out.rgfoc")));
 }
 
 }  // namespace
