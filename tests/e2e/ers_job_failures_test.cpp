@@ -115,3 +115,38 @@ TEST(ErsJobFailures, ArcListThatDoesNotCoverTheSceneIsReported) {
   EXPECT_TRUE(contains(run.log, "INPUT FILE 1")) << run.log;
   EXPECT_FALSE(fs::exists(dir / "out.extracted"));
 }
+TEST(ErsJobFailures, TruncatedImageFileEndsTheExtraction) {
+  Folder dir("truncated");
+  SceneFiles files;
+  std::string error;
+  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  // Cut in the middle of a line, about half-way through the scene.
+  const std::uintmax_t size = fs::file_size(files.image);
+  fs::resize_file(files.image, size / 2 + 7);
+  writeJob(dir / "job.txt", ersJob(files, dir / "out"));
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  expectStageFailure(run, "run()");
+  EXPECT_TRUE(contains(run.log, "File reading failed!")) << run.log;
+  EXPECT_FALSE(fs::exists(dir / "out.rgfoc"));
+}
+
+TEST(ErsJobFailures, OrbitArcThatDoesNotCoverTheSceneEndsTheExtraction) {
+  Folder dir("short_arc");
+  SceneFiles files, later;
+  std::string error;
+  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  // The arc of a pass ten days later.
+  SceneDescription other = smallScene();
+  other.lines = 64;
+  other.startTime += 10 * 86400.0;
+  other.orbit.epoch = other.startTime;
+  ASSERT_TRUE(simulate(other, dir / "later/", later, error)) << error;
+  std::vector<std::string> p = ersJob(files, dir / "out");
+  p[6] = later.orbit;
+  writeJob(dir / "job.txt", p);
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  expectStageFailure(run, "run()");
+  EXPECT_TRUE(contains(run.log, "does not cover the image orbit")) << run.log;
+  EXPECT_TRUE(contains(run.log, later.orbit)) << run.log;
+  EXPECT_FALSE(fs::exists(dir / "out.rgfoc"));
+}
