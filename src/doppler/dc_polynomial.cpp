@@ -193,6 +193,32 @@ int getdccoef(const DcEstInput& input, DcEstState& st, const double lin[3], doub
   NrVector<int> ia(1, 7);
   NrMatrix<double> covar(1, 7, 1, 7);
   for (int i = 0; i < 7; ++i) ia[i + 1] = st.polMask[i] ? 1 : 0;
+  // A term the bin positions cannot tell apart from the others (a range
+  // power not below the number of distinct bin ranges, an azimuth term with
+  // a single bin row) would make the normal equations singular and the
+  // polynomial swing freely between the bins: it is left out.
+  {
+    std::vector<int> ranges, lines;
+    for (const DcBin& b : st.bins)
+      if (b.valid) {
+        ranges.push_back(b.range);
+        lines.push_back(b.line);
+      }
+    std::sort(ranges.begin(), ranges.end());
+    std::sort(lines.begin(), lines.end());
+    const long nr = std::unique(ranges.begin(), ranges.end()) - ranges.begin();
+    const long nl = std::unique(lines.begin(), lines.end()) - lines.begin();
+    // Terms 1, r, l, r l, r^2, r^3, r^4: distinct ranges and lines needed.
+    const long needR[7] = {1, 2, 1, 2, 3, 4, 5};
+    const long needL[7] = {1, 1, 2, 2, 1, 1, 1};
+    for (int i = 0; i < 7; ++i)
+      if (ia[i + 1] && (nr < needR[i] || nl < needL[i])) {
+        ia[i + 1] = 0;
+        ORV_REPORT("getdccoef: Doppler polynomial term " + std::to_string(i) +
+                       " left out, too few distinct bin positions",
+                   REPORT_WARNING);
+      }
+  }
   int j = 0;
   for (const DcBin& b : st.bins) {
     if (!b.valid) continue;

@@ -114,6 +114,35 @@ TEST(DcPolynomial, RecoversKnownPolynomialAndMask) {
   }
 }
 
+TEST(DcPolynomial, TermsTheBinsCannotDetermineAreLeftOut) {
+  // Four bin columns cannot fix a quartic in range: without care the fit
+  // passes through the bins and swings between them.
+  const double truth[7] = {0.2, 3e-5, -1e-5, 0.0, 1e-8, -1e-12, 0.0};
+  BinScene s(truth);
+  for (DcBin& b : s.st.bins) {
+    const int ix = (b.range - 128) / 256;
+    b.valid = (ix % 5 == 0) ? 1 : 0;
+  }
+  double poly[7];
+  ASSERT_EQ(dcnapoly(s.input, s.st, poly), 0);
+  EXPECT_EQ(poly[6], 0.0);
+  const double k = std::round(physValue(poly, 0.0, 0.0) / kPrf - truth[0]);
+  for (int r = 128; r <= 3968; r += 160)
+    EXPECT_NEAR(physValue(poly, r / kFs, 5000 / kPrf), kPrf * (dcPolyValue(truth, r, 5000) + k),
+                1e-4 * kPrf)
+        << r;
+
+  // A single bin row: no azimuth terms.
+  const double flat[7] = {0.1, 2e-5, 0, 0, 0, 0, 0};
+  BinScene row(flat);
+  for (DcBin& b : row.st.bins) b.valid = b.line == 1024 ? 1 : 0;
+  ASSERT_EQ(dcnapoly(row.input, row.st, poly), 0);
+  EXPECT_EQ(poly[3], 0.0);
+  EXPECT_NEAR(physValue(poly, 1000 / kFs, 0.0), kPrf * (dcPolyValue(flat, 1000, 0) +
+                                                        std::round(poly[0] / kPrf - 0.1)),
+              1e-4 * kPrf);
+}
+
 TEST(DcPolynomial, GeometricAmbiguityIsAddedToTheConstant) {
   const double truth[7] = {0.3, 2e-5, -1e-5, 0, 0, 0, 0};
   BinScene s(truth);
