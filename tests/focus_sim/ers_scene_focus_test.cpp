@@ -19,6 +19,7 @@
 #include "focus/level0_focusers.h"
 #include "product/data_set_info.h"
 #include "product/general_sar.h"
+#include "product/general_sar_configuration.h"
 #include "sim/raw_scene.h"
 
 namespace {
@@ -183,6 +184,89 @@ TEST_F(ErsSceneFocus, SimulatedSceneBecomesAFocusedProduct) {
         (t.rangeTime - roi.FastStartTime) / roi.FastTimeDelta + sim.rangePeakOffset();
     int pl = -1, ps = -1;
     findPeak(working_ + "out", samples, lines, line, sample, &pl, &ps);
+    EXPECT_NEAR(pl, line, 1.0) << "target at raw line " << t.line;
+    EXPECT_NEAR(ps, sample, 1.0) << "target at raw line " << t.line;
+  }
+}
+
+TEST_F(ErsSceneFocus, ModularStepsFocusTheSceneFromAConfigurationDocument) {
+  RawSceneSimulator sim(scene());
+  std::string error;
+  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+
+  // The processing configuration as a parameter document.
+  GeneralSAR_configuration c;
+  AzimuthConf& a = c.azimuthConf;
+  a.AntennaLength = 9.45f;
+  a.WhiteningFlag = 1;
+  a.RangeWindowHammingParameter = a.AzimuthWindowHammingParameter = 0.75f;
+  a.RangeLookBandwidth = a.AzimuthLookBandwidth = 0.8f;
+  a.RangeTransitionBandwidth = a.AzimuthTransitionBandwidth = 0.8f;
+  a.LinesInBlock = 8192;
+  a.SamplesInBlock = 1024;
+  a.AzimuthOverlap = 2560;
+  a.RangeOverlap = 64;
+  a.PerformInterpolation = 7;
+  a.ApplyAzShift = 1;  // whole image: automatic azimuth registration
+  a.ApplyRgShift = 0;
+  DCestConf& d = c.dcestConf;
+  d.Blocks = 256;
+  d.Blockl = 1024;
+  d.Dswst = 0;
+  d.RgBand = 0.82f;
+  d.Minamb = -3.0f;
+  d.Maxamb = 3.0f;
+  const int weights[7] = {1, 1, 1, 0, 0, 0, 0};
+  for (int i = 0; i < 7; ++i) d.Pol_weights[i] = weights[i];
+  generalProcessingConf& g = c.generalConf;
+  g.Flag_rangefoc = g.Flag_dcest = g.Flag_azimuthfoc = g.Flag_ortog = 1;
+  g.Memory = 300;
+  for (auto o : {GeneralSAR_configuration::GSC_AZIMUTH, GeneralSAR_configuration::GSC_DCEST,
+                 GeneralSAR_configuration::GSC_GENERAL})
+    c.GSenable(o);
+  const std::string doc = working_ + "processing.xml";
+  ASSERT_EQ(c.GSwrite(doc, 0), 0);
+
+  ersLevel0Focuser f;
+  f.level0Filename = sim.imagePath(dir_.string());
+  f.LEAFilename = sim.leaderPath(dir_.string());
+  f.orbitFilename = sim.odrPath(dir_.string());
+  f.configurationFilename = doc;
+  f.outputFilename = working_ + "mod";
+  testing::internal::CaptureStdout();
+  const int status = f.run_modular();
+  testing::internal::GetCapturedStdout();
+  ASSERT_EQ(status, 0) << trace();
+  EXPECT_EQ(f.Memory, 300);
+
+  // The extracted raster was aligned in place.
+  GeneralSAR raw;
+  ASSERT_EQ(raw.GSread(working_ + "mod.extracted.hdr"), 0);
+  EXPECT_TRUE(raw.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA_ALIGNED));
+  EXPECT_EQ(raw.dataFile.RowPrefix, 0);
+  EXPECT_TRUE(std::filesystem::exists(working_ + "DCEST_resume.txt"));
+
+  GeneralSAR rg;
+  ASSERT_EQ(rg.GSread(working_ + "mod.rgfoc.hdr"), 0);
+  EXPECT_NEAR(rg.polynomials.EvaluateDC(rg.roi.roi.FastStartTime, rg.roi.roi.SlowStartTime),
+              180.0, 0.02 * sim.scene().prfHz);
+  const double fr = rg.polynomials.EvaluateFR(rg.roi.roi.FastStartTime, rg.roi.roi.SlowStartTime);
+  EXPECT_LT(fr, -1900.0);
+  EXPECT_GT(fr, -2300.0);
+
+  GeneralSAR slc;
+  ASSERT_EQ(slc.GSread(working_ + "mod.hdr"), 0);
+  EXPECT_TRUE(slc.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED));
+  const ROI_Obj& roi = slc.roi.roi;
+  const int samples = slc.dataFile.NrOfPixelsPerLine, lines = slc.dataFile.NrOfLinesPerImage;
+  ASSERT_GT(samples, 0);
+  ASSERT_GT(lines, 0);
+  for (const TargetTruth& t : sim.truth()) {
+    const double line = (t.azimuthTime - roi.SlowStartTime) / roi.SlowTimeDelta;
+    const double sample =
+        (t.rangeTime - roi.FastStartTime) / roi.FastTimeDelta + sim.rangePeakOffset();
+    int pl = -1, ps = -1;
+    findPeak(working_ + "mod", samples, lines, line, sample, &pl, &ps);
     EXPECT_NEAR(pl, line, 1.0) << "target at raw line " << t.line;
     EXPECT_NEAR(ps, sample, 1.0) << "target at raw line " << t.line;
   }
