@@ -113,28 +113,14 @@ float swstOf(int code) { return static_cast<float>(code * 2.10943e-07 + 0.005357
 
 }  // namespace
 
-TEST(ERSExtractorTest, ElementTableAndParameterDocument) {
-  TempFolder dir;
+TEST(ERSExtractorTest, ElementTable) {
   ATERSExtractor a;
   ASSERT_EQ(a.getNumberOfElements(), 10);
   const char* names[] = {"Memory", "ReportFilename", "ReportLevel", "Incore", "Verbose",
                          "ImgFilename", "LeaFilename", "OrbitFilename", "OutputFile", "ChirpFile"};
   for (int k = 0; k < 10; ++k) EXPECT_EQ(a.getElement(k).name, names[k]);
   EXPECT_EQ(a.ReportFilename, "ATERSExtractor.report");
-  EXPECT_EQ(a.Memory, 256);
   EXPECT_EQ(a.getSwstVector(), nullptr);
-  a.ImgFilename = "/data/DAT_01.001";
-  a.LeaFilename = "/data/LEA_01.001";
-  a.OutputFile = "/work/out.extracted";
-  a.Memory = 512;
-  ASSERT_EQ(a.writepar(dir / "par.xml", 1), 0);
-  ATERSExtractor b;
-  ASSERT_EQ(b.readpar(dir / "par.xml", 1), 0);
-  EXPECT_EQ(b.ImgFilename, a.ImgFilename);
-  EXPECT_EQ(b.LeaFilename, a.LeaFilename);
-  EXPECT_EQ(b.OutputFile, a.OutputFile);
-  EXPECT_EQ(b.Memory, 512);
-  EXPECT_EQ(b.ChirpFile, "");
 }
 
 TEST(ERSExtractorTest, RealLeaderFields) {
@@ -372,27 +358,4 @@ TEST(ERSExtractorTest, FailuresEndWithTheirStatus) {
   x.OutputFile = dir / "run_out";
   EXPECT_NE(x.run(), 0);
   EXPECT_FALSE(std::filesystem::exists(dir / "run_out"));
-}
-
-TEST(ERSExtractorTest, ChirpFromThePulse) {
-  TempFolder dir;
-  writeBytes(dir / "LEA_01.001", leader());
-  writeBytes(dir / "DAT_01.001", imageFile(2, {{1, 900, 0, 0}}));
-  ATERSExtractor x;
-  x.LeaFilename = dir / "LEA_01.001";
-  x.ImgFilename = dir / "DAT_01.001";
-  x.OutputFile = dir / "out.extracted";
-  x.ChirpFile = dir / "out.chirp";
-  ASSERT_EQ(x.readLeader(), 0);
-  ASSERT_EQ(x.readImage(), 0);
-  ASSERT_EQ(x.rawData.writehdr(), 0);
-  ASSERT_EQ(x.ExtractChirp(), 0);
-  // round(18.962468 MHz x 37.12 us) = 704 complex samples.
-  EXPECT_EQ(std::filesystem::file_size(dir / "out.chirp"), 704u * 8u);
-  EXPECT_TRUE(std::filesystem::exists(dir / "out.chirp.hdr"));
-  GeneralRAWData back;
-  ASSERT_EQ(back.readhdr(dir / "out.extracted.hdr"), 0);
-  EXPECT_DOUBLE_EQ(back.pulse.PulseLength, 37.12e-6);
-  EXPECT_EQ(back.roi.Lines, 1);
-  EXPECT_EQ(back.dataFile.RowPrefix, 4);
 }

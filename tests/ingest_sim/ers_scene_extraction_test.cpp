@@ -188,29 +188,6 @@ TEST_F(ErsSceneTest, DroppedLineAndCorruptWindowCode) {
   EXPECT_NEAR(r.dataSetInfo.SWST_MAX, double(prefixOf(sim->swstCode())), 1e-12);
 }
 
-TEST_F(ErsSceneTest, PartOfTheScene) {
-  const auto sim = write();
-  ATERSExtractor x;
-  aim(x, *sim);
-  x.ChirpFile.clear();
-  x.skipPercent = 25;
-  x.extractPercent = 50;
-  ASSERT_EQ(x.run(), 0);
-  EXPECT_FALSE(fs::exists(out() + ".chirp"));
-  ASSERT_EQ(x.getVectorLength(), kLines / 2);
-  EXPECT_EQ(x.getCounterVector()[0], kLines / 4 + 1);
-  const std::vector<unsigned char> iq = quantised(*sim);
-  const std::vector<float> raster = rasterRows(out());
-  const std::size_t row = 1 + 2 * std::size_t(kSamples);
-  ASSERT_EQ(raster.size(), row * (kLines / 2));
-  const std::size_t first = 2 * std::size_t(kLines / 4) * kSamples;
-  EXPECT_EQ(raster[1], static_cast<float>(iq[first]) - 15.5f);
-  EXPECT_EQ(raster[row * 10 + 7], static_cast<float>(iq[first + 20 * kSamples + 6]) - 15.5f);
-  GeneralRAWData r;
-  ASSERT_EQ(r.readhdr(out() + ".hdr"), 0);
-  EXPECT_NEAR(r.roi.SlowStartTime, sim->lineTime(kLines / 4), 1e-6);
-}
-
 TEST_F(ErsSceneTest, DamagedFilesEndWithStatus) {
   {
     // Image file cut inside a record.
