@@ -66,19 +66,6 @@ class ErsSceneFocus : public ::testing::Test {
     return s;
   }
 
-  // The ERS profile of the resources with the range registration kept as
-  // range-compressed (no automatic range shift).
-  std::string profile() const {
-    std::ifstream in(TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr");
-    std::ofstream out(working_ + "parameters_ERS.hdr");
-    std::string line;
-    while (std::getline(in, line)) {
-      if (line.rfind("ApplyRgShift", 0) == 0) line = "ApplyRgShift = 0.0";
-      out << line << "\n";
-    }
-    return working_ + "parameters_ERS.hdr";
-  }
-
   std::string trace() const {
     std::ifstream in(working_ + "Process.trace");
     return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
@@ -119,7 +106,7 @@ TEST_F(ErsSceneFocus, SimulatedSceneBecomesAFocusedProduct) {
   f.level0Filename = sim.imagePath(dir_.string());
   f.LEAFilename = sim.leaderPath(dir_.string());
   f.orbitFilename = sim.odrPath(dir_.string());
-  f.configurationFilename = profile();
+  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
   f.outputFilename = working_ + "out";
   testing::internal::CaptureStdout();
   const int status = f.run();
