@@ -115,77 +115,60 @@ const tesv_description_field* Service_kelmir::find(const tesv_description_sectio
   return f;
 }
 
-namespace {
-int mismatch(Service_kelmir& service, const tesv_description_field& f, const std::string& field) {
-  service.gsmReport("result", field,
-                    "Data Type ID : " + std::to_string(f.type) + " " + descriptionTypeText(f.type),
-                    "ERROR");
-  return STATUS_BAD_CONDITION;
+template <class Getter>
+int Service_kelmir::takeWith(const tesv_description_section& header, const std::string& field,
+                             bool mandatory, Getter get) {
+  const auto* f = find(header, field, mandatory);
+  if (!f) return STATUS_BAD_CONDITION;
+  if (get(*f) != 0) {
+    gsmReport("result", field,
+              "Data Type ID : " + std::to_string(f->type) + " " + descriptionTypeText(f->type), "ERROR");
+    return STATUS_BAD_CONDITION;
+  }
+  gsmReport("result", field, "read", "WARNING");
+  return STATUS_OK;
 }
-}  // namespace
 
 int Service_kelmir::take(const tesv_description_section& header, const std::string& field,
                          double& value, bool mandatory) {
-  const auto* f = find(header, field, mandatory);
-  if (!f) return STATUS_BAD_CONDITION;
-  if (f->getDouble(value) != 0) return mismatch(*this, *f, field);
-  gsmReport("result", field, "read", "WARNING");
-  return STATUS_OK;
+  return takeWith(header, field, mandatory, [&value](const tesv_description_field& f) { return f.getDouble(value); });
 }
 
 int Service_kelmir::take(const tesv_description_section& header, const std::string& field,
                          int& value, bool mandatory) {
-  const auto* f = find(header, field, mandatory);
-  if (!f) return STATUS_BAD_CONDITION;
-  if (f->getInt(value) != 0) return mismatch(*this, *f, field);
-  gsmReport("result", field, "read", "WARNING");
-  return STATUS_OK;
+  return takeWith(header, field, mandatory, [&value](const tesv_description_field& f) { return f.getInt(value); });
 }
 
 int Service_kelmir::take(const tesv_description_section& header, const std::string& field,
                          long long& value, bool mandatory) {
-  const auto* f = find(header, field, mandatory);
-  if (!f) return STATUS_BAD_CONDITION;
-  if (f->getInt(value) != 0) return mismatch(*this, *f, field);
-  gsmReport("result", field, "read", "WARNING");
-  return STATUS_OK;
+  return takeWith(header, field, mandatory, [&value](const tesv_description_field& f) { return f.getInt(value); });
 }
 
 int Service_kelmir::take(const tesv_description_section& header, const std::string& field,
                          std::string& value, bool mandatory) {
-  const auto* f = find(header, field, mandatory);
-  if (!f) return STATUS_BAD_CONDITION;
-  if (f->type == FT_STRING && f->strings.empty()) {
-    value.clear();
-  } else if (f->getString(value) != 0) {
-    return mismatch(*this, *f, field);
-  }
-  gsmReport("result", field, "read", "WARNING");
-  return STATUS_OK;
+  return takeWith(header, field, mandatory, [&value](const tesv_description_field& f) {
+    if (f.type == FT_STRING && f.strings.empty()) {  // an empty field is the empty text
+      value.clear();
+      return 0;
+    }
+    return f.getString(value);
+  });
 }
 
 int Service_kelmir::take(const tesv_description_section& header, const std::string& field,
                          std::vector<double>& values, bool mandatory) {
-  const auto* f = find(header, field, mandatory);
-  if (!f) return STATUS_BAD_CONDITION;
-  if (f->getDoubles(values) != 0) return mismatch(*this, *f, field);
-  gsmReport("result", field, "read", "WARNING");
-  return STATUS_OK;
+  return takeWith(header, field, mandatory, [&values](const tesv_description_field& f) { return f.getDoubles(values); });
 }
 
 int Service_kelmir::take(const tesv_description_section& header, const std::string& field,
                          std::vector<std::string>& values, bool mandatory) {
-  const auto* f = find(header, field, mandatory);
-  if (!f) return STATUS_BAD_CONDITION;
-  std::vector<std::string> out;
-  for (int i = 0; i < f->numberOfElements(); ++i) {
-    std::string v;
-    if (f->getString(v, i) != 0) return mismatch(*this, *f, field);
-    out.push_back(v);
-  }
-  values = std::move(out);
-  gsmReport("result", field, "read", "WARNING");
-  return STATUS_OK;
+  return takeWith(header, field, mandatory, [&values](const tesv_description_field& f) {
+    std::vector<std::string> out(static_cast<std::size_t>(f.numberOfElements()));
+    for (std::size_t i = 0; i < out.size(); ++i)
+      if (f.getString(out[i], static_cast<int>(i)) != 0) return 1;
+    values = std::move(out);
+    return 0;
+  });
 }
 
 // ---------------------------------------------------------------- raster layout

@@ -80,6 +80,9 @@ class Service_kelmir {
  private:
   const tesv_description_field* find(const tesv_description_section& header,
                                      const std::string& field, bool mandatory);
+  template <class Getter>
+  int takeWith(const tesv_description_section& header, const std::string& field, bool mandatory,
+               Getter get);
   std::string class_;
   std::string section_;
   std::vector<ReportEntry> report_;

@@ -166,8 +166,17 @@ TEST(DescriptionXml, WrittenLayoutAndRoundTrip) {
   EXPECT_EQ(pair->subFields[1].strings.at(0), "two");
   EXPECT_EQ(back.getField("UnknownToUs.Kept")->strings.at(0), "yes");
 
-  // The written document is valid against the shipped schema.
+  // The written document is valid against the shipped schema, and the
+  // schema is strict enough to refuse a broken one.
   EXPECT_EQ(validateAgainstSchema(file), 0);
+  std::string broken = text;
+  broken.replace(broken.find("MANDATORY = \"1\""), 15, "MANDATORY = \"2\"");
+  writeText(guard.dir + "broken.sml", broken);
+  EXPECT_GT(validateAgainstSchema(guard.dir + "broken.sml"), 0);
+  broken = text;
+  broken.replace(broken.find("<Value>4900</Value>"), 19, "<Value>4.5</Value>");
+  writeText(guard.dir + "broken.sml", broken);
+  EXPECT_GT(validateAgainstSchema(guard.dir + "broken.sml"), 0);
 }
 
 TEST(DescriptionXml, TemporaryEscapesAndOtherRoots) {
