@@ -259,4 +259,33 @@ TEST_F(ErsSceneFocus, ModularStepsFocusTheSceneFromAConfigurationDocument) {
   }
 }
 
+TEST_F(ErsSceneFocus, TruncatedImageFileEndsInTheExtractor) {
+  SceneDescription s = scene();
+  s.lines = 1024;
+  s.samples = 1024;
+  s.pixelTargets.clear();
+  s.truncateImageBytes = 11644 + 100 * (412 + 2 * 1024) + 50;
+  RawSceneSimulator sim(s);
+  std::string error;
+  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+
+  ersLevel0Focuser f;
+  f.level0Filename = sim.imagePath(dir_.string());
+  f.LEAFilename = sim.leaderPath(dir_.string());
+  f.orbitFilename = sim.odrPath(dir_.string());
+  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
+  f.outputFilename = working_ + "out";
+  testing::internal::CaptureStdout();
+  const int status = f.run();
+  const std::string printed = testing::internal::GetCapturedStdout();
+  EXPECT_EQ(status, 4);
+  const std::string t = trace();
+  EXPECT_NE(t.find("File reading failed!"), std::string::npos);
+  EXPECT_EQ(t.find("ERS image extracted"), std::string::npos);
+  EXPECT_EQ(t.find("Range Focusing"), std::string::npos);
+  EXPECT_EQ(printed.find("- finalize"), std::string::npos);
+  EXPECT_FALSE(std::filesystem::exists(working_ + "out.rgfoc"));
+  EXPECT_FALSE(std::filesystem::exists(working_ + "out.hdr"));
+}
+
 }  // namespace
