@@ -98,7 +98,9 @@ double wrapHalf(double v) {
 
 int hist_bin(double v, double min, double step) {
   if (!(step > 0.0)) return 0;
-  return static_cast<int>(roundHalfAway((v - min) / step));
+  const double b = (v - min) / step;
+  if (!std::isfinite(b)) return 0;
+  return static_cast<int>(roundHalfAway(std::clamp(b, -1e9, 1e9)));
 }
 
 int make_hist(const float* values, int n, double* step, double* min, int* hist, int nbins) {

@@ -655,6 +655,8 @@ int dcnapoly(DcEstInput& input, DcEstState& st, double poly[7]) {
   } else {
     if (amb != STATUS_BAD_CONDITION) ORV_REPORT_CALLED_ERROR();
     std::printf("\nWARNING: unresolved ambiguity!\n");
+    // The polynomial goes on without ambiguity, and the record says so.
+    st.ambiguity = 0;
   }
 
   // PRF units per sample and line to Hz per second.

@@ -475,6 +475,66 @@ void resolveFromData(double dc) {
   EXPECT_FALSE(wdar_ready());
 }
 
+TEST(DcAmbiguityEstimate, DecisionBetweenMlbfAndWdar) {
+  // A raster of exactly one block: the only admissible block is the whole.
+  ClutterScene sc;
+  sc.points = 20;
+  sc.pointAmp = 300.0;
+  const int ns = 256, nl = 2048;
+  const std::vector<fcomplex> raster = makeClutter(sc, ns, nl);
+  DcEstInput in;
+  in.samples = ns;
+  in.lines = nl;
+  in.prf = sc.prf;
+  in.velocity = sc.velocity;
+  const double poly[7] = {0.3, 0, 0, 0, 0, 0, 0};
+  auto run = [&](double varTh, int nWdar, std::string& out) {
+    DcEstState st = ersLikeState(sc);
+    st.ambFlag = 1;
+    st.nBest = 2;
+    st.nWdar = nWdar;
+    st.varTh = varTh;
+    st.inMemory = 1;
+    st.data = raster.data();
+    contrastMap(raster, ns, nl, st);
+    testing::internal::CaptureStdout();
+    const int status = estambiguity(st, in, poly);
+    out = testing::internal::GetCapturedStdout();
+    st.blockBuf.clear();
+    EXPECT_EQ(st.nBest, 1);
+    EXPECT_EQ(st.mlbfBlocks.at(0).range, 128);
+    EXPECT_EQ(st.mlbfBlocks.at(0).line, 1024);
+    return std::make_pair(status, st);
+  };
+  std::string out;
+  // MLBF spread above the limit: WDAR without offset correction, unresolved.
+  auto [s1, st1] = run(1e-9, 1, out);
+  EXPECT_EQ(s1, 1);
+  EXPECT_NE(out.find("\nWDAR results (NO offset correction!): mean "), std::string::npos) << out;
+  EXPECT_EQ(st1.ambiguity, std::lround(st1.wdarMean));
+  EXPECT_EQ(st1.wdarOffsetAvailable, 0);
+  // ... and without WDAR blocks.
+  auto [s2, st2] = run(1e-9, 0, out);
+  EXPECT_EQ(s2, 1);
+  EXPECT_NE(out.find("No WDAR blocks available. \n"), std::string::npos) << out;
+  // MLBF good, no WDAR block: resolved, no offset.
+  auto [s3, st3] = run(0.5, 0, out);
+  EXPECT_EQ(s3, 0);
+  EXPECT_EQ(st3.ambiguity, 1);
+  EXPECT_EQ(st3.wdarOffsetAvailable, 0);
+  EXPECT_NE(out.find("\nNo WDAR blocks available. Offset frequency estimation unavailable. \n"),
+            std::string::npos);
+  EXPECT_NE(out.find("\nMLBF results: mean "), std::string::npos);
+  // MLBF good with WDAR: the WDAR offset is measured against the MLBF
+  // ambiguity and removed from its mean.
+  auto [s4, st4] = run(0.5, 1, out);
+  EXPECT_EQ(s4, 0);
+  EXPECT_EQ(st4.ambiguity, 1);
+  EXPECT_EQ(st4.wdarOffsetAvailable, 1);
+  EXPECT_NEAR(st4.wdarMean, 1.0, 1e-12);
+  EXPECT_NEAR(st4.wdarBlocks.at(0).value, 1.0, 1e-12);
+}
+
 TEST(DcAmbiguityEstimate, MlbfResolvesTheAmbiguityOfASquintedScene) { resolveFromData(1.3); }
 
 TEST(HeavyDcAmbiguityEstimate, MlbfResolvesANegativeAmbiguity) { resolveFromData(-0.7); }
