@@ -84,7 +84,9 @@ void accumulateContrast(const fcomplex* block, int x0, int y0, DcEstState& st) {
 }
 
 // Scans one row of bins starting at line y0; `rows` points at its first line.
-void scanBinRow(const fcomplex* rows, int samples, int y0, int binRow, DcEstState& st) {
+// `done` counts the bins scanned so far for the wait bar.
+void scanBinRow(const fcomplex* rows, int samples, int y0, int binRow, DcEstState& st, int& done) {
+  const int total = st.nBinsX * st.nBinsY;
   for (int ix = 0; ix < st.nBinsX; ++ix) {
     const int x0 = ix * st.blocks;
     if (x0 + st.blocks > samples) break;
@@ -97,6 +99,8 @@ void scanBinRow(const fcomplex* rows, int samples, int y0, int binRow, DcEstStat
     bin.line = y0 + st.blockl / 2;
     dcBinEstimate(st.blockBuf.data(), st, bin);
     accumulateContrast(st.blockBuf.data(), x0, y0, st);
+    ++done;
+    if (st.verbose) waitbar_update(0, 100.0f * float(done) / float(total));
   }
 }
 
@@ -184,28 +188,28 @@ int dcTheoreticAutocorrelation(const DcEstInput& input, DcEstState& st) {
 // ---- scan ------------------------------------------------------------------------------
 
 void dcBinEstimate(const fcomplex* block, const DcEstState& st, DcBin& bin) {
+  // Sums along azimuth (down the columns), taken line by line for locality.
   double p = 0.0;
   double q = 0.0;
-  dcomplex r{};
+  double re = 0.0;
+  double im = 0.0;
   const int ns = st.blocks;
-  for (int s = 0; s < ns; ++s) {
-    // One azimuth line of the transposed block.
-    double re = 0.0;
-    double im = 0.0;
-    for (int l = 0; l < st.blockl; ++l) {
-      const fcomplex x = block[size_t(l) * ns + s];
-      const double a = std::norm(x);
+  for (int l = 0; l < st.blockl; ++l) {
+    const fcomplex* x = block + size_t(l) * ns;
+    for (int s = 0; s < ns; ++s) {
+      const double a = std::norm(x[s]);
       p += a;
       q += a * a;
-      if (l + 1 < st.blockl) {
-        const fcomplex y = block[size_t(l + 1) * ns + s];
-        // conj(x) y
-        re += double(x.real()) * y.real() + double(x.imag()) * y.imag();
-        im += double(x.real()) * y.imag() - double(x.imag()) * y.real();
-      }
     }
-    r += dcomplex(re, im);
+    if (l + 1 == st.blockl) break;
+    const fcomplex* y = x + ns;
+    for (int s = 0; s < ns; ++s) {
+      // conj(x) y
+      re += double(x[s].real()) * y[s].real() + double(x[s].imag()) * y[s].imag();
+      im += double(x[s].real()) * y[s].imag() - double(x[s].imag()) * y[s].real();
+    }
   }
+  const dcomplex r(re, im);
   bin.valid = 0;
   bin.dcWrapped = 0.0;
   bin.contrast = 0.0;
@@ -252,9 +256,7 @@ int getnadcbins(DcEstInput& input, DcEstState& st) {
     }
     for (int r = 0; r < rows; ++r) {
       scanBinRow(base + size_t(r) * binRowSamples, input.samples, (row0 + r) * st.blockl,
-                 row0 + r, st);
-      done += st.nBinsX;
-      if (st.verbose && total > 0) waitbar_update(0, 100.0f * float(done) / float(total));
+                 row0 + r, st, done);
     }
   }
   if (st.verbose) waitbar_close();
@@ -322,11 +324,10 @@ int getnadcpoly(DcEstInput& input, DcEstState& st, double poly[7]) {
 // ---- resume file ---------------------------------------------------------------------
 
 int infodump(const DcEstInput& input, const DcEstState& st, const double poly[7]) {
-  char path[1024];
-  std::snprintf(path, sizeof path, "%s/%s", input.outDir.c_str(), "DCEST_resume.txt");
+  const std::string path = input.outDir + "/" + "DCEST_resume.txt";
   {
-    FilePtr f(std::fopen(path, "w"));
-    if (!f) return DC_FAIL(std::string("File not opened! ") + path, STATUS_NOT_OPENED);
+    FilePtr f(std::fopen(path.c_str(), "w"));
+    if (!f) return DC_FAIL("File not opened! " + path, STATUS_NOT_OPENED);
   }
   if (int s = resumefile(path, input, st, poly); s != 0) return DC_CALLED(s);
   return STATUS_OK;

@@ -275,3 +275,51 @@ TEST(DcDriver, FailuresEndWithTheirStatuses) {
   }
   std::filesystem::remove_all(dir);
 }
+
+TEST(DcDriver, VerboseRunFromMemoryPrintsStepsAndPolynomial) {
+  const Radar rd;
+  const int ns = 512, nl = 1024;
+  const std::vector<fcomplex> data =
+      makeVaryingClutter(rd, Centroid{0.1, 0.1 / ns, 0.0}, ns, nl, 10.0, 8);
+  const std::string dir = tempDir("verbose");
+  DcEstState st = ersState(rd);
+  st.verbose = 1;
+  st.inMemory = 1;
+  st.data = data.data();
+  // No file may be opened: the path does not exist.
+  DcEstInput in = inputFor(rd, dir + "/absent", dir, ns, nl);
+  double poly[7] = {};
+  testing::internal::CaptureStdout();
+  const int status = getnadcpoly(in, st, poly);
+  const std::string out = testing::internal::GetCapturedStdout();
+  ASSERT_EQ(status, 0) << out;
+  const size_t a = out.find("* Setting Processable Buffer\n");
+  const size_t b = out.find("* Calculating first two samples of theoretic autocorrelation\n");
+  const size_t c = out.find("* Getting bins for polynomial estimation\n");
+  const size_t d = out.find("* Polynomial estimation\n");
+  ASSERT_NE(a, std::string::npos);
+  EXPECT_LT(a, b);
+  EXPECT_LT(b, c);
+  EXPECT_LT(c, d);
+  ASSERT_NE(d, std::string::npos);
+  const char* formats[7] = {"Constant term [Hz]: ............. %e\n",
+                            "I range [Hz/s]: ................. %e\n",
+                            "I azimuth [Hz/s]: ............... %e\n",
+                            "I range * I azimuth [Hz/s^2]: ... %e\n",
+                            "II range [Hz/s^2]: .............. %e\n",
+                            "III range [Hz/s^3]: ............. %e\n",
+                            "IV range [Hz/s^4]: .............. %e\n"};
+  size_t last = d;
+  for (int i = 0; i < 7; ++i) {
+    char line[128];
+    std::snprintf(line, sizeof line, formats[i], poly[i]);
+    const size_t at = out.find(line);
+    ASSERT_NE(at, std::string::npos) << line;
+    EXPECT_GT(at, last);
+    last = at;
+  }
+  // The read buffer is never allocated for a raster in memory.
+  EXPECT_TRUE(st.readBuf.empty());
+  EXPECT_TRUE(std::filesystem::exists(dir + "/DCEST_resume.txt"));
+  std::filesystem::remove_all(dir);
+}
