@@ -139,15 +139,17 @@ TEST(DcDriver, BinEstimatesMatchTheClutterStatistics) {
   const float mid = st.contrastMap[size_t(st.cmHeight / 2) * st.cmWidth + st.cmWidth / 2];
   EXPECT_NEAR(mid, 2.0, 0.15);
 
-  // The same raster from a file gives the same bins, and lines past the last
-  // whole bin row are left out.
+  // The same raster from a file behind a 96-byte header gives the same bins,
+  // and lines past the last whole bin row are left out.
   const std::string dir = tempDir("bins");
-  std::vector<fcomplex> longer = data;
-  longer.resize(data.size() + size_t(ns) * 100, fcomplex(100.0f, 0.0f));
+  std::vector<fcomplex> longer(12, fcomplex(-7.0f, 7.0f));
+  longer.insert(longer.end(), data.begin(), data.end());
+  longer.resize(longer.size() + size_t(ns) * 100, fcomplex(100.0f, 0.0f));
   ASSERT_TRUE(writeRaster(dir + "/r", longer));
   DcEstState sf = ersState(rd);
   sf.memory = int64_t(ns) * 256 * 8 * 3;  // three bin rows per read, the last read short
   DcEstInput fin = inputFor(rd, dir + "/r", dir, ns, nl + 100);
+  fin.headerOffset = 12 * 8;
   ASSERT_EQ(setprocbuf(fin, sf), 0);
   EXPECT_EQ(fin.lines, nl);
   EXPECT_EQ(sf.rowsPerRead, 3);
