@@ -313,6 +313,10 @@ TEST(DescriptionText, LayoutRoundTripAndKeptSections) {
     EXPECT_NE(error.find(file + " line 2"), std::string::npos) << error;
   }
   EXPECT_EQ(tesv_read_description_text(guard.dir + "absent_hdr", back), STATUS_NOT_OPENED);
+  // A line that does not fit a pool buffer is refused, not cut.
+  writeText(file, "[A]\nx = \"" + std::string(kWorkPoolBufferSize, 'y') + "\"\n");
+  EXPECT_EQ(tesv_read_description_text(file, back, &error), STATUS_READ_FAILED);
+  EXPECT_NE(error.find("longer than a pool buffer"), std::string::npos) << error;
   EXPECT_EQ(tesv_work_pool_busy(), 0);
 }
 
