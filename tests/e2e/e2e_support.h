@@ -22,6 +22,7 @@
 #include <vector>
 
 #include "base/status.h"
+#include "product/general_sar.h"
 #include "sim/raw_scene.h"
 
 namespace e2e {
@@ -299,6 +300,45 @@ inline PtaReport runSarpta(const std::string& folder, const std::vector<std::str
     report.targets.push_back(t);
   }
   return report;
+}
+
+inline std::string number(double v) {
+  char text[64];
+  std::snprintf(text, sizeof text, "%.17g", v);
+  return text;
+}
+
+// sarpta on a focused product with the time axes and spectral windows of
+// its record, against the truth of the simulation.
+inline PtaReport analyseProduct(const std::string& folder, const std::string& product,
+                                GeneralSAR& record, const std::string& truth) {
+  const ROI_Obj& roi = record.roi.roi;
+  const SpectralWindows_Obj& w = record.spectralWindows;
+  std::vector<std::string> args = {
+      "--raster", product, "--truth", truth, "--lines", std::to_string(roi.Lines), "--samples",
+      std::to_string(roi.Samples), "--first-line-time", number(roi.SlowStartTime),
+      "--line-time-step", number(roi.SlowTimeDelta), "--first-range-time",
+      number(roi.FastStartTime), "--range-time-step", number(roi.FastTimeDelta),
+      "--azimuth-window", number(w.AzMatchedFilterCoef), "--azimuth-band",
+      number(w.AzLookBandwidth), "--range-window", number(w.RgMatchedFilterCoef), "--range-band",
+      number(w.RgLookBandwidth)};
+  if (record.dataFile.ByteOrder == 1) args.push_back("--big-endian");
+  return runSarpta(folder, args);
+}
+
+// Impulse-response shape of every target against the theory of the
+// windows: IRW within 5 %, PSLR within 1 dB, on both axes.
+inline void expectTheoreticalResponses(const PtaReport& pta, std::size_t targets) {
+  ASSERT_EQ(pta.targets.size(), targets) << pta.table;
+  for (std::size_t i = 0; i < pta.targets.size(); ++i) {
+    const PtaTarget& t = pta.targets[i];
+    SCOPED_TRACE("target " + std::to_string(i + 1) + "\n" + pta.table);
+    ASSERT_TRUE(t.found);
+    EXPECT_NEAR(t.azimuth.irw / pta.theoryAzimuth.irw, 1.0, 0.05);
+    EXPECT_NEAR(t.range.irw / pta.theoryRange.irw, 1.0, 0.05);
+    EXPECT_NEAR(t.azimuth.pslr, pta.theoryAzimuth.pslr, 1.0);
+    EXPECT_NEAR(t.range.pslr, pta.theoryRange.pslr, 1.0);
+  }
 }
 
 // Spread of angles around their circular mean, radians.

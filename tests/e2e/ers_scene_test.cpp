@@ -37,12 +37,6 @@ double truthValue(const std::string& truthFile, const std::string& key) {
   return ini.getDouble("Scene", key, std::nan(""));
 }
 
-std::string number(double v) {
-  char text[64];
-  std::snprintf(text, sizeof text, "%.17g", v);
-  return text;
-}
-
 // Distance between two points on the ellipsoid, metres.
 double groundDistance(double lat1, double lon1, double lat2, double lon2) {
   return norm(geodeticToEcef(lat1, lon1, 0.0) - geodeticToEcef(lat2, lon2, 0.0));
@@ -86,33 +80,16 @@ TEST(ErsEndToEnd, FullSwathSceneFocusedWithinTheImageQualityBounds) {
   ASSERT_GT(roi.Samples, 4500);
   EXPECT_EQ(fs::file_size(product),
             static_cast<std::uintmax_t>(roi.Lines) * static_cast<std::uintmax_t>(roi.Samples) * 8u);
-  const SpectralWindows_Obj& windows = record.spectralWindows;
 
   // Point targets against the truth, with the theory of the product's
   // windows.
-  std::vector<std::string> args = {
-      "--raster", product, "--truth", files.truth, "--lines", std::to_string(roi.Lines),
-      "--samples", std::to_string(roi.Samples), "--first-line-time", number(roi.SlowStartTime),
-      "--line-time-step", number(roi.SlowTimeDelta), "--first-range-time",
-      number(roi.FastStartTime), "--range-time-step", number(roi.FastTimeDelta),
-      "--azimuth-window", number(windows.AzMatchedFilterCoef), "--azimuth-band",
-      number(windows.AzLookBandwidth), "--range-window", number(windows.RgMatchedFilterCoef),
-      "--range-band", number(windows.RgLookBandwidth)};
-  if (record.dataFile.ByteOrder == 1) args.push_back("--big-endian");
-  const PtaReport pta = runSarpta(dir.str(), args);
+  const PtaReport pta = analyseProduct(dir.str(), product, record, files.truth);
   ASSERT_EQ(pta.exitStatus, 0) << pta.table;
-  ASSERT_EQ(pta.targets.size(), scene.pixelTargets.size()) << pta.table;
+  expectTheoreticalResponses(pta, scene.pixelTargets.size());
   std::vector<double> phases;
-  for (std::size_t i = 0; i < pta.targets.size(); ++i) {
-    const PtaTarget& t = pta.targets[i];
-    SCOPED_TRACE("target " + std::to_string(i + 1) + "\n" + pta.table);
-    ASSERT_TRUE(t.found);
-    EXPECT_LT(std::fabs(t.errorLine), 0.1);
-    EXPECT_LT(std::fabs(t.errorSample), 0.1);
-    EXPECT_NEAR(t.azimuth.irw / pta.theoryAzimuth.irw, 1.0, 0.05);
-    EXPECT_NEAR(t.range.irw / pta.theoryRange.irw, 1.0, 0.05);
-    EXPECT_NEAR(t.azimuth.pslr, pta.theoryAzimuth.pslr, 1.0);
-    EXPECT_NEAR(t.range.pslr, pta.theoryRange.pslr, 1.0);
+  for (const PtaTarget& t : pta.targets) {
+    EXPECT_LT(std::fabs(t.errorLine), 0.1) << pta.table;
+    EXPECT_LT(std::fabs(t.errorSample), 0.1) << pta.table;
     phases.push_back(t.phaseError);
   }
   EXPECT_LT(phaseSpread(phases) * 180.0 / M_PI, 5.0) << pta.table;
