@@ -197,7 +197,8 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     par.samples = samples;
     par.data = blockBuf.data();
     AzimuthBlockOut bo;
-    st = multirg(par, bo, conf.SamplesInBlock, fullRg, poly, pdc[7], b, plan.last + 1);
+    st = multirg(par, bo, conf.SamplesInBlock, fullRg, poly, pdc[7], b,
+                 std::max(1, plan.progressTotal));
     if (st != 0) {
       if (scene.verbose) waitbar_close();
       ORV_REPORT_CALLED_ERROR();
