@@ -86,10 +86,11 @@ struct SARFocuser_conf {
   int Flag_set = 0;
 
   // Clears the block to its reading defaults, then reads the section
-  // "sarfocuserConfiguration" of file and, through readconf, the profile it
-  // names (ProcessingConfFile). 0, or the profile status.
+  // "sarfocuserConfiguration" of file. 0, or 9 when file does not open.
   int readpar(const std::string& file);
-  // Reads "DCestConf", "AzimuthConf" and "GeneralProcessingConf" of file.
+  // Reads "DCestConf", "AzimuthConf" and "GeneralProcessingConf" of file
+  // (ProcessingConfFile in a chain set up by readpar); overlaps are halved.
+  // 0, or 9 when file does not open.
   int readconf(const std::string& file);
   // Back to the state readpar starts from: zeros, with Flag_ortog = 1,
   // Flag_swstal = 1, Azblk = 1024, all Pol_Weights 1.

@@ -17,6 +17,7 @@
 #include "diag/environment.h"
 #include "diag/report.h"
 #include "focus/level0_focusers.h"
+#include "focus/sar_focuser.h"
 #include "product/data_set_info.h"
 #include "product/general_sar.h"
 #include "product/general_sar_configuration.h"
@@ -286,6 +287,47 @@ TEST_F(ErsSceneFocus, TruncatedImageFileEndsInTheExtractor) {
   EXPECT_EQ(printed.find("- finalize"), std::string::npos);
   EXPECT_FALSE(std::filesystem::exists(working_ + "out.rgfoc"));
   EXPECT_FALSE(std::filesystem::exists(working_ + "out.hdr"));
+}
+
+TEST_F(ErsSceneFocus, ChainErasesEachInputOnceItsStageHasUsedIt) {
+  SceneDescription s = scene();
+  s.lines = 3072;
+  s.samples = 1536;
+  s.pixelTargets = {{1536.0, 500.0, 0.0, 4.0}};
+  RawSceneSimulator sim(s);
+  std::string error;
+  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+
+  // Extraction by the ERS focuser, then the chain on its own.
+  ersLevel0Focuser f;
+  f.level0Filename = sim.imagePath(dir_.string());
+  f.LEAFilename = sim.leaderPath(dir_.string());
+  f.orbitFilename = sim.odrPath(dir_.string());
+  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
+  f.outputFilename = working_ + "out";
+  ASSERT_EQ(f.initialize(), 0);
+  ASSERT_EQ(f.ingestion(), 0);
+
+  std::ofstream(working_ + "chain.hdr") << "[sarfocuserConfiguration]\nMemory = 128\n"
+                                           "DeleteTempFiles = 1\n";
+  SARFocuser_conf conf;
+  ASSERT_EQ(conf.readpar(working_ + "chain.hdr"), 0);
+  ASSERT_EQ(conf.readconf(TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr"), 0);
+  conf.SamplesInBlock = 512;
+  conf.RangeOverlap = 16;
+  SARFocuser chain(&conf);
+  chain.RawDataFile = working_ + "out.extracted";
+  chain.ChirpFile = working_ + "out.chirp";
+  chain.OutputFilename = working_ + "out";
+  ASSERT_EQ(chain.run(), 0) << trace();
+  for (const char* gone : {"out.extracted", "out.chirp", "out.chirp.hdr", "out.rgfoc",
+                           "out.rgfoc.hdr", "DCEST_resume.txt"})
+    EXPECT_FALSE(std::filesystem::exists(working_ + gone)) << gone;
+  EXPECT_TRUE(std::filesystem::exists(working_ + "out"));
+  GeneralSAR slc;
+  ASSERT_EQ(slc.GSread(working_ + "out.hdr"), 0);
+  EXPECT_EQ(slc.dataFile.NrOfLinesPerImage, 3072 - 2560);
+  EXPECT_EQ(slc.dataFile.NrOfPixelsPerLine, 1536 - sim.replicaLength() + 1 - 2 * conf.RangeOverlap);
 }
 
 }  // namespace
