@@ -330,4 +330,57 @@ TEST_F(ErsSceneFocus, ChainErasesEachInputOnceItsStageHasUsedIt) {
   EXPECT_EQ(slc.dataFile.NrOfPixelsPerLine, 1536 - sim.replicaLength() + 1 - 2 * conf.RangeOverlap);
 }
 
+// Alternating-polarisation form of the chain: two channels "<raw>1" and
+// "<raw>2", each focused and de-scalloped. Made here from one extracted ERS
+// scene given a burst length.
+class HeavyErsSceneFocus : public ErsSceneFocus {};
+
+TEST_F(HeavyErsSceneFocus, TwoChannelsAreFocusedAndDescalloped) {
+  SceneDescription s = scene();
+  s.samples = 1536;
+  RawSceneSimulator sim(s);
+  std::string error;
+  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+  ersLevel0Focuser f;
+  f.level0Filename = sim.imagePath(dir_.string());
+  f.LEAFilename = sim.leaderPath(dir_.string());
+  f.orbitFilename = sim.odrPath(dir_.string());
+  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
+  f.outputFilename = working_ + "ers";
+  ASSERT_EQ(f.initialize(), 0);
+  ASSERT_EQ(f.ingestion(), 0);
+  for (const char* k : {"1", "2"}) {
+    GeneralSAR raw;
+    ASSERT_EQ(raw.GSread(working_ + "ers.extracted.hdr"), 0);
+    raw.swath.Echoes_per_burst = 64;
+    raw.GSenable(GeneralSAR::GS_SWATH);
+    std::filesystem::copy_file(working_ + "ers.extracted", working_ + "ap" + k);
+    ASSERT_EQ(raw.GSwrite(working_ + "ap" + k + ".hdr"), 0);
+    std::filesystem::copy_file(working_ + "ers.chirp", working_ + "apchirp" + k);
+    std::filesystem::copy_file(working_ + "ers.chirp.hdr", working_ + "apchirp" + k + ".hdr");
+  }
+  SARFocuser_conf& conf = f.conf();
+  conf.SamplesInBlock = 512;
+  conf.RangeOverlap = 16;
+  SARFocuser chain(&conf);
+  chain.RawDataFile = working_ + "ap";
+  chain.ChirpFile = working_ + "apchirp";
+  chain.OutputFilename = working_ + "out";
+  ASSERT_EQ(chain.run(), 0) << trace();
+  EXPECT_NE(trace().find(" AP RAW DATA DETECTED, FOCUSSING..."), std::string::npos);
+  for (const char* k : {"1", "2"}) {
+    GeneralSAR slc, ds;
+    ASSERT_EQ(slc.GSread(working_ + "out" + k + ".hdr"), 0);
+    ASSERT_EQ(ds.GSread(working_ + "out" + k + "_descallop.hdr"), 0);
+    const int n = slc.dataFile.NrOfLinesPerImage;
+    EXPECT_EQ(ds.dataFile.NrOfLinesPerImage, (n - 64) / 960 * 960);
+    EXPECT_EQ(ds.swath.Echoes_per_burst, 64);
+    EXPECT_NEAR(ds.roi.roi.SlowStartTime, slc.roi.roi.SlowStartTime + 32 * slc.roi.roi.SlowTimeDelta,
+                1e-6);  // times are stored to the microsecond
+    EXPECT_EQ(std::filesystem::file_size(working_ + "out" + k + "_descallop"),
+              static_cast<std::uintmax_t>(ds.dataFile.NrOfLinesPerImage) *
+                  ds.dataFile.NrOfPixelsPerLine * 8);
+  }
+}
+
 }  // namespace
