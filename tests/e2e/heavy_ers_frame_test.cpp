@@ -1,0 +1,51 @@
+// A longer ERS-1 scene over two azimuth blocks, with a negative centroid
+// and targets at the seam of the blocks. Left out of the default run.
+#include <gtest/gtest.h>
+
+#include "e2e_support.h"
+
+using namespace e2e;
+
+TEST(HeavyErsFrame, TwoAzimuthBlocksWithANegativeCentroid) {
+  Folder dir("frame");
+  SceneDescription scene = ersScene(10240, 5616, -450.0);
+  scene.mission = "ERS1";
+  scene.sceneDir = "ERS1_SIM";
+  // The first block keeps raw lines 1280 to 6911, the second the rest:
+  // targets on both sides of the seam, across the swath.
+  scene.pixelTargets = {{3000.5, 300.25, 0.0, 4.0},    {6890.25, 1200.5, 0.0, 4.0},
+                        {6905.0, 2300.75, 80.0, 4.0},  {6918.75, 3400.0, 0.0, 4.0},
+                        {6935.5, 4500.25, 0.0, 4.0},   {8000.0, 4700.5, 150.0, 4.0},
+                        {8200.25, 2000.0, 0.0, 4.0}};
+  SceneFiles files;
+  std::string error;
+  ASSERT_TRUE(simulate(scene, dir.str(), files, error)) << error;
+  std::vector<std::string> p = ersJob(files, dir / "out");
+  p[6] = "NotOK";
+  p[11] = files.orbitArchive;
+  writeJob(dir / "job.txt", p);
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt", nullptr, 3000);
+  ASSERT_EQ(run.exitStatus, 0) << run.log;
+  ASSERT_EQ(run.errorCode, 0) << run.errorFile;
+  EXPECT_TRUE(contains(run.trace, "ERS1 orbit found")) << run.trace;
+
+  GeneralSAR record;
+  ASSERT_EQ(record.GSread(dir / "out_slc.TessivorParameterExtracted"), 0);
+  EXPECT_EQ(record.roi.roi.Lines, 10240 - 2560);
+  const PtaReport pta = analyseProduct(dir.str(), dir / "out_slc", record, files.truth);
+  expectTheoreticalResponses(pta, scene.pixelTargets.size());
+  std::vector<double> phases;
+  for (const PtaTarget& t : pta.targets) {
+    EXPECT_LT(std::fabs(t.errorLine), 0.1) << pta.table;
+    EXPECT_LT(std::fabs(t.errorSample), 0.1) << pta.table;
+    if (t.found) phases.push_back(t.phaseError);
+  }
+  EXPECT_LT(phaseSpread(phases) * 180.0 / M_PI, 5.0) << pta.table;
+
+  const ROI_Obj& roi = record.roi.roi;
+  const double prf = scene.prfHz;
+  const double centroid = record.polynomials.EvaluateDC(
+      roi.FastStartTime + 0.5 * roi.Samples * roi.FastTimeDelta,
+      roi.SlowStartTime + 0.5 * roi.Lines * roi.SlowTimeDelta);
+  EXPECT_NEAR(centroid, -450.0, 0.02 * prf);
+}
