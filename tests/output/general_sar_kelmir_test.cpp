@@ -306,6 +306,9 @@ TEST(GeneralSARKelmir, RefusalsMandatoryFieldsAndTypeReports) {
   EXPECT_EQ(record.writehdr_ersdac_kelmir(product, guard.dir + "leader", 6900.0f, KT_PALSAR_ERSDAC),
             STATUS_NOT_OPENED);
   EXPECT_FALSE(std::filesystem::exists(product + ".sml"));
+  // An ENVISAT export whose calibration file cannot be read stops there.
+  EXPECT_EQ(record.writehdr_kelmir(product, guard.dir + "no_xca", 6900.0f, KT_ENVISAT_IM), STATUS_NOT_OPENED);
+  EXPECT_FALSE(std::filesystem::exists(product + ".sml"));
   writeText(guard.dir + "leader", std::string(4900, ' '));
   EXPECT_EQ(record.writehdr_ersdac_kelmir(product, guard.dir + "leader", 6900.0f, KT_PALSAR_ERSDAC),
             STATUS_READ_FAILED);
