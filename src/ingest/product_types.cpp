@@ -127,28 +127,18 @@ std::string ErsTypes::leaderPath() const {
   return {};
 }
 
-int ErsTypes::leaderFieldIs(long offset, const char* expected, std::size_t count) const {
+int ErsTypes::leaderFieldIs(long offset, std::size_t bytes, const char* expected,
+                            std::size_t count) const {
   const std::string leader = leaderPath();
   std::string value;
-  if (leader.empty() || !readFileBytes(leader, offset, count, value)) return 0;
+  if (leader.empty() || !readFileBytes(leader, offset, bytes, value)) return 0;
   return value.compare(0, count, expected, count) == 0 ? 1 : 0;
 }
 
-int ErsTypes::is_ers1() const {
-  const std::string leader = leaderPath();
-  std::string value;
-  if (leader.empty() || !readFileBytes(leader, kLeaderMissionOffset, kLeaderMissionBytes, value)) return 0;
-  return value.compare(0, 4, "ERS1") == 0 ? 1 : 0;
-}
+int ErsTypes::is_ers1() const { return leaderFieldIs(kLeaderMissionOffset, kLeaderMissionBytes, "ERS1", 4); }
+int ErsTypes::is_ers2() const { return leaderFieldIs(kLeaderMissionOffset, kLeaderMissionBytes, "ERS2", 4); }
 
-int ErsTypes::is_ers2() const {
-  const std::string leader = leaderPath();
-  std::string value;
-  if (leader.empty() || !readFileBytes(leader, kLeaderMissionOffset, kLeaderMissionBytes, value)) return 0;
-  return value.compare(0, 4, "ERS2") == 0 ? 1 : 0;
-}
-
-int ErsTypes::is_level0() const { return leaderFieldIs(1834, "RAW", 3); }
+int ErsTypes::is_level0() const { return leaderFieldIs(1834, 3, "RAW", 3); }
 
 int ErsTypes::is_deos(const std::string& orbit) const {
   std::string head;

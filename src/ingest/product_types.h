@@ -76,7 +76,8 @@ class ErsTypes {
   int read_roi(ROI_Obj* roi) const;
 
  private:
-  int leaderFieldIs(long offset, const char* expected, std::size_t count) const;
+  // The first count of `bytes` bytes at offset of the leader equal expected.
+  int leaderFieldIs(long offset, std::size_t bytes, const char* expected, std::size_t count) const;
   std::string directory_;
 };
 
