@@ -78,7 +78,8 @@ TEST(FocuserExecutable, TooFewParametersEndWith456962) {
   EXPECT_TRUE(contains(run.stderrText, "End of initalization phase\n"));
 }
 
-TEST(FocuserExecutable, WellFormedErsJobReachesTheHandOver) {
+// Without an orbit file or an orbit folder the ERS focuser cannot be set up.
+TEST(FocuserExecutable, WellFormedErsJobWithoutOrbitStopsAtInitialisation) {
   const std::string dir = freshFolder("exe");
   writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
   const FocuserRun run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt###Tessivor###more",
@@ -100,7 +101,7 @@ TEST(FocuserExecutable, WellFormedErsJobReachesTheHandOver) {
                        "SKIP LINES       : [ 0 ]\nEXTRACT LINES    : [ 0 ]\n"
                        "ERASE TEMPORARY  : [ NotOK ]\n"));
   EXPECT_TRUE(contains(log, "[ERROR ID : 130560]"));
-  EXPECT_TRUE(contains(log, "  checkpar() \n"));
+  EXPECT_TRUE(contains(log, "  InitProcessing() \n"));
   const std::string trace = readText(dir + "Process.trace");
   EXPECT_TRUE(contains(trace, "Orvane WARNING: ERS - line"));
   EXPECT_TRUE(contains(trace, "\nERROR : "));
