@@ -16,6 +16,7 @@
 #include "orbit/geo_grid.h"
 #include "product/buffer_io.h"
 #include "product/general_sar.h"
+#include "product/general_sar_configuration.h"
 #include "product/product_aggregates.h"
 #include "product/profile.h"
 #include "product/roi.h"
@@ -104,6 +105,163 @@ int estimateCentroid(DcEstInput& input, DcEstState& state, double poly[7]) {
 int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
                  const AzimuthFocusConf& conf) {
   return azimuthfoc(files, scene, conf);
+}
+
+void fillDcEstState(const SARFocuser_conf& conf, double fc, double fs, DcEstState& state) {
+  state.blocks = conf.Blocks;
+  state.blockl = conf.Blockl;
+  state.memory = static_cast<int64_t>(conf.Memory) << 20;
+  state.nBest = conf.Nbestblocks;
+  state.nWdar = conf.Nwdarblocks;
+  state.nMlbf = conf.Nummlbf;
+  state.anLen = conf.AnLen;
+  state.rgBand = conf.RgBand;
+  state.fc = fc;
+  state.fs = fs;
+  state.maxAmb = conf.Maxamb;
+  state.minAmb = conf.Minamb;
+  state.kThr = conf.Kthr;
+  state.sThr = conf.Sthr;
+  state.varTh = conf.Varthr;
+  state.lookBf = conf.Lookbf;
+  state.lookBt = conf.Lookbt;
+  state.lookRp = conf.Lookrp;
+  state.lookRs = conf.Lookrs;
+  state.fLength = conf.Flength;
+  state.decFac = conf.Decfac;
+  state.dftStep = conf.Dftstep;
+  state.peakWid = conf.Peakwid;
+  state.ambFlag = conf.Amb_flag;
+  for (int i = 0; i < 7; ++i) state.polMask[i] = conf.Pol_Weights[i];
+  state.patchs = conf.Patchs;
+  state.patchl = conf.Patchl;
+  state.fftRgPrc = conf.Fftrgprc;
+  state.fftAzPrc = conf.Fftazprc;
+  state.dswst = conf.Dswst;
+  state.verbose = conf.Verbose;
+}
+
+AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, double prf) {
+  AzimuthFocusConf ac;
+  ac.PerformInterpolation = conf.PerformInterpolation;
+  ac.StoltPadding = conf.StoltPadding;
+  ac.AntennaLength = conf.AntennaLength;
+  ac.WhiteningFlag = conf.WhiteningFlag;
+  ac.RangeWindowHammingParameter = conf.RangeWindowHammingParameter;
+  ac.AzimuthWindowHammingParameter = conf.AzimuthWindowHammingParameter;
+  ac.RangeLookBandwidth = conf.RangeLookBandwidth * frg;
+  ac.AzimuthLookBandwidth = conf.AzimuthLookBandwidth * prf;
+  ac.RangeTransitionBandwidth = conf.RangeTransitionBandwidth * frg;
+  ac.AzimuthTransitionBandwidth = conf.AzimuthTransitionBandwidth * prf;
+  ac.SamplesInBlock = conf.SamplesInBlock;
+  ac.LinesInBlock = conf.LinesInBlock;
+  ac.RangeOverlap = conf.RangeOverlap;
+  ac.AzimuthOverlap = conf.AzimuthOverlap;
+  ac.ApplyAzShift = conf.ApplyAzShift;
+  ac.ApplyRgShift = conf.ApplyRgShift;
+  return ac;
+}
+
+SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& c) {
+  SARFocuser_conf conf;
+  conf.clear();
+  const GeneralSAR_BaseConfiguration& common = c.generalConf;
+  conf.Memory = common.Memory;
+  conf.Incore = common.Incore;
+  conf.Verbose = common.Verbose;
+  conf.ReportLevel = common.ReportLevel;
+  conf.ReportFilename = common.ReportFilename;
+
+  const DCestConf& d = c.dcestConf;
+  conf.RgBand = d.RgBand;
+  conf.Blocks = d.Blocks;
+  conf.Blockl = d.Blockl;
+  conf.AnLen = d.AnLen;
+  conf.Kthr = d.Kthr;
+  conf.Sthr = d.Sthr;
+  conf.Varthr = d.Varth;
+  conf.Lookbf = d.Lookbf;
+  conf.Lookbt = d.Lookbt;
+  conf.Lookrp = d.Lookrp;
+  conf.Lookrs = d.Lookrs;
+  conf.Decfac = d.Decfac;
+  conf.Flength = d.Flength;
+  conf.Dftstep = d.Dftstep;
+  conf.Fftrgprc = d.Fftrgprc;
+  conf.Fftazprc = d.Fftazprc;
+  conf.Peakwid = d.Peakwid;
+  conf.Minamb = d.Minamb;
+  conf.Maxamb = d.Maxamb;
+  conf.Nbestblocks = d.Nbestblocks;
+  conf.Nummlbf = d.Nummlbf;
+  conf.Nwdarblocks = d.Nwdarbloks;
+  conf.Patchs = d.Patchs;
+  conf.Patchl = d.Patchl;
+  conf.Dswst = d.Dswst;
+  conf.Amb_flag = d.Amb_flag;
+  for (int i = 0; i < 7; ++i) conf.Pol_Weights[i] = d.Pol_weights[i];
+
+  const AzimuthConf& a = c.azimuthConf;
+  conf.AntennaLength = a.AntennaLength;
+  conf.WhiteningFlag = a.WhiteningFlag;
+  conf.RangeWindowHammingParameter = a.RangeWindowHammingParameter;
+  conf.AzimuthWindowHammingParameter = a.AzimuthWindowHammingParameter;
+  conf.RangeLookBandwidth = a.RangeLookBandwidth;
+  conf.AzimuthLookBandwidth = a.AzimuthLookBandwidth;
+  conf.RangeTransitionBandwidth = a.RangeTransitionBandwidth;
+  conf.AzimuthTransitionBandwidth = a.AzimuthTransitionBandwidth;
+  conf.LinesInBlock = a.LinesInBlock;
+  conf.SamplesInBlock = a.SamplesInBlock;
+  conf.RangeOverlap = a.RangeOverlap / 2;
+  conf.AzimuthOverlap = a.AzimuthOverlap / 2;
+  conf.PerformInterpolation = a.PerformInterpolation;
+  conf.StoltPadding = a.StoltPadding;
+  conf.ApplyAzShift = a.ApplyAzShift;
+  conf.ApplyRgShift = a.ApplyRgShift;
+
+  const generalProcessingConf& g = c.generalConf;
+  conf.Flag_rangefoc = g.Flag_rangefoc;
+  conf.Flag_rgpatt = g.Flag_rgpatt;
+  conf.Flag_azimuthfoc = g.Flag_azimuthfoc;
+  conf.Flag_dcest = g.Flag_dcest;
+  conf.Flag_ortog = g.Flag_ortog;
+  conf.Flag_swstal = g.Flag_swstal;
+  conf.Azblk = g.Azblk;
+  conf.DeleteTempFiles = g.EraseTemp;
+  return conf;
+}
+
+void setHammingWindows(SpectralWindows_Obj& w, const SARFocuser_conf& conf) {
+  w.AzMatchedFilterType = "HAMMING";
+  w.RgMatchedFilterType = "HAMMING";
+  w.RgMatchedFilterCoef = conf.RangeWindowHammingParameter;
+  w.AzMatchedFilterCoef = conf.AzimuthWindowHammingParameter;
+  w.RgLookBandwidth = conf.RangeLookBandwidth;
+  w.AzLookBandwidth = conf.AzimuthLookBandwidth;
+}
+
+void setFocusedProduct(GeneralSAR& product, const std::string& raster,
+                       const AzimuthFocusScene& scene, const ROI_Obj& deltas,
+                       const SARFocuser_conf& conf, double lambda) {
+  DataFile& df = product.dataFile;
+  df.filename = raster;
+  df.NrOfPixelsPerLine = scene.outSamples;
+  df.NrOfLinesPerImage = scene.outLines;
+  df.RowPrefix = 0;
+  df.HeaderOffset = 0;
+  df.CellType = FLOAT_COMPLEX;
+  df.ByteOrder = 0;
+  ROI_Obj& roi = product.roi.roi;
+  roi.SetFastAxe(scene.firstSampleTime, deltas.FastTimeDelta, scene.outSamples);
+  roi.SetSlowAxe(scene.firstLineTime, deltas.SlowTimeDelta, scene.outLines);
+  product.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
+  product.dataSetInfo.SWST_MIN = product.dataSetInfo.SWST_MAX = scene.firstSampleTime;
+  product.attitude.Eq_speed = scene.Veq;
+  product.attitude.Mean_DC = scene.centroid;
+  product.attitude.SquintAngle =
+      scene.Veq != 0.0 ? std::asin(-(lambda * scene.centroid) / (2.0 * scene.Veq)) * 180.0 / kPi
+                       : 0.0;
+  setHammingWindows(product.spectralWindows, conf);
 }
 
 // ---- configuration ----------------------------------------------------------
@@ -454,37 +612,7 @@ int SARFocuser::process() {
     in.velocity = kEqSpeedPlaceholder;
     in.timeOrigin = ctx.azimuthStart;
     DcEstState state;
-    state.blocks = conf.Blocks;
-    state.blockl = conf.Blockl;
-    state.memory = static_cast<int64_t>(conf.Memory) << 20;
-    state.nBest = conf.Nbestblocks;
-    state.nWdar = conf.Nwdarblocks;
-    state.nMlbf = conf.Nummlbf;
-    state.anLen = conf.AnLen;
-    state.rgBand = conf.RgBand;
-    state.fc = ctx.fc_hz;
-    state.fs = ctx.frg_hz;
-    state.maxAmb = conf.Maxamb;
-    state.minAmb = conf.Minamb;
-    state.kThr = conf.Kthr;
-    state.sThr = conf.Sthr;
-    state.varTh = conf.Varthr;
-    state.lookBf = conf.Lookbf;
-    state.lookBt = conf.Lookbt;
-    state.lookRp = conf.Lookrp;
-    state.lookRs = conf.Lookrs;
-    state.fLength = conf.Flength;
-    state.decFac = conf.Decfac;
-    state.dftStep = conf.Dftstep;
-    state.peakWid = conf.Peakwid;
-    state.ambFlag = conf.Amb_flag;
-    for (int i = 0; i < 7; ++i) state.polMask[i] = conf.Pol_Weights[i];
-    state.patchs = conf.Patchs;
-    state.patchl = conf.Patchl;
-    state.fftRgPrc = conf.Fftrgprc;
-    state.fftAzPrc = conf.Fftazprc;
-    state.dswst = conf.Dswst;
-    state.verbose = conf.Verbose;
+    fillDcEstState(conf, ctx.fc_hz, ctx.frg_hz, state);
     if (conf.Incore) {
       state.inMemory = 1;
       state.data = rw.data.data();
@@ -542,12 +670,7 @@ int SARFocuser::process() {
     rg.attitude.Eq_speed = kEqSpeedPlaceholder;
     rg.attitude.Mean_DC = -1.0;
     rg.attitude.SquintAngle = -1.0;
-    rg.spectralWindows.AzMatchedFilterType = "HAMMING";
-    rg.spectralWindows.RgMatchedFilterType = "HAMMING";
-    rg.spectralWindows.RgMatchedFilterCoef = conf.RangeWindowHammingParameter;
-    rg.spectralWindows.AzMatchedFilterCoef = conf.AzimuthWindowHammingParameter;
-    rg.spectralWindows.RgLookBandwidth = conf.RangeLookBandwidth;
-    rg.spectralWindows.AzLookBandwidth = conf.AzimuthLookBandwidth;
+    setHammingWindows(rg.spectralWindows, conf);
     rawRecord.orbit().clone(&rg.orbit());
     if (int st = rg.orbit().SVGetGeoCoords(&rg.geoCoords, &rg.roi); st != 0)
       return calledError(st);
@@ -578,23 +701,7 @@ int SARFocuser::process() {
     scene.DCref = conf.DCref;
     scene.inCore = conf.Incore;
     scene.buffer = conf.Incore ? rw.data.data() : nullptr;
-    AzimuthFocusConf ac;
-    ac.PerformInterpolation = conf.PerformInterpolation;
-    ac.StoltPadding = conf.StoltPadding;
-    ac.AntennaLength = conf.AntennaLength;
-    ac.WhiteningFlag = conf.WhiteningFlag;
-    ac.RangeWindowHammingParameter = conf.RangeWindowHammingParameter;
-    ac.AzimuthWindowHammingParameter = conf.AzimuthWindowHammingParameter;
-    ac.RangeLookBandwidth = conf.RangeLookBandwidth * ctx.frg_hz;
-    ac.AzimuthLookBandwidth = conf.AzimuthLookBandwidth * ctx.prf_hz;
-    ac.RangeTransitionBandwidth = conf.RangeTransitionBandwidth * ctx.frg_hz;
-    ac.AzimuthTransitionBandwidth = conf.AzimuthTransitionBandwidth * ctx.prf_hz;
-    ac.SamplesInBlock = conf.SamplesInBlock;
-    ac.LinesInBlock = conf.LinesInBlock;
-    ac.RangeOverlap = conf.RangeOverlap;
-    ac.AzimuthOverlap = conf.AzimuthOverlap;
-    ac.ApplyAzShift = conf.ApplyAzShift;
-    ac.ApplyRgShift = conf.ApplyRgShift;
+    const AzimuthFocusConf ac = azimuthFocusConf(conf, ctx.frg_hz, ctx.prf_hz);
     ORV_REPORT("Azimuth Focusing", REPORT_CHECKPOINT);
     char text[64];
     std::snprintf(text, sizeof text, "DCref: %f", conf.DCref);
@@ -618,7 +725,6 @@ int SARFocuser::process() {
   GeneralSAR product;
   rawRecord.dataSetInfo.clone(&product.dataSetInfo);
   DataSetInfo_Obj& info = product.dataSetInfo;
-  info.SWST_MIN = info.SWST_MAX = scene.firstSampleTime;
   info.ExternalCalibrationFactor = 1.0;
   info.Description = "StripMap level 1 Image File";
   info.ProcessingSoftware = "SARFocuser v1.0";
@@ -626,19 +732,9 @@ int SARFocuser::process() {
   info.Swath = rawRecord.dataSetInfo.Swath;
   info.OrbitConfiguration = rawRecord.dataSetInfo.OrbitConfiguration;
   info.Polarization = rawRecord.dataSetInfo.Polarization;
-  info.SetImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
-
-  product.dataFile.filename = ctx.outputFile;
-  product.dataFile.NrOfPixelsPerLine = scene.outSamples;
-  product.dataFile.NrOfLinesPerImage = scene.outLines;
-  product.dataFile.RowPrefix = 0;
-  product.dataFile.HeaderOffset = 0;
-  product.dataFile.CellType = FLOAT_COMPLEX;
-  product.dataFile.ByteOrder = 0;
 
   ROI_Obj& roi = product.roi.roi;
-  roi.SetFastAxe(scene.firstSampleTime, rawRoi.FastTimeDelta, scene.outSamples);
-  roi.SetSlowAxe(scene.firstLineTime, rawRoi.SlowTimeDelta, scene.outLines);
+  setFocusedProduct(product, ctx.outputFile, scene, rawRoi, conf, ctx.lambda_m);
 
   rawRecord.orbit().clone(&product.orbit());
   product.polynomials.CreatePolys(1, 1, 1, 1, 1, 1);
@@ -656,20 +752,7 @@ int SARFocuser::process() {
   }
   rawRecord.sampling.clone(&product.sampling);
   rawRecord.pulse.clone(&product.pulse);
-  product.attitude.Eq_speed = scene.Veq;
-  product.attitude.Mean_DC = scene.centroid;
   product.attitude.AntennaLength = conf.AntennaLength;
-  product.attitude.SquintAngle =
-      scene.Veq != 0.0
-          ? std::asin(-(ctx.lambda_m * scene.centroid) / (2.0 * scene.Veq)) * 180.0 / kPi
-          : 0.0;
-  SpectralWindows_Obj& w = product.spectralWindows;
-  w.AzMatchedFilterType = "HAMMING";
-  w.RgMatchedFilterType = "HAMMING";
-  w.RgMatchedFilterCoef = conf.RangeWindowHammingParameter;
-  w.AzMatchedFilterCoef = conf.AzimuthWindowHammingParameter;
-  w.RgLookBandwidth = conf.RangeLookBandwidth;
-  w.AzLookBandwidth = conf.AzimuthLookBandwidth;
   SwathInfo& sw = product.swath;
   sw.Acquisition_Start_Time = ctx.azimuthStart;
   sw.Rank = sw.Bursts = sw.Order = sw.Swst_changes = -1;

@@ -11,6 +11,9 @@
 #include "doppler/dc_state.h"
 
 class GeneralSAR;
+class GeneralSAR_configuration;
+class ROI_Obj;
+class SpectralWindows_Obj;
 class poly;
 
 // Flat configuration of the chain, read from the parameter profile.
@@ -169,3 +172,19 @@ void polyFromFlat(const double in[9], poly& p);
 int estimateCentroid(DcEstInput& input, DcEstState& state, double poly[7]);
 int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
                  const AzimuthFocusConf& conf);
+
+// Set-up shared by the chain and the modular steps.
+// Estimator values of the block, with carrier fc and range rate fs.
+void fillDcEstState(const SARFocuser_conf& conf, double fc, double fs, DcEstState& state);
+// Azimuth focusing values of the block; bandwidth fractions become hertz.
+AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, double prf);
+// The block of a processing configuration document (overlaps halved, as at
+// reading a profile).
+SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& configuration);
+// "HAMMING" windows with the coefficients and look bandwidths of the block.
+void setHammingWindows(SpectralWindows_Obj& windows, const SARFocuser_conf& conf);
+// Raster layout, region (deltas of `deltas`), type, range start, attitude and
+// windows of a focused product from the result of azimuth focusing.
+void setFocusedProduct(GeneralSAR& product, const std::string& raster,
+                       const AzimuthFocusScene& scene, const ROI_Obj& deltas,
+                       const SARFocuser_conf& conf, double lambda);

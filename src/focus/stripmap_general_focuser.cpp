@@ -19,7 +19,6 @@
 
 namespace {
 
-constexpr double kPi = 3.14159265358979323846;
 constexpr double kEqSpeedPlaceholder = 6900.0;
 
 int calledError(int status) {
@@ -235,7 +234,8 @@ int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
     return 1;
   }
   record.polynomials.CreatePolys(1, 1);
-  const DCestConf& d = configuration.dcestConf;
+  SARFocuser_conf conf = chainConfFrom(configuration);
+  conf.Memory = Memory;
   DcEstInput in;
   in.rasterFile = file;
   in.outDir = dir;
@@ -247,36 +247,7 @@ int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
   in.headerOffset = record.dataFile.HeaderOffset;
   in.timeOrigin = record.roi.roi.SlowStartTime;
   DcEstState state;
-  state.blocks = d.Blocks;
-  state.blockl = d.Blockl;
-  state.memory = static_cast<int64_t>(Memory) << 20;
-  state.nBest = d.Nbestblocks;
-  state.nWdar = d.Nwdarbloks;
-  state.nMlbf = d.Nummlbf;
-  state.anLen = d.AnLen;
-  state.rgBand = d.RgBand;
-  state.fc = record.sampling.fc_hz;
-  state.fs = record.sampling.frg_hz;
-  state.maxAmb = d.Maxamb;
-  state.minAmb = d.Minamb;
-  state.kThr = d.Kthr;
-  state.sThr = d.Sthr;
-  state.varTh = d.Varth;
-  state.lookBf = d.Lookbf;
-  state.lookBt = d.Lookbt;
-  state.lookRp = d.Lookrp;
-  state.lookRs = d.Lookrs;
-  state.fLength = d.Flength;
-  state.decFac = d.Decfac;
-  state.dftStep = d.Dftstep;
-  state.peakWid = d.Peakwid;
-  state.ambFlag = d.Amb_flag;
-  for (int i = 0; i < 7; ++i) state.polMask[i] = d.Pol_weights[i];
-  state.patchs = d.Patchs;
-  state.patchl = d.Patchl;
-  state.fftRgPrc = d.Fftrgprc;
-  state.fftAzPrc = d.Fftazprc;
-  state.dswst = d.Dswst;
+  fillDcEstState(conf, record.sampling.fc_hz, record.sampling.frg_hz, state);
   double c[7] = {0, 0, 0, 0, 0, 0, 0};
   if (int st = estimateCentroid(in, state, c); st != 0) return calledError(st);
   polyDC& dc = record.polynomials.DC[0];
@@ -341,7 +312,7 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
     ORV_REPORT("DataSetInfo does not exist!", REPORT_ERROR);
     return 1;
   }
-  const AzimuthConf& a = configuration.azimuthConf;
+  const SARFocuser_conf conf = chainConfFrom(configuration);
   const SamplingConstants_Obj& smp = record.sampling;
   const ROI_Obj& roi = record.roi.roi;
   const int lines = record.dataFile.NrOfLinesPerImage;
@@ -361,23 +332,9 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
   scene.lines = lines;
   polyToFlat(record.polynomials.DC[0], scene.polyDC);
   polyToFlat(record.polynomials.FR[0], scene.polyFR);
-  AzimuthFocusConf ac;
-  ac.PerformInterpolation = a.PerformInterpolation;
-  ac.StoltPadding = a.StoltPadding;
-  ac.AntennaLength = a.AntennaLength;
-  ac.WhiteningFlag = a.WhiteningFlag;
-  ac.RangeWindowHammingParameter = a.RangeWindowHammingParameter;
-  ac.AzimuthWindowHammingParameter = a.AzimuthWindowHammingParameter;
-  ac.RangeLookBandwidth = a.RangeLookBandwidth * smp.frg_hz;
-  ac.AzimuthLookBandwidth = a.AzimuthLookBandwidth * smp.prf_hz;
-  ac.RangeTransitionBandwidth = a.RangeTransitionBandwidth * smp.frg_hz;
-  ac.AzimuthTransitionBandwidth = a.AzimuthTransitionBandwidth * smp.prf_hz;
-  ac.SamplesInBlock = a.SamplesInBlock;
-  ac.LinesInBlock = a.LinesInBlock;
-  ac.RangeOverlap = a.RangeOverlap / 2;
-  ac.AzimuthOverlap = a.AzimuthOverlap / 2;
-  ac.ApplyAzShift = static_cast<double>(a.ApplyAzShift) * lines;
-  ac.ApplyRgShift = static_cast<double>(a.ApplyRgShift) * samples;
+  AzimuthFocusConf ac = azimuthFocusConf(conf, smp.frg_hz, smp.prf_hz);
+  ac.ApplyAzShift = conf.ApplyAzShift * lines;
+  ac.ApplyRgShift = conf.ApplyRgShift * samples;
   // The extra shift enlarges the magnitude on the side of the shift's sign.
   ac.ApplyAzShift =
       ac.ApplyAzShift < 0.0 ? ac.ApplyAzShift - azimuthShift : ac.ApplyAzShift + azimuthShift;
@@ -385,34 +342,11 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
 
   GeneralSAR product;
   if (int st = product.GSread(input + ".hdr"); st != 0) return calledError(st);
-  product.dataFile.filename = output;
-  product.dataFile.NrOfPixelsPerLine = scene.outSamples;
-  product.dataFile.NrOfLinesPerImage = scene.outLines;
-  product.dataFile.RowPrefix = 0;
-  product.dataFile.HeaderOffset = 0;
-  product.dataFile.CellType = FLOAT_COMPLEX;
-  product.dataFile.ByteOrder = 0;
+  setFocusedProduct(product, output, scene, roi, conf, smp.lambda_m);
   ROI_Obj& out = product.roi.roi;
-  out.SetFastAxe(scene.firstSampleTime, roi.FastTimeDelta, scene.outSamples);
-  out.SetSlowAxe(scene.firstLineTime, roi.SlowTimeDelta, scene.outLines);
   product.polynomials.CreatePolys(1, 1);
   polyFromFlat(scene.polyDCOut, product.polynomials.DC[0]);
   polyFromFlat(scene.polyFROut, product.polynomials.FR[0]);
-  product.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
-  product.dataSetInfo.SWST_MIN = product.dataSetInfo.SWST_MAX = scene.firstSampleTime;
-  product.attitude.Eq_speed = scene.Veq;
-  product.attitude.Mean_DC = scene.centroid;
-  product.attitude.SquintAngle =
-      scene.Veq != 0.0
-          ? std::asin(-(smp.lambda_m * scene.centroid) / (2.0 * scene.Veq)) * 180.0 / kPi
-          : 0.0;
-  SpectralWindows_Obj& w = product.spectralWindows;
-  w.AzMatchedFilterType = "HAMMING";
-  w.RgMatchedFilterType = "HAMMING";
-  w.RgMatchedFilterCoef = a.RangeWindowHammingParameter;
-  w.AzMatchedFilterCoef = a.AzimuthWindowHammingParameter;
-  w.RgLookBandwidth = a.RangeLookBandwidth;
-  w.AzLookBandwidth = a.AzimuthLookBandwidth;
   if (int st = product.orbit().SVGetGeoCoords(&product.geoCoords, &out); st != 0)
     return calledError(st);
   for (GeneralSAR::GSObject o :
