@@ -4,7 +4,6 @@
 
 #include <climits>
 #include <cstdio>
-#include <fstream>
 #include <initializer_list>
 
 #include "base/status.h"
@@ -41,21 +40,6 @@ bool removeFile(const std::string& name) {
 // "<out><suffix>" for each suffix, in order.
 void removeAll(const std::string& out, std::initializer_list<const char*> suffixes) {
   for (const char* suffix : suffixes) removeFile(out + suffix);
-}
-
-// Polarisation of a PALSAR image file: transmit and receive codes are the
-// second and fourth byte at offset 772; 0 HH, 1 HV, 2 VH, 3 VV, 4 anything
-// else or an image that cannot be read.
-int palsarPolarisation(const std::string& image) {
-  std::ifstream in(image, std::ios::binary);
-  char code[4] = {};
-  if (!in || !in.seekg(772) || !in.read(code, 4)) return 4;
-  const int tx = code[1], rx = code[3];
-  if (tx == 0 && rx == 0) return 0;
-  if (tx == 0 && rx == 1) return 1;
-  if (tx == 1 && rx == 0) return 2;
-  if (tx == 1 && rx == 1) return 3;
-  return 4;
 }
 
 std::string palsarLabel(int code) {
@@ -176,22 +160,31 @@ int ATmultiplatformFocuser::fillEnvisat(envisatLevel0Focuser& focuser) {
     int selector;
     std::string (Envisat_level0::*getter)() const;
     const char* message;
+    const char* what;  // the file in the user's words
+    int input;         // its number in the job (INPUT FILE n, INPUT DIR n)
   };
   const AuxSearch searches[] = {
       {&auxFile1, &auxDirectory1, 5, &Envisat_level0::getOrbitFilename,
-       "Error in defining Envisat Orbit"},
+       "Error in defining Envisat Orbit", "DORIS orbit (DOR_VOR)", 1},
       {&auxFile2, &auxDirectory2, 2, &Envisat_level0::getASAINSFilename,
-       "Error in defining Envisat ASA_INS file"},
+       "Error in defining Envisat ASA_INS file", "ASA_INS", 2},
       {&auxFile3, &auxDirectory3, 3, &Envisat_level0::getASAXCAFilename,
-       "Error in defining Envisat ASA_XCA file"},
+       "Error in defining Envisat ASA_XCA file", "ASA_XCA", 3},
       {&auxFile4, &auxDirectory4, 4, &Envisat_level0::getASAXCHFilename,
-       "Error in defining Envisat ASA_XCH file"},
+       "Error in defining Envisat ASA_XCH file", "ASA_XCH", 4},
   };
   for (const AuxSearch& s : searches) {
     if (!s.file->empty()) continue;
     if (s.directory->empty()) return MP_FAIL(s.message, STATUS_BAD_PARAMETER);
     if (product.getAuxFiles(s.selector, *s.directory) != 0) MP_CALLED(STATUS_BAD_CONDITION);
     *s.file = (product.*s.getter)();
+    if (s.file->empty()) {
+      const std::string n = std::to_string(s.input);
+      ORV_REPORT("No ENVISAT " + std::string(s.what) + " valid for the scene found in " +
+                     *s.directory + ": give the file as INPUT FILE " + n +
+                     " or a folder holding it as INPUT DIR " + n,
+                 REPORT_ERROR);
+    }
   }
   focuser.orbitFilename = auxFile1;
   focuser.ASA_INSFilename = auxFile2;
@@ -213,6 +206,27 @@ int ATmultiplatformFocuser::fillPalsarFiles() {
   if (auxFile1.empty()) return MP_FAIL("Error in defining PALSAR Orbit", STATUS_BAD_PARAMETER);
   if (auxFile2.empty())
     return MP_FAIL("Error in defining PALSAR leader file", STATUS_BAD_PARAMETER);
+  return 0;
+}
+
+int ATmultiplatformFocuser::palsarSceneCount() const {
+  int count = 1;
+  if (!level0FilenameSecondPol.empty()) count = 2;
+  if (!level0FilenameThirdPol.empty()) count = 3;
+  if (!level0FilenameFourthPol.empty()) count = 4;
+  return count;
+}
+
+int ATmultiplatformFocuser::checkMultiPolPalsar(int sceneCount) const {
+  if (auxFile2.empty() || level0Filename.empty() || auxFile1.empty())
+    return STATUS_BAD_PARAMETER;
+  const PalsarTypes types(auxFile2, level0Filename);
+  if (types.is_singlepol() && sceneCount >= 2)
+    return MP_FAIL("detected a single polarization on this scene, trying to focus more than one ",
+                   STATUS_BAD_PARAMETER);
+  if (types.is_doublepol() && sceneCount > 2)
+    return MP_FAIL("detected a double polarization on this scene, trying to focus more than two ",
+                   STATUS_BAD_PARAMETER);
   return 0;
 }
 
@@ -268,6 +282,8 @@ int ATmultiplatformFocuser::InitProcessing() {
     focuser_ = std::move(radarsat);
   } else if (platform == "PALSAR" || platform == "PALSAR_ERSDAC") {
     status = fillPalsarFiles();
+    if (status == 0 && platform == "PALSAR" && !level0FilenameSecondPol.empty())
+      status = checkMultiPolPalsar(palsarSceneCount());
     if (status == 0)
       status = MP_FAIL("No PALSAR focuser in this build: the " + platform +
                            " scene cannot be focused",
@@ -312,13 +328,13 @@ void ATmultiplatformFocuser::eraseTemporaryPalsar() const {
     for (const std::string* scene : {&level0Filename, &level0FilenameSecondPol,
                                      &level0FilenameThirdPol, &level0FilenameFourthPol}) {
       if (scene->empty()) continue;
-      const std::string root = out + "_" + palsarLabel(palsarPolarisation(*scene));
+      const std::string root = out + "_" + palsarLabel(PalsarTypes(auxFile2, *scene).getPol());
       removeAll(root, {".chirp", ".extracted", ".extracted.interf", ".chirp.hdr",
                        ".extracted.hdr", ".extracted.interf.hdr", ".rgfoc", ".rgfoc.hdr"});
     }
     return;
   }
-  const std::string label = palsarLabel(palsarPolarisation(level0Filename));
+  const std::string label = palsarLabel(PalsarTypes(auxFile2, level0Filename).getPol());
   removeFile(out + ".chirp");
   removeFile(out + ".extracted_" + label);
   removeFile(out + ".extracted_" + label + ".interf");

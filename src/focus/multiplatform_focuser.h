@@ -54,6 +54,12 @@ class ATmultiplatformFocuser : public GeneralSAR_Base {
   int fillRadarsat(radarsatLevel0Focuser& focuser);
   // The parameter tests of the PALSAR fills (orbit and leader required).
   int fillPalsarFiles();
+  // Scenes of a PALSAR job: 1, or 2, 3, 4 for the last further scene given.
+  int palsarSceneCount() const;
+  // Leader, scene and orbit must be given; a single-polarisation product
+  // takes one scene, a double-polarisation one at most two (10 with the
+  // report otherwise).
+  int checkMultiPolPalsar(int sceneCount) const;
   // 10 (no text) when a field the sensor needs is empty.
   int checkErs(const ersLevel0Focuser& focuser) const;
   int checkEnvisat(const envisatLevel0Focuser& focuser) const;

@@ -399,3 +399,32 @@ TEST(ErsProfile, ChainReadsTheErsValues) {
   EXPECT_GE(2 * conf.AzimuthOverlap, aperture + 2 * walk);
   EXPECT_GT(conf.LinesInBlock, 2 * (2 * conf.AzimuthOverlap));
 }
+
+TEST(MultiplatformFocuser, PalsarSceneCountMustFitThePolarisationsOfTheProduct) {
+  Scratch s;
+  // JAXA leaders: the polarisation count at offset 1108.
+  auto leader = [&s](const std::string& name, const char* count) {
+    std::string bytes(2700, ' ');
+    bytes.replace(1108, 4, count);
+    return s.touch(name, bytes);
+  };
+  ATmultiplatformFocuser f;
+  f.platform = "PALSAR";
+  f.level0Filename = s.touch("IMG-HH", std::string(800, '\0'));
+  f.auxFile1 = "orbit";
+  EXPECT_EQ(f.palsarSceneCount(), 1);
+  f.level0FilenameSecondPol = "IMG-HV";
+  EXPECT_EQ(f.palsarSceneCount(), 2);
+  f.level0FilenameFourthPol = "IMG-VV";
+  EXPECT_EQ(f.palsarSceneCount(), 4);
+
+  EXPECT_EQ(f.checkMultiPolPalsar(2), 10);  // no leader
+  f.auxFile2 = leader("LED-single", "   1");
+  EXPECT_EQ(f.checkMultiPolPalsar(1), 0);
+  EXPECT_EQ(f.checkMultiPolPalsar(2), 10);
+  f.auxFile2 = leader("LED-double", "   2");
+  EXPECT_EQ(f.checkMultiPolPalsar(2), 0);
+  EXPECT_EQ(f.checkMultiPolPalsar(3), 10);
+  f.auxFile2 = leader("LED-quad", "   4");
+  EXPECT_EQ(f.checkMultiPolPalsar(4), 0);
+}
