@@ -26,6 +26,23 @@ int calledError(int status) {
   return status;
 }
 
+// What the rate estimation and azimuth focusing need of a range-focused
+// record; the rate only for azimuth focusing. 1 with the report.
+int checkFocusInputs(GeneralSAR& record, bool needRate) {
+  const char* missing = nullptr;
+  if (!record.GSexists(GeneralSAR::GS_DATAFILE))
+    missing = "Range focused image does not exist!";
+  else if (!record.GSexists(GeneralSAR::GS_POLYNOMIALS) || record.polynomials.ndc < 1)
+    missing = "Doppler Centroid Estimation does not exist!";
+  else if (needRate && record.polynomials.nfr < 1)
+    missing = "Doppler Rate Estimation does not exist!";
+  else if (!record.GSexists(GeneralSAR::GS_DATASETINFO))
+    missing = "DataSetInfo does not exist!";
+  if (!missing) return 0;
+  ORV_REPORT(missing, REPORT_ERROR);
+  return 1;
+}
+
 void removeReported(const std::string& name) {
   if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
 }
@@ -264,18 +281,7 @@ int stripmapGeneralFocuserModular::frEst(const std::string& file) {
   if (!configuration.generalConf.Flag_dcest) return 0;
   GeneralSAR record;
   record.GSread(file + ".hdr");
-  if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
-    ORV_REPORT("Range focused image does not exist!", REPORT_ERROR);
-    return 1;
-  }
-  if (!record.GSexists(GeneralSAR::GS_POLYNOMIALS) || record.polynomials.ndc < 1) {
-    ORV_REPORT("Doppler Centroid Estimation does not exist!", REPORT_ERROR);
-    return 1;
-  }
-  if (!record.GSexists(GeneralSAR::GS_DATASETINFO)) {
-    ORV_REPORT("DataSetInfo does not exist!", REPORT_ERROR);
-    return 1;
-  }
+  if (int st = checkFocusInputs(record, false); st != 0) return st;
   const int lookSign = record.dataSetInfo.LookDirection != -1 ? 1 : -1;
   record.orbit().setLookSign(lookSign);
   const polyDC dc = record.polynomials.DC[0];
@@ -296,22 +302,7 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
   if (!configuration.generalConf.Flag_azimuthfoc) return 0;
   GeneralSAR record;
   record.GSread(input + ".hdr");
-  if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
-    ORV_REPORT("Range focused image does not exist!", REPORT_ERROR);
-    return 1;
-  }
-  if (!record.GSexists(GeneralSAR::GS_POLYNOMIALS) || record.polynomials.ndc < 1) {
-    ORV_REPORT("Doppler Centroid Estimation does not exist!", REPORT_ERROR);
-    return 1;
-  }
-  if (record.polynomials.nfr < 1) {
-    ORV_REPORT("Doppler Rate Estimation does not exist!", REPORT_ERROR);
-    return 1;
-  }
-  if (!record.GSexists(GeneralSAR::GS_DATASETINFO)) {
-    ORV_REPORT("DataSetInfo does not exist!", REPORT_ERROR);
-    return 1;
-  }
+  if (int st = checkFocusInputs(record, true); st != 0) return st;
   const SARFocuser_conf conf = chainConfFrom(configuration);
   const SamplingConstants_Obj& smp = record.sampling;
   const ROI_Obj& roi = record.roi.roi;
