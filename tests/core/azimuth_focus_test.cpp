@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstdio>
 #include <cstring>
@@ -126,7 +127,7 @@ void checkTargets(const Geometry& g, const AzimuthFocusConf& conf, const Focused
     if (f > g.B / 2.0 || f >= rglook / 2.0) return 0.0;
     return pr + (1.0 - pr) * std::cos(kPi * f / (rglook / 2.0));
   });
-  std::vector<double> residual;
+  std::vector<double> residual, amplitude;
   for (const Target& t : f.targets) {
     const double row = (t.t0 - f.scene.firstLineTime) * g.prf;
     const double col = (2.0 * t.R0 / kC - f.scene.firstSampleTime) * g.frg;
@@ -142,7 +143,11 @@ void checkTargets(const Geometry& g, const AzimuthFocusConf& conf, const Focused
     EXPECT_NEAR(m.az.islr, thAz.islr, 1.0);
     EXPECT_NEAR(m.rg.islr, thRg.islr, 1.0);
     residual.push_back(m.phase + 4.0 * kPi * t.R0 / lam);
+    amplitude.push_back(m.amplitude);
   }
+  // Equal targets come out equally bright in every block and sub-block.
+  const auto [lo, hi] = std::minmax_element(amplitude.begin(), amplitude.end());
+  EXPECT_LT(*hi / *lo, 1.02);
   // Peak phases agree with -4 pi R0 / lambda up to one constant.
   std::complex<double> mean = 0.0;
   for (double r : residual) mean += std::polar(1.0, r);

@@ -159,6 +159,7 @@ inline Profile theoryProfile(const std::function<double(double)>& w, int ppp = 1
 struct PointMeasure {
   double row = 0.0, col = 0.0;  // peak position, pixels
   double phase = 0.0;           // radians, at the peak
+  double amplitude = 0.0;       // at the peak
   Profile az, rg;
 };
 
@@ -232,6 +233,7 @@ inline PointMeasure measure(const fcomplex* img, int rows, int cols, double row,
   m.col = pc + (uc + dcol) / U;
   // Phase at the peak with the baseband shift put back.
   const double rr = (ur + dr) / U - P / 2, cc = (uc + dcol) / U - P / 2;
+  m.amplitude = std::abs(big[imax]);
   m.phase = std::arg(std::complex<double>(big[imax]) *
                      std::polar(1.0, 2.0 * kPi * (fa * rr + fr * cc)));
   std::vector<double> az(M), rg(M);
