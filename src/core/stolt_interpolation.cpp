@@ -415,8 +415,8 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
 #pragma omp parallel for schedule(dynamic, 8)
   for (int j = 0; j < nl; ++j) {
     RowBuffers& rb = buffers[threadIndex()];
-    fcomplex* spec = rb.a.data() + guard;
-    fcomplex* buf = spec - H;  // tap m of output u reads buf[u + m]
+    fcomplex* spectrum = rb.a.data() + guard;
+    fcomplex* buf = spectrum - H;  // tap m of output u reads buf[u + m]
     fcomplex* line = rb.b.data();
     int ilo, ihi;
     grid.usable(std::sqrt(kis * kis - kx2[j]), std::sqrt(kie * kie - kx2[j]), ilo, ihi);
@@ -427,12 +427,12 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
       const fcomplex* row = par.data + static_cast<std::size_t>(j) * ns;
       // The row starts the padded window; R2 moves its content to the middle
       // of the window for the interpolation and R3 moves it back.
-      std::copy(row, row + ns, spec);
-      pfft_c(rowFwd, spec, spec);
-      fftshift(spec, padded);
+      std::copy(row, row + ns, spectrum);
+      pfft_c(rowFwd, spectrum, spectrum);
+      fftshift(spectrum, padded);
       const double azPhase = (kx[j] - kxc) * az;
       for (int i = 0; i < padded; ++i) {
-        fcomplex v = spec[i];
+        fcomplex v = spectrum[i];
         if (conj) v = std::conj(v);
         const double k = kin[i];
         const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * R2 - (k - k0) * rg + azPhase;
@@ -448,7 +448,7 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
             N += P * W * W;
           }
         }
-        spec[i] = scaled(v, W * S);
+        spectrum[i] = scaled(v, W * S);
       }
       for (int q = ilo; q <= ihi; ++q) {
         const double x = std::fabs(std::sqrt(grid.kz[q] * grid.kz[q] + kx2[j]) - kis) / dki;
