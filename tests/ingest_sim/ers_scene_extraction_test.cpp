@@ -167,7 +167,9 @@ TEST_F(ErsSceneTest, DroppedLineAndCorruptWindowCode) {
   const auto sim = write();
   ATERSExtractor x;
   aim(x, *sim);
+  x.ChirpFile.clear();
   ASSERT_EQ(x.run(), 0);
+  EXPECT_FALSE(fs::exists(out() + ".chirp"));  // no chirp asked for
   const int n = kLines - 1;
   ASSERT_EQ(x.getVectorLength(), n);
   // The corrupt code is replaced by the previous one.
