@@ -133,9 +133,17 @@ int ATmultiplatformFocuser::fillErs(ersLevel0Focuser& focuser) {
     if (auxDirectory1.empty()) return MP_FAIL("Error in defining Ers Orbit", STATUS_BAD_PARAMETER);
     // The product is the scene directory; its leader gives the time of the
     // arc to look for in the archive.
+    const std::string productDirectory = scenePathDirectory(level0Filename);
     Ers_level0 product;
-    product.setfileName(scenePathDirectory(level0Filename));
-    if (product.getAuxFiles(3, auxDirectory1) != 0) MP_CALLED(STATUS_BAD_CONDITION);
+    product.setfileName(productDirectory);
+    if (product.getAuxFiles(3, auxDirectory1) != 0) {
+      MP_CALLED(STATUS_BAD_CONDITION);
+      ORV_REPORT("The ERS orbit cannot be looked up: the leader LEA_01.001 of " +
+                     productDirectory +
+                     " gives no ERS-1 or ERS-2 acquisition time; give the orbit file as INPUT "
+                     "FILE 1",
+                 REPORT_ERROR);
+    }
     auxFile1 = product.getOrbitFilename();
     if (auxFile1.empty())
       ORV_REPORT("No ERS orbit arc found for the scene in " + auxDirectory1 +

@@ -150,3 +150,24 @@ TEST(ErsJobFailures, OrbitArcThatDoesNotCoverTheSceneEndsTheExtraction) {
   EXPECT_TRUE(contains(run.log, later.orbit)) << run.log;
   EXPECT_FALSE(fs::exists(dir / "out.rgfoc"));
 }
+
+TEST(ErsJobFailures, OrbitLookUpNeedsTheLeaderBesideTheImage) {
+  Folder dir("moved");
+  SceneFiles files;
+  std::string error;
+  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  // The image alone in another folder: the look-up reads the leader of the
+  // image's folder for the acquisition time.
+  fs::create_directories(dir / "alone");
+  fs::copy_file(files.image, dir / "alone/DAT_01.001");
+  std::vector<std::string> p = ersJob(files, dir / "out");
+  p[1] = dir / "alone/DAT_01.001";
+  p[6] = "NotOK";
+  p[11] = files.orbitArchive;
+  writeJob(dir / "job.txt", p);
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  expectStageFailure(run, "InitProcessing()");
+  EXPECT_TRUE(contains(run.log, "The ERS orbit cannot be looked up: the leader LEA_01.001 of " +
+                                    (dir / "alone")))
+      << run.log;
+}
