@@ -100,6 +100,20 @@ int searchAuxProduct(double time, const std::string& path, int (EnvisatTypes::*t
   return STATUS_OK;
 }
 
+// Validity start (stop false) or stop of a named product through its parser.
+template <class Parse>
+int validityTime(const std::string& fileName, bool stop, double* t, Parse parse) {
+  if (fileName.empty()) {
+    ORV_REPORT(stop ? "File not set, cannot find stop time" : "File not set, cannot find start time",
+               REPORT_ERROR);
+    return 1;
+  }
+  double first = 0.0, last = 0.0;
+  if (parse(&first, &last) != 0) return 1;
+  *t = stop ? last : first;
+  return 0;
+}
+
 }  // namespace
 
 // ---- base ------------------------------------------------------------------------
@@ -207,25 +221,17 @@ int Envisat_AuxProduct::parseASAfilename(double* generation, double* start, doub
 }
 
 int Envisat_AuxProduct::getTimeStart(double* t) {
-  if (fileName_.empty()) {
-    ORV_REPORT("File not set, cannot find start time", REPORT_ERROR);
-    return 1;
-  }
-  double generation, start, stop;
-  if (parseASAfilename(&generation, &start, &stop) != 0) return 1;
-  *t = start;
-  return 0;
+  return validityTime(fileName_, false, t, [this](double* start, double* stop) {
+    double generation;
+    return parseASAfilename(&generation, start, stop);
+  });
 }
 
 int Envisat_AuxProduct::getTimeStop(double* t) {
-  if (fileName_.empty()) {
-    ORV_REPORT("File not set, cannot find stop time", REPORT_ERROR);
-    return 1;
-  }
-  double generation, start, stop;
-  if (parseASAfilename(&generation, &start, &stop) != 0) return 1;
-  *t = stop;
-  return 0;
+  return validityTime(fileName_, true, t, [this](double* start, double* stop) {
+    double generation;
+    return parseASAfilename(&generation, start, stop);
+  });
 }
 
 int Envisat_ASA_INS::getASA_INS(double time, const std::string& path) {
@@ -257,25 +263,11 @@ int Envisat_DorVor::parseOrbitName(double* start, double* stop) const {
 }
 
 int Envisat_DorVor::getTimeStart(double* t) {
-  if (fileName_.empty()) {
-    ORV_REPORT("File not set, cannot find start time", REPORT_ERROR);
-    return 1;
-  }
-  double start, stop;
-  if (parseOrbitName(&start, &stop) != 0) return 1;
-  *t = start;
-  return 0;
+  return validityTime(fileName_, false, t, [this](double* a, double* b) { return parseOrbitName(a, b); });
 }
 
 int Envisat_DorVor::getTimeStop(double* t) {
-  if (fileName_.empty()) {
-    ORV_REPORT("File not set, cannot find stop time", REPORT_ERROR);
-    return 1;
-  }
-  double start, stop;
-  if (parseOrbitName(&start, &stop) != 0) return 1;
-  *t = stop;
-  return 0;
+  return validityTime(fileName_, true, t, [this](double* a, double* b) { return parseOrbitName(a, b); });
 }
 
 int Envisat_DorVor::getDorVor(double time, const std::string& path) {

@@ -205,6 +205,8 @@ TEST(SarProductTest, EnvisatAuxiliarySearches) {
   ASSERT_EQ(orbit.parseOrbitName(&start, &stop), 0);
   EXPECT_DOUBLE_EQ(start, ascii2sec85("14-MAR-2007 00:00:00"));
   EXPECT_DOUBLE_EQ(stop, ascii2sec85("16-MAR-2007 00:00:00"));
+  ASSERT_EQ(orbit.getTimeStop(&v), 0);
+  EXPECT_DOUBLE_EQ(v, stop);
   Envisat_DorVor noOrbit;
   EXPECT_EQ(noOrbit.getDorVor(-1.0, aux.str()), 1);
   EXPECT_EQ(noOrbit.getDorVor(t, ""), 1);
