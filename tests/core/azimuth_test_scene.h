@@ -67,12 +67,12 @@ struct Target {
 inline std::vector<fcomplex> simulate(const Geometry& g, const std::vector<Target>& targets) {
   const int N = g.samples;
   std::vector<fcomplex> img(static_cast<std::size_t>(g.lines) * N, fcomplex(0.0f, 0.0f));
-  std::vector<std::complex<double>> spec(N);
+  std::vector<std::complex<double>> lineSpectrum(N);
   FFTBuffer line(N);
   const double lam = g.lambda();
   for (int n = 0; n < g.lines; ++n) {
     const double t = n / g.prf;
-    std::fill(spec.begin(), spec.end(), std::complex<double>(0.0, 0.0));
+    std::fill(lineSpectrum.begin(), lineSpectrum.end(), std::complex<double>(0.0, 0.0));
     bool any = false;
     for (const Target& tg : targets) {
       const double dt = t - tg.t0;
@@ -85,12 +85,12 @@ inline std::vector<fcomplex> simulate(const Geometry& g, const std::vector<Targe
       for (int m = 0; m < N; ++m) {
         const double f = (m < N / 2 ? m : m - N) * g.frg / N;
         if (std::fabs(f) > g.B / 2.0) continue;
-        spec[m] += std::polar(a, carrier - 2.0 * kPi * f * tau);
+        lineSpectrum[m] += std::polar(a, carrier - 2.0 * kPi * f * tau);
       }
       any = true;
     }
     if (!any) continue;
-    for (int m = 0; m < N; ++m) line[m] = fcomplex(spec[m]);
+    for (int m = 0; m < N; ++m) line[m] = fcomplex(lineSpectrum[m]);
     fft_c(N, N, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, line.data(), line.data());
     std::copy(line.begin(), line.end(), img.begin() + static_cast<std::ptrdiff_t>(n) * N);
   }
