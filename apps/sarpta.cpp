@@ -1,6 +1,6 @@
 // sarpta: point-target analysis of a focused FLOAT_COMPLEX raster against
 // the simulator's truth file. Prints a table and optionally writes JSON.
-//   sarpta --raster FILE --lines N --samples M --truth FILE [options]
+//   sarpta --raster FILE --truth FILE [--record FILE] [options]
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "product/data_file.h"
+#include "product/general_sar.h"
 #include "sim/point_target.h"
 #include "sim/raw_scene.h"
 
@@ -19,6 +20,8 @@ void usage() {
   std::fprintf(stderr,
                "usage: sarpta --raster FILE --truth FILE [--lines N --samples M] [options]\n"
                "  (without --lines and --samples the layout comes from FILE.hdr)\n"
+               "  --record FILE              product record (e.g. out_slc.TessivorParameterExtracted):\n"
+               "                             layout, time axes, windows and look bands from it\n"
                "  --big-endian               samples stored most significant byte first\n"
                "  --header-bytes B           bytes before the first line (0)\n"
                "  --first-line-time T        azimuth time of line 0, s since 1985 (truth: first line)\n"
@@ -93,21 +96,56 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "sarpta: --window must be a power of two of at least 8\n");
     return 10;
   }
-  opt.azimuth = {num("--azimuth-window", 1.0), num("--azimuth-band", 1.0)};
-  opt.range = {num("--range-window", 1.0), num("--range-band", std::fabs(chirpBand) / fs)};
+  // Defaults from the truth, replaced by the product record when one is
+  // given, and by explicit options above both.
+  double azWindow = 1.0, azBand = 1.0, rgWindow = 1.0, rgBand = std::fabs(chirpBand) / fs;
+  double t0 = firstLine, dt = 1.0 / prf, r0 = swst, dr = 1.0 / fs;
+  long lines = 0, samples = 0;
+  bool big = false;
+  GeneralSAR record;
+  const bool haveRecord = a.count("--record") > 0;
+  if (haveRecord) {
+    if (record.GSread(a["--record"]) != 0) {
+      std::fprintf(stderr, "sarpta: %s: not a readable product record\n", a["--record"].c_str());
+      return 9;
+    }
+    const ROI_Obj& roi = record.roi.roi;
+    const SpectralWindows_Obj& w = record.spectralWindows;
+    lines = roi.Lines;
+    samples = roi.Samples;
+    t0 = roi.SlowStartTime;
+    dt = roi.SlowTimeDelta;
+    r0 = roi.FastStartTime;
+    dr = roi.FastTimeDelta;
+    azWindow = w.AzMatchedFilterCoef;
+    azBand = w.AzLookBandwidth;
+    rgWindow = w.RgMatchedFilterCoef;
+    rgBand = w.RgLookBandwidth;
+    big = record.dataFile.ByteOrder == 1;
+    if (lines <= 0 || samples <= 0 || dt <= 0 || dr <= 0 || azBand <= 0 || rgBand <= 0) {
+      std::fprintf(stderr, "sarpta: %s: record lacks the image layout, time axes or look bands\n",
+                   a["--record"].c_str());
+      return 10;
+    }
+  }
+  opt.azimuth = {num("--azimuth-window", azWindow), num("--azimuth-band", azBand)};
+  opt.range = {num("--range-window", rgWindow), num("--range-band", rgBand)};
   opt.azimuthSpacing = num("--azimuth-spacing", azSpacing);
   opt.rangeSpacing = num("--range-spacing", rgSpacing);
-  const double t0 = num("--first-line-time", firstLine), dt = num("--line-time-step", 1.0 / prf);
-  const double r0 = num("--first-range-time", swst), dr = num("--range-time-step", 1.0 / fs);
+  t0 = num("--first-line-time", t0);
+  dt = num("--line-time-step", dt);
+  r0 = num("--first-range-time", r0);
+  dr = num("--range-time-step", dr);
   const double rangeOffset = a.count("--no-range-offset") ? 0.0 : offset;
 
-  long lines = 0, samples = 0;
-  bool big = a.count("--big-endian") > 0;
+  if (a.count("--big-endian")) big = true;
   long long headerBytes = static_cast<long long>(num("--header-bytes", 0));
   int prefix = 0;
   if (a.count("--lines") && a.count("--samples")) {
     lines = std::atol(a["--lines"].c_str());
     samples = std::atol(a["--samples"].c_str());
+  } else if (haveRecord) {
+    // Layout and byte order from the record.
   } else {
     DataFile raster;
     raster.filename = a["--raster"];

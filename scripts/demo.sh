@@ -131,15 +131,8 @@ echo "  truth of targets   $SIM/truth.txt"
 #    time axes and spectral windows.
 echo
 echo "== Point-target analysis (sarpta)"
-BIG=()
-[ "$(value ByteOrder)" = "1" ] && BIG=(--big-endian)
-"$BIN/sarpta" --raster "$PRODUCT" --truth "$SIM/truth.txt" \
-  --lines "$LINES" --samples "$SAMPLES" \
-  --first-line-time "$(value SlowStartTime)" --line-time-step "$(value SlowTimeDelta)" \
-  --first-range-time "$(value FastStartTime)" --range-time-step "$(value FastTimeDelta)" \
-  --azimuth-window "$(value AzMatchedFilterCoef)" --azimuth-band "$(value AzLookBandwidth)" \
-  --range-window "$(value RgMatchedFilterCoef)" --range-band "$(value RgLookBandwidth)" \
-  --json "$DEMO/pta.json" "${BIG[@]}"
+"$BIN/sarpta" --raster "$PRODUCT" --truth "$SIM/truth.txt" --record "$STORE" \
+  --json "$DEMO/pta.json"
 echo
 echo "dLine, dSample: peak minus truth in pixels; irw in pixels (M: metres); pslr, islr in dB;"
 echo "dPhase: peak phase minus -4 pi R0 / lambda, radians. JSON: $DEMO/pta.json"

@@ -308,22 +308,11 @@ inline std::string number(double v) {
   return text;
 }
 
-// sarpta on a focused product with the time axes and spectral windows of
-// its record, against the truth of the simulation.
+// sarpta on a focused product, reading the time axes and spectral windows
+// from the product's record, against the truth of the simulation.
 inline PtaReport analyseProduct(const std::string& folder, const std::string& product,
-                                GeneralSAR& record, const std::string& truth) {
-  const ROI_Obj& roi = record.roi.roi;
-  const SpectralWindows_Obj& w = record.spectralWindows;
-  std::vector<std::string> args = {
-      "--raster", product, "--truth", truth, "--lines", std::to_string(roi.Lines), "--samples",
-      std::to_string(roi.Samples), "--first-line-time", number(roi.SlowStartTime),
-      "--line-time-step", number(roi.SlowTimeDelta), "--first-range-time",
-      number(roi.FastStartTime), "--range-time-step", number(roi.FastTimeDelta),
-      "--azimuth-window", number(w.AzMatchedFilterCoef), "--azimuth-band",
-      number(w.AzLookBandwidth), "--range-window", number(w.RgMatchedFilterCoef), "--range-band",
-      number(w.RgLookBandwidth)};
-  if (record.dataFile.ByteOrder == 1) args.push_back("--big-endian");
-  return runSarpta(folder, args);
+                                const std::string& recordFile, const std::string& truth) {
+  return runSarpta(folder, {"--raster", product, "--truth", truth, "--record", recordFile});
 }
 
 // Impulse-response shape of every target against the theory of the

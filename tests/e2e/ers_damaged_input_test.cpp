@@ -54,7 +54,7 @@ TEST(ErsDamagedInput, DroppedLineIsFlaggedInTheRecordAndTheSceneStillFocuses) {
   EXPECT_EQ(product.dataSetInfo.MissingLines, 4095 - 400);
 
   const PtaReport pta =
-      analyseProduct(dir.str(), dir / "out_slc", product, focused.files.truth);
+      analyseProduct(dir.str(), dir / "out_slc", dir / "out_slc.TessivorParameterExtracted", focused.files.truth);
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
   // The lines after the gap moved up by one: the echoes of every target lie
   // behind it, so each appears one line early, exactly.
@@ -83,7 +83,7 @@ TEST(ErsDamagedInput, CorruptedWindowCodesAreReplacedByThePreviousOne) {
   EXPECT_NEAR(raw.dataSetInfo.SWST_MIN, ersSwstSeconds(RawSceneSimulator(scene).swstCode()), 1e-9);
 
   const PtaReport pta =
-      analyseProduct(dir.str(), dir / "out_slc", product, focused.files.truth);
+      analyseProduct(dir.str(), dir / "out_slc", dir / "out_slc.TessivorParameterExtracted", focused.files.truth);
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
   for (const PtaTarget& t : pta.targets) {
     EXPECT_LT(std::fabs(t.errorLine), 0.1) << pta.table;

@@ -83,7 +83,7 @@ TEST(ErsEndToEnd, FullSwathSceneFocusedWithinTheImageQualityBounds) {
 
   // Point targets against the truth, with the theory of the product's
   // windows.
-  const PtaReport pta = analyseProduct(dir.str(), product, record, files.truth);
+  const PtaReport pta = analyseProduct(dir.str(), product, store, files.truth);
   ASSERT_EQ(pta.exitStatus, 0) << pta.table;
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
   std::vector<double> phases;

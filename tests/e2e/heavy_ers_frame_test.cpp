@@ -32,7 +32,7 @@ TEST(HeavyErsFrame, TwoAzimuthBlocksWithANegativeCentroid) {
   GeneralSAR record;
   ASSERT_EQ(record.GSread(dir / "out_slc.TessivorParameterExtracted"), 0);
   EXPECT_EQ(record.roi.roi.Lines, 10240 - 2560);
-  const PtaReport pta = analyseProduct(dir.str(), dir / "out_slc", record, files.truth);
+  const PtaReport pta = analyseProduct(dir.str(), dir / "out_slc", dir / "out_slc.TessivorParameterExtracted", files.truth);
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
   std::vector<double> phases;
   for (const PtaTarget& t : pta.targets) {
