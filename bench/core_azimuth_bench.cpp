@@ -3,9 +3,11 @@
 // full azimuth overlap 2560, 1024-sample range sub-blocks with overlap 64),
 // with the kernel without interpolation (0) and the least-squares Stolt
 // kernel (7), on 1 and 2 threads. Counters: input and output lines per
-// second, the share of the time FFTW alone needs for the block transforms,
-// and the speed-up over one thread. The raster is written once into
-// TESSIVOR_BENCH_DIR (or the temporary folder) and removed at exit.
+// second, input lines per CPU second of the process (all threads, user and
+// system: the cost on a shared machine), the share of the time FFTW alone
+// needs for the block transforms, and the speed-up over one thread. The
+// raster is written once into TESSIVOR_BENCH_DIR (or the temporary folder)
+// and removed at exit.
 #include <benchmark/benchmark.h>
 
 #include <chrono>
@@ -19,6 +21,7 @@
 #include <utility>
 #include <vector>
 
+#include <sys/resource.h>
 #include <unistd.h>
 
 #ifdef _OPENMP
@@ -91,6 +94,14 @@ struct Scene {
   ~Scene() { std::filesystem::remove_all(dir); }
 };
 
+// CPU seconds of the whole process (every thread), user plus system.
+double processCpuSeconds() {
+  rusage u{};
+  getrusage(RUSAGE_SELF, &u);
+  return u.ru_utime.tv_sec + u.ru_utime.tv_usec * 1e-6 + u.ru_stime.tv_sec +
+         u.ru_stime.tv_usec * 1e-6;
+}
+
 Scene& scene() {
   static Scene s;
   return s;
@@ -138,18 +149,21 @@ void BM_AzimuthFocusFromDisk(benchmark::State& state) {
   setThreads(threads);
   AzimuthFocusConf conf = s.conf;
   conf.PerformInterpolation = interp;
-  double seconds = 0.0;
+  double seconds = 0.0, cpu = 0.0;
   AzimuthFocusScene sc = s.scene;
   for (auto _ : state) {
     sc = s.scene;
+    const double c0 = processCpuSeconds();
     const auto t0 = std::chrono::steady_clock::now();
     const int st = azimuthfoc(s.files, sc, conf);
     seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - t0).count();
+    cpu = processCpuSeconds() - c0;
     if (st != 0) state.SkipWithError("azimuthfoc failed");
   }
   const int subBlocks = (kSamples - 64 + (1024 - 64) - 1) / (1024 - 64);
   const double fft = fftOnlySeconds(subBlocks);
   state.counters["in_lines_per_s"] = kLines / seconds;
+  state.counters["in_lines_per_cpu_s"] = kLines / cpu;
   state.counters["out_lines_per_s"] = sc.outLines / seconds;
   state.counters["fft_share"] = fft / seconds;
   if (threads == 1) oneThreadSeconds()[interp] = seconds;

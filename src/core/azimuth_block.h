@@ -1,4 +1,6 @@
 #pragma once
+#include <cmath>
+
 #include "base/fcomplex.h"
 
 // Omega-K focusing of one azimuth block: the block parameter record, the
@@ -113,6 +115,7 @@ struct WKWeighting {
   double azw = 0.0, rgw = 0.0;
   double aperture = 0.0, a = 0.0, b = 0.0, c = 0.0, d = 0.0;
   double L = 0.0, Bx = 0.0, Bk = 0.0, sq = 0.0, k0 = 0.0;
+  double ssq = 0.0, csq = 1.0;  // sin and cos of sq
   // Calls WindowPars on par (so it may reset par.azw / par.rgw).
   explicit WKWeighting(AzimuthBlockPar& par);
   // Range window term of wavenumber k (1 when rgw is 0).
@@ -120,3 +123,53 @@ struct WKWeighting {
   // Whitening times azimuth window at (k, kx); P receives the pattern term.
   double azimuthTerm(double k, double kx, double& P) const;
 };
+
+// sin and cos of x together, for the phase rotations of the kernels: the
+// argument is reduced by pi/2 in two steps (exact for |x| below 1e6, which
+// covers the range phases of any block) and the quadrant polynomials keep
+// the result within a few units of the last double place. Larger or
+// non-finite arguments go to the library functions.
+inline void wk_sincos(double x, double& s, double& c) {
+  if (!(std::fabs(x) < 1.0e6)) {
+    s = std::sin(x);
+    c = std::cos(x);
+    return;
+  }
+  constexpr double invpio2 = 6.36619772367581382433e-01;
+  constexpr double pio2_1 = 1.57079632673412561417e+00;   // first 33 bits of pi/2
+  constexpr double pio2_1t = 6.07710050650619224932e-11;  // pi/2 - pio2_1
+  constexpr double shifter = 6755399441055744.0;          // 1.5 * 2^52
+  const double fn = (x * invpio2 + shifter) - shifter;
+  const int q = static_cast<int>(fn) & 3;
+  const double r = (x - fn * pio2_1) - fn * pio2_1t;
+  const double z = r * r;
+  const double sr =
+      r + r * z *
+              (-1.66666666666666324348e-01 +
+               z * (8.33333333332248946124e-03 +
+                    z * (-1.98412698298579493134e-04 +
+                         z * (2.75573137070700676789e-06 +
+                              z * (-2.50507602534068634195e-08 +
+                                   z * 1.58969099521155010221e-10)))));
+  const double cr =
+      1.0 - 0.5 * z +
+      z * z *
+          (4.16666666666666019037e-02 +
+           z * (-1.38888888888741095749e-03 +
+                z * (2.48015872894767294178e-05 +
+                     z * (-2.75573143513906633035e-07 +
+                          z * (2.08757232129817482790e-09 +
+                               z * -1.13596475577881948265e-11)))));
+  const double ss = (q & 1) ? cr : sr;
+  const double cc = (q & 1) ? sr : cr;
+  s = (q & 2) ? -ss : ss;
+  c = ((q + 1) & 2) ? -cc : cc;
+}
+
+// x * exp(j phase), the rotation narrowed to float.
+inline fcomplex wk_rotate(fcomplex x, double phase) {
+  double sd, cd;
+  wk_sincos(phase, sd, cd);
+  const float c = static_cast<float>(cd), s = static_cast<float>(sd);
+  return fcomplex(x.real() * c - x.imag() * s, x.real() * s + x.imag() * c);
+}

@@ -45,10 +45,13 @@ int threadIndex() {
 }
 
 // x * exp(j phase), the rotation narrowed to float.
-inline fcomplex rotate(fcomplex x, double phase) {
-  const float c = static_cast<float>(std::cos(phase));
-  const float s = static_cast<float>(std::sin(phase));
-  return fcomplex(x.real() * c - x.imag() * s, x.real() * s + x.imag() * c);
+inline fcomplex rotate(fcomplex x, double phase) { return wk_rotate(x, phase); }
+
+// exp(j phase) narrowed to float.
+inline fcomplex unitPhasor(double phase) {
+  double s, c;
+  wk_sincos(phase, s, c);
+  return fcomplex(static_cast<float>(c), static_cast<float>(s));
 }
 
 // Plain complex product (no special cases for infinities).
@@ -160,7 +163,7 @@ class Zoom {
  private:
   double ph(long long n) const { return static_cast<double>(n) * static_cast<double>(n) * a_ / 2.0; }
   static fcomplex unit(double p) {
-    return fcomplex(static_cast<float>(std::cos(p)), static_cast<float>(std::sin(p)));
+    return unitPhasor(p);
   }
   int M_ = 0, K_ = 0, L_ = 0;
   double a_ = 0.0;
@@ -316,19 +319,18 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
       // of the range window (minus half a turn per input step) taken out,
       // then the row's azimuth and range references.
       const double theta = (kx[j] - kxc) * az + dk[j] * Rp;
-      const float ct = static_cast<float>(std::cos(theta));
-      const float st = static_cast<float>(std::sin(theta));
-      const fcomplex et(ct, st);
+      const fcomplex et = unitPhasor(theta);
       for (int q = ilo; q <= ihi; ++q) {
         const double t = (std::sqrt(grid.kz[q] * grid.kz[q] + kx2[j]) - k0 - a) / dki;
         const double u = std::floor(t);
         const double f = t - u;
         const int iu = static_cast<int>(u);
         if (iu < 0 || iu >= Nin) continue;
-        const fcomplex w1(static_cast<float>((1.0 - f) * std::cos(-kPi * f)),
-                          static_cast<float>((1.0 - f) * std::sin(-kPi * f)));
-        const fcomplex w2(static_cast<float>(f * std::cos(kPi * (1.0 - f))),
-                          static_cast<float>(f * std::sin(kPi * (1.0 - f))));
+        // exp(-j pi f) and exp(j pi (1 - f)) = -exp(-j pi f)*.
+        double sf, cf;
+        wk_sincos(kPi * f, sf, cf);
+        const fcomplex w1(static_cast<float>((1.0 - f) * cf), static_cast<float>(-(1.0 - f) * sf));
+        const fcomplex w2(static_cast<float>(-f * cf), static_cast<float>(f * sf));
         const fcomplex y = mul(w1, G[iu]) + mul(w2, G[iu + 1]);
         line[grid.idx[q]] = mul(y, et);
       }
@@ -400,6 +402,16 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
   const double R2 = par.Req - po * grid.dr * std::cos(grid.sq);
   const double R3 = po * grid.dr * std::cos(grid.sq);
 
+  // Range reference of the output wavenumbers, the same for every row.
+  std::vector<fcomplex> back;
+  try {
+    back.resize(M);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Out of memory in the least-squares Stolt kernel", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  for (int q = 0; q < M; ++q) back[q] = unitPhasor((grid.kz[q] - grid.kzc) * R3);
+
   FFTPlan rowFwd, inv;
   if (fft_makep_c(rowFwd, padded, padded, 1, 1, grid.dir, FFT_NONE, 1) != 0 ||
       fft_makep_c(inv, M, M, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0 ||
@@ -460,7 +472,7 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
         const fcomplex* s = buf + iu;
         fcomplex y(0.0f, 0.0f);
         for (int m = 0; m < taps; ++m) y += mul(h[m], s[m]);
-        line[grid.idx[q]] = rotate(y, (grid.kz[q] - kzc) * R3);
+        line[grid.idx[q]] = mul(y, back[q]);
       }
       pfft_c(inv, line, line);
     }

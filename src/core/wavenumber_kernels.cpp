@@ -32,7 +32,20 @@ double rateAt(const AzimuthBlockPar& par, double t) {
 double sinc(double u) {
   if (u == 0.0) return 1.0;
   const double a = kPi * u;
-  return std::sin(a) / a;
+  double s, c;
+  wk_sincos(a, s, c);
+  return s / a;
+}
+
+// Pattern term with sin(sq - asin(x)) = sin(sq) sqrt(1 - x^2) - cos(sq) x,
+// which spares the arcsines and sines of the direct form.
+double patternTerm(double L, double ssq, double csq, double k, double kx, double Bx) {
+  const double xc = kx / k, xm = (kx - Bx) / k, xp = (kx + Bx) / k;
+  const double sc = sinc(L * (ssq * std::sqrt(1.0 - xc * xc) - csq * xc));
+  const double sm = sinc(L * (ssq * std::sqrt(1.0 - xm * xm) - csq * xm));
+  const double sp = sinc(L * (ssq * std::sqrt(1.0 - xp * xp) - csq * xp));
+  const double sc2 = sc * sc, sm2 = sm * sm, sp2 = sp * sp;
+  return sc2 * sc2 + sm2 * sm2 + sp2 * sp2;
 }
 
 double squintOf(const AzimuthBlockPar& par) {
@@ -97,11 +110,7 @@ double wk_raised_cosine(double excess, double width, double pedestal) {
 }
 
 double wk_pattern_term(double L, double sq, double k, double kx, double Bx) {
-  const double sc = sinc(L * std::sin(sq - std::asin(kx / k)));
-  const double sm = sinc(L * std::sin(sq - std::asin((kx - Bx) / k)));
-  const double sp = sinc(L * std::sin(sq - std::asin((kx + Bx) / k)));
-  const double sc2 = sc * sc, sm2 = sm * sm, sp2 = sp * sp;
-  return sc2 * sc2 + sm2 * sm2 + sp2 * sp2;
+  return patternTerm(L, std::sin(sq), std::cos(sq), k, kx, Bx);
 }
 
 WKWeighting::WKWeighting(AzimuthBlockPar& par) {
@@ -114,6 +123,8 @@ WKWeighting::WKWeighting(AzimuthBlockPar& par) {
   Bx = kTwoPi * par.prf / par.Veq;
   Bk = kFourPi * par.frg / kC;
   sq = squintOf(par);
+  ssq = std::sin(sq);
+  csq = std::cos(sq);
   k0 = kFourPi * par.fc / kC;
 }
 
@@ -123,7 +134,7 @@ double WKWeighting::rangeTerm(double k) const {
 }
 
 double WKWeighting::azimuthTerm(double k, double kx, double& P) const {
-  P = wk_pattern_term(L, sq, k, kx, Bx);
+  P = patternTerm(L, ssq, csq, k, kx, Bx);
   const double wh = whiten ? 1.0 / (std::sqrt(P) + 0.0001) : 1.0;
   double aw = 1.0;
   if (azw != 0.0)
@@ -168,9 +179,10 @@ void RngShift(const fcomplex* in, int n, double step, double k, fcomplex* out, i
   const double sk = step * k;
   const double ko = k * offset;
   for (int i = 0; i < n; ++i) {
-    const double phase = i * sk + ko;
-    const float c = static_cast<float>(std::cos(phase));
-    const float s = static_cast<float>(std::sin(phase));
+    double sd, cd;
+    wk_sincos(i * sk + ko, sd, cd);
+    const float c = static_cast<float>(cd);
+    const float s = static_cast<float>(sd);
     const float re = in[i].real(), im = in[i].imag();
     out[i] = fcomplex((re * c - im * s) / div, (re * s + im * c) / div);
   }
@@ -261,9 +273,7 @@ int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const doub
         const double k = table[i];
         const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * Req - (k - k0) * rg +
                              (kx[j] - kxc) * az;
-        const float c = static_cast<float>(std::cos(phase));
-        const float s = static_cast<float>(std::sin(phase));
-        v = fcomplex(v.real() * c - v.imag() * s, v.real() * s + v.imag() * c);
+        v = wk_rotate(v, phase);
         float W = 1.0f;
         if (A) {
           double P;
@@ -423,10 +433,12 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   for (int b = 0; b < nsub; ++b) {
     const int f = b * (s - o);
     const int ncopy = std::min(s, S - f);
-    std::fill(work.begin(), work.end(), fcomplex(0.0f, 0.0f));
-    for (int j = 0; j < nl; ++j)
-      std::memcpy(work.data() + static_cast<std::size_t>(j) * s,
-                  blockData + static_cast<std::size_t>(j) * S + f, sizeof(fcomplex) * ncopy);
+#pragma omp parallel for schedule(static)
+    for (int j = 0; j < nl; ++j) {
+      fcomplex* dst = work.data() + static_cast<std::size_t>(j) * s;
+      std::memcpy(dst, blockData + static_cast<std::size_t>(j) * S + f, sizeof(fcomplex) * ncopy);
+      std::fill(dst + ncopy, dst + s, fcomplex(0.0f, 0.0f));
+    }
     par.t0 = t0keep + f / par.frg;
     par.dc = dcAt((s / par.frg) / 2.0 + par.t0 - tref);
 
@@ -456,6 +468,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     if (st != 0) break;
     const int ncopyBack = std::min(s - o, S - o - f);
     if (ncopyBack > 0) {
+#pragma omp parallel for schedule(static)
       for (int j = 0; j < nl; ++j)
         std::memcpy(blockData + static_cast<std::size_t>(j) * S + f,
                     work.data() + static_cast<std::size_t>(j) * s + o / 2,
@@ -471,6 +484,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     return st;
   }
   if (dkz != 0.0) {
+#pragma omp parallel for schedule(static)
     for (int j = 0; j < nl; ++j) {
       fcomplex* row = blockData + static_cast<std::size_t>(j) * S;
       RngShift(row, S, out.spacing, dkz, row, S, Q, 1.0);
