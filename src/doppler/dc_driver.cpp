@@ -6,6 +6,7 @@
 #include <memory>
 #include <new>
 #include <numbers>
+#include <vector>
 
 #include "base/status.h"
 #include "diag/report.h"
@@ -84,21 +85,32 @@ void accumulateContrast(const fcomplex* block, int x0, int y0, DcEstState& st) {
 }
 
 // Scans one row of bins starting at line y0; `rows` points at its first line.
-// `done` counts the bins scanned so far for the wait bar.
+// `done` counts the bins scanned so far for the wait bar. Bins are
+// independent (each owns its estimate and its own contrast cells), so they
+// are shared among threads, each with its own copy of the block.
 void scanBinRow(const fcomplex* rows, int samples, int y0, int binRow, DcEstState& st, int& done) {
   const int total = st.nBinsX * st.nBinsY;
-  for (int ix = 0; ix < st.nBinsX; ++ix) {
-    const int x0 = ix * st.blocks;
-    if (x0 + st.blocks > samples) break;
-    for (int l = 0; l < st.blockl; ++l) {
-      const fcomplex* src = rows + static_cast<size_t>(l) * samples + x0;
-      std::copy(src, src + st.blocks, st.blockBuf.begin() + static_cast<size_t>(l) * st.blocks);
+  int count = 0;
+  while (count < st.nBinsX && (count + 1) * st.blocks <= samples) ++count;
+  const std::size_t blockSamples = static_cast<std::size_t>(st.blocks) * st.blockl;
+#pragma omp parallel if (count > 1)
+  {
+    std::vector<fcomplex> block(blockSamples);
+#pragma omp for schedule(dynamic, 1)
+    for (int ix = 0; ix < count; ++ix) {
+      const int x0 = ix * st.blocks;
+      for (int l = 0; l < st.blockl; ++l) {
+        const fcomplex* src = rows + static_cast<size_t>(l) * samples + x0;
+        std::copy(src, src + st.blocks, block.begin() + static_cast<size_t>(l) * st.blocks);
+      }
+      DcBin& bin = st.bins[static_cast<size_t>(binRow) * st.nBinsX + ix];
+      bin.range = x0 + st.blocks / 2;
+      bin.line = y0 + st.blockl / 2;
+      dcBinEstimate(block.data(), st, bin);
+      accumulateContrast(block.data(), x0, y0, st);
     }
-    DcBin& bin = st.bins[static_cast<size_t>(binRow) * st.nBinsX + ix];
-    bin.range = x0 + st.blocks / 2;
-    bin.line = y0 + st.blockl / 2;
-    dcBinEstimate(st.blockBuf.data(), st, bin);
-    accumulateContrast(st.blockBuf.data(), x0, y0, st);
+  }
+  for (int ix = 0; ix < count; ++ix) {
     ++done;
     if (st.verbose) waitbar_update(0, 100.0f * float(done) / float(total));
   }
@@ -135,8 +147,11 @@ int setprocbuf(DcEstInput& input, DcEstState& st) {
         "processing.conf file\n");
     return STATUS_BAD_CONDITION;
   }
-  // No more bin rows than the raster has.
-  st.rowsPerRead = static_cast<int>(std::min<int64_t>(m, std::max(st.nBinsY, 1)));
+  // No more bin rows than the raster has, and reads of about 64 MiB at
+  // most: the scan goes through the raster once, so a larger buffer only
+  // costs its filling.
+  const int64_t byChunk = std::max<int64_t>(1, (int64_t(64) << 20) / rowBytes);
+  st.rowsPerRead = static_cast<int>(std::min<int64_t>(std::min(m, byChunk), std::max(st.nBinsY, 1)));
 
   const size_t blockSamples = size_t(st.blocks) * size_t(st.blockl);
   try {
