@@ -95,6 +95,13 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
             const double poly[5], double tref, int block = 0, int blocks = 1);
 
+// Transforms the first `used` columns (each `lines` long) of a row-major
+// block of row pitch `pitch` along azimuth, `direction` an FFT direction
+// code. Strips of columns are gathered into contiguous rows, transformed
+// and scattered back, which keeps the memory access sequential. Status 0;
+// 1 for bad sizes; 5 when the transform cannot be made; 7 out of memory.
+int wk_column_transform(fcomplex* data, int pitch, int used, int lines, int direction);
+
 // Omega-K kernel without Stolt interpolation.
 int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const double* dk,
            double az, double rg);
@@ -124,46 +131,66 @@ struct WKWeighting {
   double azimuthTerm(double k, double kx, double& P) const;
 };
 
-// sin and cos of x together, for the phase rotations of the kernels: the
-// argument is reduced by pi/2 in two steps (exact for |x| below 1e6, which
-// covers the range phases of any block) and the quadrant polynomials keep
-// the result within a few units of the last double place. Larger or
-// non-finite arguments go to the library functions.
+// sin and cos for the phase rotations of the kernels: the argument is
+// reduced by pi/2 in two steps (exact for |x| below 1e6, which covers the
+// range phases of any block) and the quadrant polynomials keep the result
+// within a unit or two of the last double place. Larger or non-finite
+// arguments go to the library functions.
+namespace wk_detail {
+// r = x - q pi/2 with |r| <= pi/4 (a hair more at the ends), q mod 4.
+inline double reduce(double x, int& q) {
+  constexpr double invpio2 = 6.36619772367581382433e-01;
+  constexpr double pio2_1 = 1.57079632673412561417e+00;   // first 33 bits of pi/2
+  constexpr double pio2_1t = 6.07710050650619224932e-11;  // pi/2 - pio2_1
+  constexpr double shifter = 6755399441055744.0;          // 1.5 * 2^52
+  const double fn = (x * invpio2 + shifter) - shifter;
+  q = static_cast<int>(fn) & 3;
+  return (x - fn * pio2_1) - fn * pio2_1t;
+}
+inline double sinPoly(double r, double z) {
+  return r + r * z *
+                 (-1.66666666666666324348e-01 +
+                  z * (8.33333333332248946124e-03 +
+                       z * (-1.98412698298579493134e-04 +
+                            z * (2.75573137070700676789e-06 +
+                                 z * (-2.50507602534068634195e-08 +
+                                      z * 1.58969099521155010221e-10)))));
+}
+inline double cosPoly(double z) {
+  return 1.0 - 0.5 * z +
+         z * z *
+             (4.16666666666666019037e-02 +
+              z * (-1.38888888888741095749e-03 +
+                   z * (2.48015872894767294178e-05 +
+                        z * (-2.75573143513906633035e-07 +
+                             z * (2.08757232129817482790e-09 +
+                                  z * -1.13596475577881948265e-11)))));
+}
+}  // namespace wk_detail
+
 inline void wk_sincos(double x, double& s, double& c) {
   if (!(std::fabs(x) < 1.0e6)) {
     s = std::sin(x);
     c = std::cos(x);
     return;
   }
-  constexpr double invpio2 = 6.36619772367581382433e-01;
-  constexpr double pio2_1 = 1.57079632673412561417e+00;   // first 33 bits of pi/2
-  constexpr double pio2_1t = 6.07710050650619224932e-11;  // pi/2 - pio2_1
-  constexpr double shifter = 6755399441055744.0;          // 1.5 * 2^52
-  const double fn = (x * invpio2 + shifter) - shifter;
-  const int q = static_cast<int>(fn) & 3;
-  const double r = (x - fn * pio2_1) - fn * pio2_1t;
+  int q;
+  const double r = wk_detail::reduce(x, q);
   const double z = r * r;
-  const double sr =
-      r + r * z *
-              (-1.66666666666666324348e-01 +
-               z * (8.33333333332248946124e-03 +
-                    z * (-1.98412698298579493134e-04 +
-                         z * (2.75573137070700676789e-06 +
-                              z * (-2.50507602534068634195e-08 +
-                                   z * 1.58969099521155010221e-10)))));
-  const double cr =
-      1.0 - 0.5 * z +
-      z * z *
-          (4.16666666666666019037e-02 +
-           z * (-1.38888888888741095749e-03 +
-                z * (2.48015872894767294178e-05 +
-                     z * (-2.75573143513906633035e-07 +
-                          z * (2.08757232129817482790e-09 +
-                               z * -1.13596475577881948265e-11)))));
+  const double sr = wk_detail::sinPoly(r, z), cr = wk_detail::cosPoly(z);
   const double ss = (q & 1) ? cr : sr;
   const double cc = (q & 1) ? sr : cr;
   s = (q & 2) ? -ss : ss;
   c = ((q + 1) & 2) ? -cc : cc;
+}
+
+inline double wk_sin(double x) {
+  if (!(std::fabs(x) < 1.0e6)) return std::sin(x);
+  int q;
+  const double r = wk_detail::reduce(x, q);
+  const double z = r * r;
+  const double v = (q & 1) ? wk_detail::cosPoly(z) : wk_detail::sinPoly(r, z);
+  return (q & 2) ? -v : v;
 }
 
 // x * exp(j phase), the rotation narrowed to float.

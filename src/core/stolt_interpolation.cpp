@@ -60,6 +60,17 @@ inline fcomplex mul(fcomplex a, fcomplex b) {
                   a.real() * b.imag() + a.imag() * b.real());
 }
 
+// std::round for |x| below 2^62 without the library call.
+inline double roundHalfAway(double x) {
+  long long t = static_cast<long long>(x);
+  const double f = x - static_cast<double>(t);
+  if (f >= 0.5)
+    ++t;
+  else if (f <= -0.5)
+    --t;
+  return static_cast<double>(t);
+}
+
 inline fcomplex scaled(fcomplex x, float f) { return fcomplex(x.real() * f, x.imag() * f); }
 
 // What both kernels derive from the block record before the row loop.
@@ -194,8 +205,7 @@ bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const doub
 // optional removal of the residual k0 offset.
 int finishBlock(const AzimuthBlockPar& par, const StoltGrid& grid, int n, double g) {
   const int nl = par.lines;
-  if (fft_c(grid.pitch, n, nl, nl, FFT_NONE, FFT_BACKWARD_NORMALISED, grid.result,
-            grid.result) != 0) {
+  if (wk_column_transform(grid.result, grid.pitch, n, nl, FFT_BACKWARD_NORMALISED) != 0) {
     ORV_REPORT("Cannot make the inverse azimuth transform of the block", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
@@ -257,7 +267,7 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
   try {
     if (zoom.make(ns, Nin, -kTwoPi / padded * sign) != STATUS_OK ||
         fft_makep_c(inv, M, M, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0 ||
-        fft_c(ns, ns, nl, nl, FFT_NONE, grid.dir, par.data, par.data) != 0) {
+        wk_column_transform(par.data, ns, ns, nl, grid.dir) != 0) {
       ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
       fft_destp_c(inv);
       return STATUS_BAD_CONDITION;
@@ -415,7 +425,7 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
   FFTPlan rowFwd, inv;
   if (fft_makep_c(rowFwd, padded, padded, 1, 1, grid.dir, FFT_NONE, 1) != 0 ||
       fft_makep_c(inv, M, M, 1, 1, FFT_BACKWARD_NORMALISED, FFT_NONE, 1) != 0 ||
-      fft_c(ns, ns, nl, nl, FFT_NONE, grid.dir, par.data, par.data) != 0) {
+      wk_column_transform(par.data, ns, ns, nl, grid.dir) != 0) {
     ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
     fft_destp_c(rowFwd);
     fft_destp_c(inv);
@@ -464,10 +474,11 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
       }
       for (int q = ilo; q <= ihi; ++q) {
         const double x = std::fabs(std::sqrt(grid.kz[q] * grid.kz[q] + kx2[j]) - kis) / dki;
-        const double u = std::round(x);
+        if (!(x < padded)) continue;  // also rows beyond the geometric limit
+        const double u = roundHalfAway(x);
         const int iu = static_cast<int>(u);
         if (iu < 0 || iu >= padded) continue;
-        const int r = static_cast<int>(std::round((x - u) / 0.01)) + 50;
+        const int r = static_cast<int>(roundHalfAway((x - u) / 0.01)) + 50;
         const fcomplex* h = table.data() + static_cast<std::size_t>(r) * taps;
         const fcomplex* s = buf + iu;
         fcomplex y(0.0f, 0.0f);

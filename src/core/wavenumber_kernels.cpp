@@ -32,9 +32,7 @@ double rateAt(const AzimuthBlockPar& par, double t) {
 double sinc(double u) {
   if (u == 0.0) return 1.0;
   const double a = kPi * u;
-  double s, c;
-  wk_sincos(a, s, c);
-  return s / a;
+  return wk_sin(a) / a;
 }
 
 // Pattern term with sin(sq - asin(x)) = sin(sq) sqrt(1 - x^2) - cos(sq) x,
@@ -220,6 +218,42 @@ int OutImagePar(const AzimuthBlockPar& par, int& fftlen, double& spacing, int& p
   return STATUS_OK;
 }
 
+int wk_column_transform(fcomplex* data, int pitch, int used, int lines, int direction) {
+  if (!data || used < 1 || lines < 1 || used > pitch) return STATUS_BAD_CONDITION;
+  // Sixteen columns are two cache lines of a row: a strip of a block fits
+  // in the second-level cache.
+  constexpr int kStrip = 16;
+  FFTBuffer strip;
+  try {
+    strip.resize(static_cast<std::size_t>(kStrip) * lines);
+  } catch (const std::bad_alloc&) {
+    return STATUS_NO_MEMORY;
+  }
+  fcomplex* const t = strip.data();
+  FFTPlan full, last;
+  const int rest = used % kStrip;
+  if (fft_makep_c(full, lines, lines, kStrip, kStrip, direction, FFT_NONE, 1) != 0 ||
+      (rest != 0 && fft_makep_c(last, lines, lines, rest, rest, direction, FFT_NONE, 1) != 0))
+    return 5;
+  for (int c0 = 0; c0 < used; c0 += kStrip) {
+    const int w = std::min(kStrip, used - c0);
+#pragma omp parallel for schedule(static)
+    for (int l = 0; l < lines; ++l) {
+      const fcomplex* src = data + static_cast<std::size_t>(l) * pitch + c0;
+      for (int b = 0; b < w; ++b) t[static_cast<std::size_t>(b) * lines + l] = src[b];
+    }
+    pfft_c(w == kStrip ? full : last, t, t);
+#pragma omp parallel for schedule(static)
+    for (int l = 0; l < lines; ++l) {
+      fcomplex* dst = data + static_cast<std::size_t>(l) * pitch + c0;
+      for (int b = 0; b < w; ++b) dst[b] = t[static_cast<std::size_t>(b) * lines + l];
+    }
+  }
+  fft_destp_c(full);
+  fft_destp_c(last);
+  return STATUS_OK;
+}
+
 int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const double* dk, double az,
            double rg) {
   const int ns = par.samples, nl = par.lines;
@@ -247,15 +281,17 @@ int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const doub
 
     fcomplex* data = par.data;
     const int dir = par.conj ? FFT_BACKWARD_NORMALISED : FFT_FORWARD;
-    FFTPlan fwd, rowInv, colInv;
-    int st = fft_makep_c(fwd, ns, ns, nl, nl, dir, dir, 1);
+    FFTPlan fwd, rowInv;
+    int st = fft_makep_c(fwd, ns, ns, nl, nl, dir, FFT_NONE, 1);
     if (st == 0) st = fft_makep_c(rowInv, ns, ns, nl, nl, FFT_BACKWARD_NORMALISED, FFT_NONE, 1);
-    if (st == 0) st = fft_makep_c(colInv, ns, ns, nl, nl, FFT_NONE, FFT_BACKWARD_NORMALISED, 1);
+    if (st == 0) {
+      pfft_c(fwd, data, data);
+      st = wk_column_transform(data, ns, ns, nl, dir);
+    }
     if (st != 0) {
       ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
       return STATUS_BAD_CONDITION;
     }
-    pfft_c(fwd, data, data);
 
     // Reference function, windows and whitening; energy sums per row so that
     // the parallel run adds them in the serial order.
@@ -305,7 +341,10 @@ int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const doub
       fcomplex* row = data + static_cast<std::size_t>(j) * ns;
       RngShift(row, ns, dr, dk[j], row, ns, off, g);
     }
-    pfft_c(colInv, data, data);
+    if (wk_column_transform(data, ns, ns, nl, FFT_BACKWARD_NORMALISED) != 0) {
+      ORV_REPORT("Cannot make the transform plans of the block", REPORT_ERROR);
+      return STATUS_BAD_CONDITION;
+    }
     if (par.final == 1) {
 #pragma omp parallel for schedule(static)
       for (int j = 0; j < nl; ++j) {
@@ -315,7 +354,6 @@ int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const doub
     }
     fft_destp_c(fwd);
     fft_destp_c(rowInv);
-    fft_destp_c(colInv);
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Out of memory in the omega-K kernel", REPORT_ERROR);
     return STATUS_NO_MEMORY;
