@@ -4,8 +4,10 @@
 #include <cmath>
 #include <cstdio>
 #include <cstring>
+#include <future>
 #include <new>
 #include <string>
+#include <utility>
 
 #include "base/status.h"
 #include "core/ortog.h"
@@ -156,6 +158,17 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
   File in, out;
   int P = 0, q = 0, passes = 0;
   std::vector<int> fileShift;
+  // File path: a pass is written while the next one is read and compressed,
+  // from the other of two buffers.
+  FFTBuffer spare;
+  std::future<bool> pending;
+  auto written = [&pending]() {
+    if (!pending.valid()) return true;
+    return pending.get();
+  };
+#define RF_FAIL_AFTER_WRITE(message, status)                                               \
+  (written() ? RF_FAIL((message), (status))                                               \
+             : RF_FAIL("File writing failed!", STATUS_WRITE_FAILED))
   if (work.incore) {
     if (work.data.size() < static_cast<std::size_t>(N) * lines ||
         work.shift.size() < static_cast<std::size_t>(lines))
@@ -177,6 +190,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     passes = lines % P ? q + 1 : q;
     try {
       work.data.assign(static_cast<std::size_t>(N) * P, fcomplex(0.0f, 0.0f));
+      if (passes > 1) spare.assign(static_cast<std::size_t>(N) * P, fcomplex(0.0f, 0.0f));
       fileShift.assign(P, 0);
     } catch (const std::bad_alloc&) {
       return RF_FAIL("Memory allocation failed", STATUS_NO_MEMORY);
@@ -200,14 +214,14 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
         if (work.prefix) {
           float swst = 0.0f;
           if (std::fread(&swst, sizeof swst, 1, in.get()) != 1)
-            return RF_FAIL("File reading failed!", STATUS_READ_FAILED);
+            return RF_FAIL_AFTER_WRITE("File reading failed!", STATUS_READ_FAILED);
           if (!lineShift((static_cast<double>(swst) - params.swstMin) * params.fs, z.maxShift,
                          fileShift[l]))
-            return RF_FAIL(wrongSwst(first + l).c_str(), STATUS_BAD_CONDITION);
+            return RF_FAIL_AFTER_WRITE(wrongSwst(first + l).c_str(), STATUS_BAD_CONDITION);
         }
         if (std::fread(row, sizeof(fcomplex), S, in.get()) !=
             static_cast<std::size_t>(S))
-          return RF_FAIL("File reading failed!", STATUS_READ_FAILED);
+          return RF_FAIL_AFTER_WRITE("File reading failed!", STATUS_READ_FAILED);
       }
     }
 
@@ -222,15 +236,22 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     repackRows(data, nl, N, z.valid, O, shifts);
 
     if (!work.incore) {
+      if (!written()) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
       const std::size_t count = static_cast<std::size_t>(O) * nl;
-      if (std::fwrite(data, sizeof(fcomplex), count, out.get()) != count)
-        return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
+      std::FILE* f = out.get();
+      pending = std::async(std::launch::async, [f, data, count] {
+        return std::fwrite(data, sizeof(fcomplex), count, f) == count;
+      });
+      if (!spare.empty()) std::swap(work.data, spare);
     }
   }
+  if (!written()) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
   waitbar_close();
+#undef RF_FAIL_AFTER_WRITE
 
   if (!work.incore) {
     work.data = FFTBuffer();
+    spare = FFTBuffer();
     if (std::fclose(out.release()) != 0) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
   }
   return 0;
