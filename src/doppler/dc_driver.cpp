@@ -59,55 +59,105 @@ void movingMean(float* line, int n, int stride, int w, std::vector<double>& work
     line[static_cast<size_t>(i) * stride] = static_cast<float>(work[static_cast<size_t>(i)]);
 }
 
-// Adds the power and fourth-power means of one block to its contrast cells.
-void accumulateContrast(const fcomplex* block, int x0, int y0, DcEstState& st) {
-  const double norm = 1.0 / (static_cast<double>(st.patchs) * st.patchl);
-  const int cellsX = st.blocks / st.patchs;
-  const int cellsY = st.blockl / st.patchl;
-  for (int cy = 0; cy < cellsY; ++cy) {
+// Lag-zero and lag-one sums of a bin along azimuth.
+struct BinSums {
+  double p = 0.0, q = 0.0, re = 0.0, im = 0.0;
+};
+
+// Estimate of a bin from its sums.
+void finishBin(const BinSums& sums, const DcEstState& st, DcBin& bin) {
+  const double p = sums.p, q = sums.q;
+  const int ns = st.blocks;
+  const dcomplex r(sums.re, sums.im);
+  bin.valid = 0;
+  bin.dcWrapped = 0.0;
+  bin.contrast = 0.0;
+  bin.power = 0.0;
+  bin.noise = 0.0;
+  if (q == 0.0) return;
+  const double mean = p / ns;
+  const double a = std::abs(r) / ns;
+  if (!(mean / a < st.sThr)) return;  // too little azimuth correlation (or a = 0)
+  bin.valid = 1;
+  bin.dcWrapped = std::arg(r) / (2.0 * std::numbers::pi);
+  bin.contrast = double(st.blocks) * st.blockl * q / (p * p);
+  bin.power = mean;
+  bin.noise = mean - (st.r0 / st.r1) * a;
+}
+
+// One pass over the bin at (x0, y0), read in place from rows of `pitch`
+// samples: the sums of dcBinEstimate and the power and fourth-power means
+// of the bin's contrast cells. Row-major order visits the samples of every
+// cell in the cell's own order, so each sum is the one of the separate
+// loops, bit for bit. `cells` is scratch.
+void scanBin(const fcomplex* rows, int pitch, int x0, int y0, DcEstState& st, DcBin& bin,
+             std::vector<double>& cells) {
+  const int ns = st.blocks, nl = st.blockl, ps = st.patchs, pl = st.patchl;
+  const int cellsX = ns / ps;
+  const double norm = 1.0 / (static_cast<double>(ps) * pl);
+  cells.assign(2 * static_cast<size_t>(cellsX), 0.0);
+  double* c2 = cells.data();
+  double* c4 = c2 + cellsX;
+  BinSums sums;
+  for (int l = 0; l < nl; ++l) {
+    const fcomplex* x = rows + static_cast<size_t>(l) * pitch + x0;
+    double p = sums.p, q = sums.q;
     for (int cx = 0; cx < cellsX; ++cx) {
-      double p2 = 0.0;
-      double p4 = 0.0;
-      for (int l = cy * st.patchl; l < (cy + 1) * st.patchl; ++l) {
-        const fcomplex* row = block + static_cast<size_t>(l) * st.blocks;
-        for (int s = cx * st.patchs; s < (cx + 1) * st.patchs; ++s) {
-          const double a = std::norm(row[s]);
-          p2 += a;
-          p4 += a * a;
-        }
+      double s2 = c2[cx], s4 = c4[cx];
+      for (int s = cx * ps; s < (cx + 1) * ps; ++s) {
+        const double a = std::norm(x[s]);
+        p += a;
+        q += a * a;
+        s2 += a;
+        s4 += a * a;
       }
-      const size_t cell = static_cast<size_t>(y0 / st.patchl + cy) * st.cmWidth +
-                          static_cast<size_t>(x0 / st.patchs + cx);
-      st.contrastPow[cell] += static_cast<float>(p2 * norm);
-      st.contrastMap[cell] += static_cast<float>(p4 * norm);
+      c2[cx] = s2;
+      c4[cx] = s4;
+    }
+    sums.p = p;
+    sums.q = q;
+    if (l + 1 < nl) {
+      const fcomplex* y = x + pitch;
+      double re = sums.re, im = sums.im;
+      for (int s = 0; s < ns; ++s) {
+        // conj(x) y
+        re += double(x[s].real()) * y[s].real() + double(x[s].imag()) * y[s].imag();
+        im += double(x[s].real()) * y[s].imag() - double(x[s].imag()) * y[s].real();
+      }
+      sums.re = re;
+      sums.im = im;
+    }
+    if ((l + 1) % pl == 0) {
+      const size_t row = static_cast<size_t>(y0 / pl + l / pl) * st.cmWidth + x0 / ps;
+      for (int cx = 0; cx < cellsX; ++cx) {
+        st.contrastPow[row + cx] += static_cast<float>(c2[cx] * norm);
+        st.contrastMap[row + cx] += static_cast<float>(c4[cx] * norm);
+        c2[cx] = 0.0;
+        c4[cx] = 0.0;
+      }
     }
   }
+  finishBin(sums, st, bin);
 }
 
 // Scans one row of bins starting at line y0; `rows` points at its first line.
 // `done` counts the bins scanned so far for the wait bar. Bins are
 // independent (each owns its estimate and its own contrast cells), so they
-// are shared among threads, each with its own copy of the block.
+// are shared among threads.
 void scanBinRow(const fcomplex* rows, int samples, int y0, int binRow, DcEstState& st, int& done) {
   const int total = st.nBinsX * st.nBinsY;
   int count = 0;
   while (count < st.nBinsX && (count + 1) * st.blocks <= samples) ++count;
-  const std::size_t blockSamples = static_cast<std::size_t>(st.blocks) * st.blockl;
 #pragma omp parallel if (count > 1)
   {
-    std::vector<fcomplex> block(blockSamples);
+    std::vector<double> cells;
 #pragma omp for schedule(dynamic, 1)
     for (int ix = 0; ix < count; ++ix) {
       const int x0 = ix * st.blocks;
-      for (int l = 0; l < st.blockl; ++l) {
-        const fcomplex* src = rows + static_cast<size_t>(l) * samples + x0;
-        std::copy(src, src + st.blocks, block.begin() + static_cast<size_t>(l) * st.blocks);
-      }
       DcBin& bin = st.bins[static_cast<size_t>(binRow) * st.nBinsX + ix];
       bin.range = x0 + st.blocks / 2;
       bin.line = y0 + st.blockl / 2;
-      dcBinEstimate(block.data(), st, bin);
-      accumulateContrast(block.data(), x0, y0, st);
+      scanBin(rows, samples, x0, y0, st, bin, cells);
     }
   }
   for (int ix = 0; ix < count; ++ix) {
@@ -204,41 +254,24 @@ int dcTheoreticAutocorrelation(const DcEstInput& input, DcEstState& st) {
 
 void dcBinEstimate(const fcomplex* block, const DcEstState& st, DcBin& bin) {
   // Sums along azimuth (down the columns), taken line by line for locality.
-  double p = 0.0;
-  double q = 0.0;
-  double re = 0.0;
-  double im = 0.0;
+  BinSums sums;
   const int ns = st.blocks;
   for (int l = 0; l < st.blockl; ++l) {
     const fcomplex* x = block + size_t(l) * ns;
     for (int s = 0; s < ns; ++s) {
       const double a = std::norm(x[s]);
-      p += a;
-      q += a * a;
+      sums.p += a;
+      sums.q += a * a;
     }
     if (l + 1 == st.blockl) break;
     const fcomplex* y = x + ns;
     for (int s = 0; s < ns; ++s) {
       // conj(x) y
-      re += double(x[s].real()) * y[s].real() + double(x[s].imag()) * y[s].imag();
-      im += double(x[s].real()) * y[s].imag() - double(x[s].imag()) * y[s].real();
+      sums.re += double(x[s].real()) * y[s].real() + double(x[s].imag()) * y[s].imag();
+      sums.im += double(x[s].real()) * y[s].imag() - double(x[s].imag()) * y[s].real();
     }
   }
-  const dcomplex r(re, im);
-  bin.valid = 0;
-  bin.dcWrapped = 0.0;
-  bin.contrast = 0.0;
-  bin.power = 0.0;
-  bin.noise = 0.0;
-  if (q == 0.0) return;
-  const double mean = p / ns;
-  const double a = std::abs(r) / ns;
-  if (!(mean / a < st.sThr)) return;  // too little azimuth correlation (or a = 0)
-  bin.valid = 1;
-  bin.dcWrapped = std::arg(r) / (2.0 * std::numbers::pi);
-  bin.contrast = double(st.blocks) * st.blockl * q / (p * p);
-  bin.power = mean;
-  bin.noise = mean - (st.r0 / st.r1) * a;
+  finishBin(sums, st, bin);
 }
 
 int getnadcbins(DcEstInput& input, DcEstState& st) {
