@@ -129,6 +129,14 @@ struct WKWeighting {
   double rangeTerm(double k) const;
   // Whitening times azimuth window at (k, kx); P receives the pattern term.
   double azimuthTerm(double k, double kx, double& P) const;
+  // Which piece of the azimuth window rule holds at (k, kx): 0 full weight,
+  // 1 transition, 2 outside (always 0 without an azimuth window).
+  int azimuthPiece(double k, double kx) const;
+  // azimuthTerm over the n wavenumbers k[i] of one row: exact on every
+  // eighth sample and the last one, linear in between where the window
+  // rule keeps its piece (within parts in 1e8, below float resolution),
+  // exact elsewhere. term[i] and P[i] receive the two results.
+  void azimuthRow(const double* k, int n, double kx, double* term, double* P) const;
 };
 
 // sin and cos for the phase rotations of the kernels: the argument is

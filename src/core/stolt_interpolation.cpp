@@ -186,6 +186,7 @@ class Zoom {
 // Per-thread row buffers, each aligned for the transforms.
 struct RowBuffers {
   FFTBuffer a, b;
+  std::vector<double> term, P;  // azimuth weighting of the row
 };
 
 bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
@@ -384,6 +385,8 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
     for (RowBuffers& rb : buffers) {
       rb.a.assign(static_cast<std::size_t>(guard) + padded + H, fcomplex(0.0f, 0.0f));
       rb.b.assign(M, fcomplex(0.0f, 0.0f));
+      rb.term.resize(padded);
+      rb.P.resize(padded);
     }
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Out of memory in the least-squares Stolt kernel", REPORT_ERROR);
@@ -453,6 +456,9 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
       pfft_c(rowFwd, spectrum, spectrum);
       fftshift(spectrum, padded);
       const double azPhase = (kx[j] - kxc) * az;
+      double* rowTerm = rb.term.data();
+      double* rowP = rb.P.data();
+      if (A) wt.azimuthRow(kin.data(), padded, kx[j], rowTerm, rowP);
       for (int i = 0; i < padded; ++i) {
         fcomplex v = spectrum[i];
         if (conj) v = std::conj(v);
@@ -461,8 +467,8 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
         v = rotate(v, phase);
         float W = 1.0f;
         if (A) {
-          double P;
-          const double aw = wt.azimuthTerm(k, kx[j], P);
+          const double P = rowP[i];
+          const double aw = rowTerm[i];
           const double rw = rwin.empty() ? 1.0 : rwin[i];
           W = static_cast<float>(aw * rw);
           if (std::fabs(k - k0) < grid.inBand) {

@@ -140,6 +140,38 @@ double WKWeighting::azimuthTerm(double k, double kx, double& P) const {
   return wh * aw;
 }
 
+int WKWeighting::azimuthPiece(double k, double kx) const {
+  if (azw == 0.0) return 0;
+  const double excess = std::fabs(sq - std::asin(kx / k)) - a * aperture;
+  if (excess <= 0.0) return 0;
+  return excess < b * aperture ? 1 : 2;
+}
+
+void WKWeighting::azimuthRow(const double* k, int n, double kx, double* term, double* P) const {
+  constexpr int kCell = 8;
+  if (n < 1) return;
+  int i0 = 0;
+  term[0] = azimuthTerm(k[0], kx, P[0]);
+  int piece0 = azimuthPiece(k[0], kx);
+  while (i0 < n - 1) {
+    const int i1 = std::min(i0 + kCell, n - 1);
+    term[i1] = azimuthTerm(k[i1], kx, P[i1]);
+    const int piece1 = azimuthPiece(k[i1], kx);
+    if (piece1 == piece0 && std::isfinite(term[i0]) && std::isfinite(term[i1])) {
+      const double span = k[i1] - k[i0];
+      for (int i = i0 + 1; i < i1; ++i) {
+        const double f = (k[i] - k[i0]) / span;
+        term[i] = term[i0] + f * (term[i1] - term[i0]);
+        P[i] = P[i0] + f * (P[i1] - P[i0]);
+      }
+    } else {
+      for (int i = i0 + 1; i < i1; ++i) term[i] = azimuthTerm(k[i], kx, P[i]);
+    }
+    i0 = i1;
+    piece0 = piece1;
+  }
+}
+
 void AzimuthGrid(const AzimuthBlockPar& par, double* kx, double* kx2, double* dk) {
   double k0, kxc, kz;
   ComputeWaveNumbers(par, k0, kxc, kz);

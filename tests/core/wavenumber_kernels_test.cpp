@@ -106,3 +106,47 @@ TEST(ColumnTransform, MatchesStridedTransformAndLeavesOtherColumns) {
 }
 
 }  // namespace
+
+namespace {
+
+// Row weighting by anchors and linear steps against the exact rule, on
+// C-band rows across the whole azimuth band, window edges included.
+TEST(AzimuthWeighting, RowMatchesTheExactTermsAcrossTheBand) {
+  AzimuthBlockPar par;
+  par.fc = 5.3e9;
+  par.frg = 18.96e6;
+  par.prf = 1679.9;
+  par.Veq = 7100.0;
+  par.dc = 300.0;
+  par.AntennaLength = 9.45;
+  par.azw = 0.75;
+  par.rgw = 0.75;
+  par.azlook = 0.8 * par.prf;  // flat middle, transitions, outside
+  par.aztrans = 0.4 * par.prf;
+  par.rglook = par.rgtrans = 0.8 * par.frg;
+  par.whiten = 1;
+  const WKWeighting wt(par);
+  const double k0 = 4.0 * kPi * par.fc / 299792458.0;
+  const int n = 1437;  // not a multiple of the anchor step
+  std::vector<double> k(n), term(n), P(n);
+  for (int i = 0; i < n; ++i) k[i] = k0 + (i - n / 2) * (wt.Bk / n);
+  int pieces[3] = {0, 0, 0};
+  const double kxc = 2.0 * kPi * par.dc / par.Veq;
+  for (int r = -400; r <= 400; ++r) {
+    const double kx = kxc + r * (wt.Bx / 800.0);
+    wt.azimuthRow(k.data(), n, kx, term.data(), P.data());
+    for (int i = 0; i < n; ++i) {
+      double Pe;
+      const double te = wt.azimuthTerm(k[i], kx, Pe);
+      ++pieces[wt.azimuthPiece(k[i], kx)];
+      ASSERT_NEAR(term[i], te, 1e-8 * std::fabs(te) + 1e-12) << r << " " << i;
+      ASSERT_NEAR(P[i], Pe, 1e-8 * Pe + 1e-15) << r << " " << i;
+    }
+  }
+  // The rows cover all three pieces of the window rule.
+  EXPECT_GT(pieces[0], 0);
+  EXPECT_GT(pieces[1], 0);
+  EXPECT_GT(pieces[2], 0);
+}
+
+}  // namespace
