@@ -140,18 +140,13 @@ struct RunTimes {
 };
 
 void writeJob(const fs::path& sim, const fs::path& run, const fs::path& job) {
-  std::vector<std::string> p(24, "NotOK");
-  p[0] = "ERS";
-  p[1] = (sim / "ERS2_FRAME" / "DAT_01.001").string();
-  p[5] = (run / "frame").string();
-  p[7] = (sim / "ERS2_FRAME" / "LEA_01.001").string();
-  p[11] = (sim / "orbits").string();
-  p[16] = "0";
-  p[17] = "0";
-  p[18] = "1";
-  p[20] = "0";
-  p[21] = "0";
-  p[23] = "0";
+  // The 24 positional parameters: platform, scene, output root, leader,
+  // orbit folder (the arc is looked up), whole scene, erase temporaries.
+  const std::string n = "NotOK";
+  const std::vector<std::string> p = {
+      "ERS", (sim / "ERS2_FRAME" / "DAT_01.001").string(), n, n, n, (run / "frame").string(), n,
+      (sim / "ERS2_FRAME" / "LEA_01.001").string(), n, n, n, (sim / "orbits").string(), n, n, n, n,
+      "0", "0", "1", n, "0", "0", n, "0"};
   std::ofstream out(job);
   out << "ers frame benchmark\n";
   for (const auto& v : p) out << v << "\n";
@@ -227,8 +222,10 @@ RunTimes runFocuser(const fs::path& cache) {
   t.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
   if (t.status != 0 || fs::exists(folder + "progress.txt_error"))
     t.message = "focuser failed (status " + std::to_string(t.status) + "), see " + folder + "Process.log";
-  else if (next + 1 < kStages.size())
-    t.message = std::string("checkpoint not found in the trace: ") + kStages[next].endMarker;
+  else if (next + 1 < kStages.size()) {
+    t.message = "checkpoint not found in the trace: ";
+    t.message += kStages[next].endMarker;
+  }
   return t;
 }
 
@@ -262,8 +259,10 @@ void BM_ErsFrame(benchmark::State& state) {
   for (std::size_t i = 0; i < kStages.size(); ++i) {
     const double w = sum.wall[i] / runs, c = sum.cpu[i] / runs;
     std::fprintf(stderr, "%-18s %9.2f %9.2f\n", kStages[i].name, w, c);
-    state.counters[std::string(kStages[i].name) + "_wall"] = w;
-    state.counters[std::string(kStages[i].name) + "_cpu"] = c;
+    std::string name = kStages[i].name;
+    state.counters[name + "_wall"] = w;
+    name += "_cpu";
+    state.counters[name] = c;
   }
   std::fprintf(stderr, "%-18s %9.2f %9.2f   peak %.0f MiB\n\n", "total", sum.totalWall / runs,
                sum.totalCpu / runs, sum.peakMiB);
