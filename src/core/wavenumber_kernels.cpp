@@ -253,37 +253,49 @@ int OutImagePar(const AzimuthBlockPar& par, int& fftlen, double& spacing, int& p
 int wk_column_transform(fcomplex* data, int pitch, int used, int lines, int direction) {
   if (!data || used < 1 || lines < 1 || used > pitch) return STATUS_BAD_CONDITION;
   // Sixteen columns are two cache lines of a row: a strip of a block fits
-  // in the second-level cache.
+  // in the second-level cache. Each thread works through whole strips with
+  // one-line transforms of its own, so no transform hands work to other
+  // threads and the result does not depend on the thread count.
   constexpr int kStrip = 16;
-  FFTBuffer strip;
-  try {
-    strip.resize(static_cast<std::size_t>(kStrip) * lines);
-  } catch (const std::bad_alloc&) {
-    return STATUS_NO_MEMORY;
-  }
-  fcomplex* const t = strip.data();
-  FFTPlan full, last;
-  const int rest = used % kStrip;
-  if (fft_makep_c(full, lines, lines, kStrip, kStrip, direction, FFT_NONE, 1) != 0 ||
-      (rest != 0 && fft_makep_c(last, lines, lines, rest, rest, direction, FFT_NONE, 1) != 0))
-    return 5;
-  for (int c0 = 0; c0 < used; c0 += kStrip) {
-    const int w = std::min(kStrip, used - c0);
-#pragma omp parallel for schedule(static)
-    for (int l = 0; l < lines; ++l) {
-      const fcomplex* src = data + static_cast<std::size_t>(l) * pitch + c0;
-      for (int b = 0; b < w; ++b) t[static_cast<std::size_t>(b) * lines + l] = src[b];
+  const int strips = (used + kStrip - 1) / kStrip;
+  FFTPlan line;
+  if (fft_makep_c(line, lines, lines, 1, 1, direction, FFT_NONE, 1) != 0) return 5;
+  int status = STATUS_OK;
+#pragma omp parallel
+  {
+    FFTBuffer strip;
+    bool ok = true;
+    try {
+      strip.resize(static_cast<std::size_t>(kStrip) * lines);
+    } catch (const std::bad_alloc&) {
+      ok = false;
     }
-    pfft_c(w == kStrip ? full : last, t, t);
-#pragma omp parallel for schedule(static)
-    for (int l = 0; l < lines; ++l) {
-      fcomplex* dst = data + static_cast<std::size_t>(l) * pitch + c0;
-      for (int b = 0; b < w; ++b) dst[b] = t[static_cast<std::size_t>(b) * lines + l];
+    if (!ok) {
+#pragma omp critical(wk_column_transform_status)
+      status = STATUS_NO_MEMORY;
+    }
+    fcomplex* const t = strip.data();
+#pragma omp for schedule(static)
+    for (int g = 0; g < strips; ++g) {
+      if (!ok) continue;
+      const int c0 = g * kStrip;
+      const int w = std::min(kStrip, used - c0);
+      for (int l = 0; l < lines; ++l) {
+        const fcomplex* src = data + static_cast<std::size_t>(l) * pitch + c0;
+        for (int b = 0; b < w; ++b) t[static_cast<std::size_t>(b) * lines + l] = src[b];
+      }
+      for (int b = 0; b < w; ++b) {
+        fcomplex* col = t + static_cast<std::size_t>(b) * lines;
+        pfft_c(line, col, col);
+      }
+      for (int l = 0; l < lines; ++l) {
+        fcomplex* dst = data + static_cast<std::size_t>(l) * pitch + c0;
+        for (int b = 0; b < w; ++b) dst[b] = t[static_cast<std::size_t>(b) * lines + l];
+      }
     }
   }
-  fft_destp_c(full);
-  fft_destp_c(last);
-  return STATUS_OK;
+  fft_destp_c(line);
+  return status;
 }
 
 int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const double* dk, double az,
