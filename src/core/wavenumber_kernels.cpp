@@ -343,33 +343,43 @@ int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const doub
     std::vector<double> rowN(nl, 0.0), rowD(nl, 0.0);
     const int conj = par.conj;
     const double Req = par.Req;
-#pragma omp parallel for schedule(static)
-    for (int j = 0; j < nl; ++j) {
-      fcomplex* row = data + static_cast<std::size_t>(j) * ns;
-      double N = 0.0, D = 0.0;
-      for (int i = 0; i < ns; ++i) {
-        fcomplex v = row[i];
-        if (conj) v = std::conj(v);
-        const double k = table[i];
-        const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * Req - (k - k0) * rg +
-                             (kx[j] - kxc) * az;
-        v = wk_rotate(v, phase);
-        float W = 1.0f;
-        if (A) {
-          double P;
-          const double aw = wt.azimuthTerm(k, kx[j], P);
-          const double rw = rwin.empty() ? 1.0 : rwin[i];
-          W = static_cast<float>(aw * rw);
-          if (std::fabs(k - k0) < inBand) {
-            D += P;
-            N += P * W * W;
+    // Wavenumbers in ascending order (transform position (ns/2 + i) % ns) for
+    // the row weighting.
+    std::vector<double> ascending(ns);
+    for (int i = 0; i < ns; ++i) ascending[i] = table[(ns / 2 + i) % ns];
+#pragma omp parallel
+    {
+      std::vector<double> termAsc(A ? ns : 0), PAsc(A ? ns : 0);
+#pragma omp for schedule(static)
+      for (int j = 0; j < nl; ++j) {
+        fcomplex* row = data + static_cast<std::size_t>(j) * ns;
+        double N = 0.0, D = 0.0;
+        if (A) wt.azimuthRow(ascending.data(), ns, kx[j], termAsc.data(), PAsc.data());
+        for (int i = 0; i < ns; ++i) {
+          fcomplex v = row[i];
+          if (conj) v = std::conj(v);
+          const double k = table[i];
+          const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * Req - (k - k0) * rg +
+                               (kx[j] - kxc) * az;
+          v = wk_rotate(v, phase);
+          float W = 1.0f;
+          if (A) {
+            const int a = (i + ns - ns / 2) % ns;  // ascending position of i
+            const double P = PAsc[a];
+            const double aw = termAsc[a];
+            const double rw = rwin.empty() ? 1.0 : rwin[i];
+            W = static_cast<float>(aw * rw);
+            if (std::fabs(k - k0) < inBand) {
+              D += P;
+              N += P * W * W;
+            }
           }
+          const float ws = W * S;
+          row[i] = fcomplex(v.real() * ws, v.imag() * ws);
         }
-        const float ws = W * S;
-        row[i] = fcomplex(v.real() * ws, v.imag() * ws);
+        rowN[j] = N;
+        rowD[j] = D;
       }
-      rowN[j] = N;
-      rowD[j] = D;
     }
     pfft_c(rowInv, data, data);
     double N = 0.0, D = 0.0;
