@@ -186,7 +186,7 @@ class Zoom {
 // Per-thread row buffers, each aligned for the transforms.
 struct RowBuffers {
   FFTBuffer a, b;
-  std::vector<double> term, P;  // azimuth weighting of the row
+  std::vector<double> k, term, P;  // wavenumbers and azimuth weighting of the row
 };
 
 bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
@@ -277,6 +277,9 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
     for (RowBuffers& rb : buffers) {
       rb.a.assign(static_cast<std::size_t>(Nin + 1) + zoom.length(), fcomplex(0.0f, 0.0f));
       rb.b.assign(M, fcomplex(0.0f, 0.0f));
+      rb.k.resize(Nin);
+      rb.term.resize(Nin);
+      rb.P.resize(Nin);
     }
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Out of memory in the chirp-z Stolt kernel", REPORT_ERROR);
@@ -309,6 +312,10 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
       const double thi = (std::sqrt(grid.kz[ihi] * grid.kz[ihi] + kx2[j]) - k0 - a) / dki;
       const int jlo = std::max(0, static_cast<int>(std::floor(tlo)));
       const int jhi = std::min(Nin - 1, static_cast<int>(std::floor(thi)) + 1);
+      if (A && jhi >= jlo) {
+        for (int p = jlo; p <= jhi; ++p) rb.k[p - jlo] = k0 + a + p * dki;
+        wt.azimuthRow(rb.k.data(), jhi - jlo + 1, kx[j], rb.term.data(), rb.P.data());
+      }
       for (int p = jlo; p <= jhi; ++p) {
         fcomplex v = G[p];
         if (conj) v = std::conj(v);
@@ -317,8 +324,8 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
         v = rotate(v, phase);
         float W = 1.0f;
         if (A) {
-          double P;
-          W = static_cast<float>(wt.azimuthTerm(k, kx[j], P));
+          const double P = rb.P[p - jlo];
+          W = static_cast<float>(rb.term[p - jlo]);
           if (std::fabs(k - k0) < grid.inBand) {
             D += P;
             N += P * W * W;
