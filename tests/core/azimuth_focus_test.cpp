@@ -22,61 +22,6 @@ namespace {
 
 using namespace azimuth_scene;
 
-// Configuration of the point-target scenes: 4096-line blocks with a full
-// azimuth overlap of 1400 lines (longer than the 1314-line aperture),
-// 256-sample range sub-blocks with a full overlap of 64.
-AzimuthFocusConf sceneConf(const Geometry& g) {
-  AzimuthFocusConf c;
-  c.PerformInterpolation = 0;
-  c.AntennaLength = g.La;
-  c.WhiteningFlag = 0;
-  c.RangeWindowHammingParameter = 0.75;
-  c.AzimuthWindowHammingParameter = 0.6;
-  c.RangeLookBandwidth = g.B;
-  c.RangeTransitionBandwidth = g.B;
-  c.AzimuthLookBandwidth = 0.8 * g.prf;
-  c.AzimuthTransitionBandwidth = 0.8 * g.prf;
-  c.SamplesInBlock = 256;
-  c.LinesInBlock = 4096;
-  c.RangeOverlap = 32;
-  c.AzimuthOverlap = 700;
-  c.ApplyAzShift = g.lines;    // automatic
-  c.ApplyRgShift = g.samples;  // automatic
-  return c;
-}
-
-void fillScene(const Geometry& g, AzimuthFocusFiles& files, AzimuthFocusScene& scene) {
-  files.frg_hz = g.frg;
-  files.fc_hz = g.fc;
-  files.prf_hz = g.prf;
-  files.FastStartTime = g.fastStart();
-  files.bandwidth_hz = g.B;
-  files.SlowStartTime = 0.0;
-  scene.samples = g.samples;
-  scene.lines = g.lines;
-  const double tref = g.fastStart() + 0.5 * g.samples / g.frg;
-  scene.polyDC[0] = g.dc;
-  scene.polyDC[7] = tref;
-  scene.polyDC[8] = 0.0;
-  g.ratePoly(tref, scene.polyFR[0], scene.polyFR[1], scene.polyFR[4]);
-  scene.polyFR[7] = tref;
-}
-
-// Output pixels (row, col) of the targets, placed in the middle of blocks and
-// sub-blocks and on their seams (output row 2696, output columns 192, 384).
-const double kPixels[][2] = {{1000.3, 100.2},  {2695.6, 191.7}, {2000.0, 384.4},
-                             {4000.7, 300.5},  {2696.2, 50.0},  {3500.4, 250.3},
-                             {4700.1, 400.0}};
-
-// Targets whose zero-Doppler positions fall near kPixels, given the
-// annotation of a focused scene.
-std::vector<Target> placeTargets(const Geometry& g, double firstLine, double firstSample) {
-  std::vector<Target> t;
-  for (const auto& p : kPixels)
-    t.push_back({firstLine + p[0] / g.prf, (firstSample + p[1] / g.frg) * kC / 2.0, 1.0});
-  return t;
-}
-
 struct Focused {
   AzimuthFocusScene scene;
   std::vector<fcomplex> image;

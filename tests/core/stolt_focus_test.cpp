@@ -14,62 +14,23 @@ namespace {
 
 using namespace azimuth_scene;
 
-AzimuthFocusConf stoltConf(const Geometry& g, int interp, double pad) {
-  AzimuthFocusConf c;
-  c.PerformInterpolation = interp;
-  c.StoltPadding = pad;
-  c.AntennaLength = g.La;
-  c.RangeWindowHammingParameter = 0.75;
-  c.AzimuthWindowHammingParameter = 0.6;
-  c.RangeLookBandwidth = g.B;
-  c.RangeTransitionBandwidth = g.B;
-  c.AzimuthLookBandwidth = 0.8 * g.prf;
-  c.AzimuthTransitionBandwidth = 0.8 * g.prf;
-  c.SamplesInBlock = 256;
-  c.LinesInBlock = 4096;
-  c.RangeOverlap = 32;
-  c.AzimuthOverlap = 700;
-  c.ApplyAzShift = g.lines;    // automatic
-  c.ApplyRgShift = g.samples;  // automatic
-  return c;
-}
-
 struct Focused {
   AzimuthFocusScene scene;
   std::vector<fcomplex> image;
   std::vector<Target> targets;
 };
 
-// Output pixels of the targets: middles of blocks and range sub-blocks and
-// their seams (output row 2696; sub-block seams at output columns 192, 384).
-const double kPixels[][2] = {{1000.3, 100.2}, {2695.6, 191.7}, {2000.0, 384.4},
-                             {4000.7, 300.5}, {2696.2, 50.0},  {3500.4, 250.3},
-                             {4700.1, 400.0}};
-
 // Simulates and focuses in core; a first pass on an empty raster gives the
 // output annotation that places the targets.
 Focused focus(const Geometry& g, const AzimuthFocusConf& conf) {
   Focused f;
   AzimuthFocusFiles files;
-  files.frg_hz = g.frg;
-  files.fc_hz = g.fc;
-  files.prf_hz = g.prf;
-  files.FastStartTime = g.fastStart();
-  files.bandwidth_hz = g.B;
-  f.scene.samples = g.samples;
-  f.scene.lines = g.lines;
-  const double tref = g.fastStart() + 0.5 * g.samples / g.frg;
-  f.scene.polyDC[0] = g.dc;
-  f.scene.polyDC[7] = tref;
-  g.ratePoly(tref, f.scene.polyFR[0], f.scene.polyFR[1], f.scene.polyFR[4]);
-  f.scene.polyFR[7] = tref;
+  fillScene(g, files, f.scene);
   f.scene.inCore = 1;
   std::vector<fcomplex> probe(static_cast<std::size_t>(g.samples) * g.lines);
   f.scene.buffer = probe.data();
   EXPECT_EQ(azimuthfoc(files, f.scene, conf), 0);
-  for (const auto& p : kPixels)
-    f.targets.push_back({f.scene.firstLineTime + p[0] / g.prf,
-                         (f.scene.firstSampleTime + p[1] / g.frg) * kC / 2.0, 1.0});
+  f.targets = placeTargets(g, f.scene.firstLineTime, f.scene.firstSampleTime);
   f.image = simulate(g, f.targets);
   f.scene.buffer = f.image.data();
   EXPECT_EQ(azimuthfoc(files, f.scene, conf), 0);
@@ -120,28 +81,28 @@ void checkTargets(const Geometry& g, const AzimuthFocusConf& conf, bool rangeWin
 TEST(StoltFocusPointTargets, LeastSquaresKernelErsLikeCentroid) {
   Geometry g;
   g.dc = 300.0;
-  const AzimuthFocusConf conf = stoltConf(g, 7, 0.4);
+  const AzimuthFocusConf conf = sceneConf(g, 7, 0.4);
   checkTargets(g, conf, true, focus(g, conf));
 }
 
 TEST(StoltFocusPointTargets, LeastSquaresKernelCentroidNearHalfPrf) {
   Geometry g;
   g.dc = 0.48 * g.prf;
-  const AzimuthFocusConf conf = stoltConf(g, 7, 0.4);
+  const AzimuthFocusConf conf = sceneConf(g, 7, 0.4);
   checkTargets(g, conf, true, focus(g, conf));
 }
 
 TEST(StoltFocusPointTargets, ChirpZoomKernelErsLikeCentroid) {
   Geometry g;
   g.dc = 300.0;
-  const AzimuthFocusConf conf = stoltConf(g, 1, 0.4);
+  const AzimuthFocusConf conf = sceneConf(g, 1, 0.4);
   checkTargets(g, conf, false, focus(g, conf));
 }
 
 TEST(StoltFocusPointTargets, ChirpZoomKernelCentroidNearHalfPrf) {
   Geometry g;
   g.dc = 0.48 * g.prf;
-  const AzimuthFocusConf conf = stoltConf(g, 1, 0.4);
+  const AzimuthFocusConf conf = sceneConf(g, 1, 0.4);
   checkTargets(g, conf, false, focus(g, conf));
 }
 
