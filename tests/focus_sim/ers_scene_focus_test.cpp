@@ -67,6 +67,17 @@ class ErsSceneFocus : public ::testing::Test {
     return s;
   }
 
+  // Names of a simulated scene, a processing configuration and an output
+  // root handed to the ERS focuser.
+  void nameInputs(ersLevel0Focuser& f, const RawSceneSimulator& sim, const std::string& conf,
+                  const std::string& out) const {
+    f.level0Filename = sim.imagePath(dir_.string());
+    f.LEAFilename = sim.leaderPath(dir_.string());
+    f.orbitFilename = sim.odrPath(dir_.string());
+    f.configurationFilename = conf;
+    f.outputFilename = working_ + out;
+  }
+
   std::string trace() const {
     std::ifstream in(working_ + "Process.trace");
     return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
@@ -104,11 +115,7 @@ TEST_F(ErsSceneFocus, SimulatedSceneBecomesAFocusedProduct) {
   ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
 
   ersLevel0Focuser f;
-  f.level0Filename = sim.imagePath(dir_.string());
-  f.LEAFilename = sim.leaderPath(dir_.string());
-  f.orbitFilename = sim.odrPath(dir_.string());
-  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
-  f.outputFilename = working_ + "out";
+  nameInputs(f, sim, TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr", "out");
   testing::internal::CaptureStdout();
   const int status = f.run();
   const std::string printed = testing::internal::GetCapturedStdout();
@@ -216,11 +223,7 @@ TEST_F(ErsSceneFocus, ModularStepsFocusTheSceneFromAConfigurationDocument) {
   ASSERT_EQ(c.GSwrite(doc, 0), 0);
 
   ersLevel0Focuser f;
-  f.level0Filename = sim.imagePath(dir_.string());
-  f.LEAFilename = sim.leaderPath(dir_.string());
-  f.orbitFilename = sim.odrPath(dir_.string());
-  f.configurationFilename = doc;
-  f.outputFilename = working_ + "mod";
+  nameInputs(f, sim, doc, "mod");
   testing::internal::CaptureStdout();
   const int status = f.run_modular();
   testing::internal::GetCapturedStdout();
@@ -271,11 +274,7 @@ TEST_F(ErsSceneFocus, TruncatedImageFileEndsInTheExtractor) {
   ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
 
   ersLevel0Focuser f;
-  f.level0Filename = sim.imagePath(dir_.string());
-  f.LEAFilename = sim.leaderPath(dir_.string());
-  f.orbitFilename = sim.odrPath(dir_.string());
-  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
-  f.outputFilename = working_ + "out";
+  nameInputs(f, sim, TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr", "out");
   testing::internal::CaptureStdout();
   const int status = f.run();
   const std::string printed = testing::internal::GetCapturedStdout();
@@ -300,11 +299,7 @@ TEST_F(ErsSceneFocus, ChainErasesEachInputOnceItsStageHasUsedIt) {
 
   // Extraction by the ERS focuser, then the chain on its own.
   ersLevel0Focuser f;
-  f.level0Filename = sim.imagePath(dir_.string());
-  f.LEAFilename = sim.leaderPath(dir_.string());
-  f.orbitFilename = sim.odrPath(dir_.string());
-  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
-  f.outputFilename = working_ + "out";
+  nameInputs(f, sim, TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr", "out");
   ASSERT_EQ(f.initialize(), 0);
   ASSERT_EQ(f.ingestion(), 0);
 
@@ -342,11 +337,7 @@ TEST_F(HeavyErsSceneFocus, TwoChannelsAreFocusedAndDescalloped) {
   std::string error;
   ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
   ersLevel0Focuser f;
-  f.level0Filename = sim.imagePath(dir_.string());
-  f.LEAFilename = sim.leaderPath(dir_.string());
-  f.orbitFilename = sim.odrPath(dir_.string());
-  f.configurationFilename = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
-  f.outputFilename = working_ + "ers";
+  nameInputs(f, sim, TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr", "ers");
   ASSERT_EQ(f.initialize(), 0);
   ASSERT_EQ(f.ingestion(), 0);
   for (const char* k : {"1", "2"}) {
