@@ -2,23 +2,31 @@
 # Demo of a whole focusing job: simulates a small ERS-2 scene with point
 # targets and clutter, writes a job file, runs stripmap_focuser as the host
 # does (command string, TESSIVOR_* variables, progress file), and prints
-# where the products are and the point-target analysis of the product.
-#   scripts/demo.sh [BUILD_DIR]      (make demo builds first, then runs it)
+# where the products are and the point-target analysis of the product. It
+# ends with a multi-looked amplitude GeoTIFF of the scene, its KML overlay
+# and a PNG quicklook.
+#   scripts/demo.sh [BUILD_DIR [DEMO_DIR]]   (make demo builds first, then runs it;
+#                                             DEMO_DIR defaults to BUILD_DIR/demo)
 set -euo pipefail
 
 BUILD=$(cd "${1:-build}" && pwd)
 SOURCE=$(cd "$(dirname "$0")/.." && pwd)
 BIN="$BUILD/bin"
-for tool in stripmap_focuser sarsim sarpta; do
+for tool in stripmap_focuser sarsim sarpta tesv_raster_to_geotiff; do
   if [ ! -x "$BIN/$tool" ]; then
     echo "demo: $BIN/$tool is missing; run 'make demo' (it builds first)" >&2
     exit 1
   fi
 done
 
-DEMO="$BUILD/demo"
+DEMO="${2:-$BUILD/demo}"
 rm -rf "$DEMO"
-mkdir -p "$DEMO/work"
+mkdir -p "$DEMO/work" "$DEMO/resources"
+DEMO=$(cd "$DEMO" && pwd)
+
+# The ERS profile of the demo asks the chain for a multi-looked product.
+cp "$SOURCE"/resources/* "$DEMO/resources/"
+sed -i 's/^Multilook = 0$/Multilook = 1/' "$DEMO/resources/parameters_ERS.hdr"
 
 # 1. The scene: 4096 lines of 2048 samples (1.1 km of swath is enough to
 #    show the chain), a Doppler centroid of 250 Hz, five targets and clutter.
@@ -89,7 +97,7 @@ JOB="$DEMO/work/job.txt"
   echo "1"                                # 18 erase the chain's temporary files
   echo "NotOK"                            # 19
   echo "0"; echo "0"                      # 20-21
-  echo "NotOK"                            # 22 no GeoTIFF
+  echo "OK"                               # 22 GeoTIFF, KML and ENVI header
   echo "0"                                # 23
 } > "$JOB"
 echo "== Job file $JOB"
@@ -101,7 +109,7 @@ status=0
   cd "$DEMO/work"
   TESSIVOR_WORKING_DIR="$DEMO/work/" \
   TESSIVOR_WORKING_FILE="$DEMO/work/progress.txt" \
-  TESSIVOR_CEOS_DES_FILES_DIR="$SOURCE/resources/" \
+  TESSIVOR_CEOS_DES_FILES_DIR="$DEMO/resources/" \
   TESSIVOR_TRACING=ACTIVE \
     "$BIN/stripmap_focuser" "main_focussing_stripmap#$JOB" > "$DEMO/work/console.txt" 2>&1
 ) || status=$?
@@ -126,6 +134,7 @@ done
 echo "  logs               $DEMO/work/Process.log, $DEMO/work/Process.trace"
 echo "  Doppler estimate   $DEMO/work/DCEST_resume.txt"
 echo "  truth of targets   $SIM/truth.txt"
+echo "  GeoTIFF (full)     $PRODUCT.tif  (KML overlay $PRODUCT.kml, ENVI header $PRODUCT.hdr)"
 
 # 4. Point targets against the simulator's truth, with the product's own
 #    time axes and spectral windows.
@@ -136,3 +145,20 @@ echo "== Point-target analysis (sarpta)"
 echo
 echo "dLine, dSample: peak minus truth in pixels; irw in pixels (M: metres); pslr, islr in dB;"
 echo "dPhase: peak phase minus -4 pi R0 / lambda, radians. JSON: $DEMO/pta.json"
+
+# 5. The multi-looked amplitude image of the chain as a GeoTIFF with its KML
+#    overlay, and a PNG quicklook of it.
+MLA="$DEMO/work/demo_mla"
+"$BIN/tesv_raster_to_geotiff" "$MLA" "$MLA.tif" > /dev/null
+QUICKLOOK="$DEMO/demo_quicklook.png"
+if command -v gdal_translate > /dev/null 2>&1; then
+  gdal_translate -q -of PNG "$MLA.tif" "$QUICKLOOK"
+  rm -f "$QUICKLOOK.aux.xml"
+else
+  QUICKLOOK="(gdal_translate missing: run scripts/install-deps.sh)"
+fi
+echo
+echo "== Multi-looked amplitude"
+echo "  GeoTIFF            $MLA.tif  ($(value Lines) x $(value Samples) single-look samples averaged)"
+echo "  KML overlay        $MLA.kml"
+echo "  PNG quicklook      $QUICKLOOK"

@@ -4,7 +4,7 @@
 set -euo pipefail
 packages=(build-essential cmake pkg-config libfftw3-dev libxml2-dev libxml2-utils
           libexpat1-dev libtiff-dev libgeotiff-dev googletest libgtest-dev libgmock-dev
-          libbenchmark-dev)
+          libbenchmark-dev gdal-bin python3)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")

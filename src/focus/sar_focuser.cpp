@@ -9,6 +9,7 @@
 #include "core/azimuth_focus.h"
 #include "core/fft.h"
 #include "core/range_focus.h"
+#include "core/stripmlook.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
 #include "doppler/dc_driver.h"
@@ -773,8 +774,10 @@ int SARFocuser::process() {
   rawRecord.destroyAll();
 
   if (conf.Multilook) {
-    ORV_REPORT("Multi-looked product not available in this build", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
+    if (int st = stripmlookFocusedProduct(ctx.outputFile, conf.Memory, conf.Verbose,
+                                          conf.ReportLevel, conf.ReportFilename);
+        st != 0)
+      return calledError(st);
   }
   return 0;
 }
