@@ -156,28 +156,26 @@ TEST(ErsProducts, GeoTiffKmlEnviAndMultilookOfAFocusedScene) {
     if (std::norm(slc[k]) > std::norm(slc[peak])) peak = k;
   const int pl = int(peak / S), ps = int(peak % S);
 
-  // Clutter: blocks of 200 lines x 128 samples away from the targets; the
-  // look level of each follows the single-look level within 0.2 dB, and
-  // the levels spread over the image by less than 0.2 dB.
-  double lowest = 1e300, highest = 0.0;
+  // Clutter: blocks of 200 lines x 128 samples away from the targets. The
+  // simulated clutter itself varies by about 0.4 dB between such blocks, so
+  // flatness is measured against the single-look image: the look level of
+  // every block follows the single-look level within 0.2 dB.
   std::vector<double> levels;
   for (int l0 = 0; l0 + 200 <= L; l0 += 200)
-    for (int s0 = 64; s0 + 128 <= S - 64; s0 += 128) {
+    for (int s0 = 64; s0 + 160 <= S; s0 += 128) {
       double strongest = 0.0;
       for (int l = l0; l < l0 + 200; ++l)
-        for (int s = s0; s < s0 + 128; ++s) strongest = std::max(strongest, double(std::norm(slc[std::size_t(l) * S + s])));
+        for (int s = s0 - 32; s < s0 + 160; ++s)  // with a margin: interpolation reaches across
+          strongest = std::max(strongest, double(std::norm(slc[std::size_t(l) * S + s])));
       const double single = slcPower(l0, l0 + 200, s0, s0 + 128);
       if (strongest > 50.0 * single / (200 * 128)) continue;  // a target's response
       const double ratio = dB(lookedPower(l0, l0 + 200, s0, s0 + 128) / single);
       EXPECT_NEAR(ratio, 0.0, 0.2) << "block at line " << l0 << ", sample " << s0;
-      const double level = lookedPower(l0, l0 + 200, s0, s0 + 128) / (200 * 128);
-      levels.push_back(level);
-      lowest = std::min(lowest, level), highest = std::max(highest, level);
+      levels.push_back(lookedPower(l0, l0 + 200, s0, s0 + 128) / (200 * 128));
     }
   ASSERT_GT(levels.size(), 20u);
   std::sort(levels.begin(), levels.end());
   const double clutter = levels[levels.size() / 2];
-  EXPECT_LT(dB(highest / lowest), 0.4) << "clutter levels " << lowest << " to " << highest;
 
   // The strongest target's energy, clutter removed, is kept within 0.1 dB.
   const int l0 = (pl - 60) / kLook * kLook, l1 = l0 + 120, s0 = ps - 24, s1 = ps + 25;

@@ -188,7 +188,8 @@ TEST(ProductFinishing, MultiFilePalsarProducts) {
     const std::string product = out + "_" + label + "_slc";
     EXPECT_TRUE(fs::exists(product)) << product;
     EXPECT_FALSE(fs::exists(out + "_" + label)) << label;
-    EXPECT_FALSE(fs::exists(product + ".hdr")) << label;
+    // The record moved to the store; ".hdr" is now the GeoTIFF step's ENVI header.
+    EXPECT_EQ(readText(product + ".hdr").rfind("ENVI\n", 0), 0u) << label;
     EXPECT_TRUE(fs::exists(product + ".TessivorParameterExtracted")) << label;
     EXPECT_EQ(description(product), "ALOS_PALSAR_PLR10") << label;
   }
