@@ -27,6 +27,19 @@ TEST(Demo, QuicklookShowsTheFiveTargetsOnClutter) {
   ASSERT_EQ(record.GSread(demo + "/work/demo_mla.hdr"), 0);
   const ROI_Obj& roi = record.roi.roi;
   const int W = roi.Samples, H = roi.Lines;
+  // The chain's looks: 4 in range; in azimuth 4 times the rounded ratio of
+  // ground-range to azimuth spacing (20 for ERS).
+  GeneralSAR slc;
+  ASSERT_EQ(slc.GSread(demo + "/work/demo_slc.TessivorParameterExtracted"), 0);
+  const ROI_Obj& single = slc.roi.roi;
+  const double ground = single.FastTimeDelta * 149896229.0 / std::sin(slc.geoCoords.center.incidence * M_PI / 180.0);
+  const int looks = 4 * int(std::lround(ground / (single.SlowTimeDelta * slc.attitude.Eq_speed)));
+  EXPECT_EQ(looks, 20);
+  EXPECT_NEAR(roi.FastTimeDelta, 4.0 * single.FastTimeDelta, 1e-15);
+  EXPECT_NEAR(roi.SlowTimeDelta, looks * single.SlowTimeDelta, 1e-9);
+  EXPECT_EQ(H, single.Lines / looks + 1);
+  EXPECT_EQ(W, single.Samples / 4 + 1);
+  slc.GSdestroy();
   const std::string raw = dir / "quicklook.raw";
   ASSERT_EQ(std::system(("gdal_translate -q -of ENVI '" + quicklook + "' '" + raw + "'").c_str()), 0);
   const std::string bytes = readText(raw);
