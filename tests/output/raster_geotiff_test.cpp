@@ -4,7 +4,9 @@
 // of the two global map states).
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdint>
+#include <cstring>
 #include <cmath>
 #include <cstdlib>
 #include <fstream>
@@ -34,12 +36,17 @@ tesv_description_section rasterHeader(int lines, int samples, const std::string&
 }
 
 void writeFloatRaster(const std::string& name, int lines, int samples,
-                      const std::function<float(int, int)>& value) {
-  std::vector<float> data(std::size_t(lines) * samples);
+                      const std::function<float(int, int)>& value, bool bigEndian = false) {
+  std::string bytes;
   for (int l = 0; l < lines; ++l)
-    for (int s = 0; s < samples; ++s) data[std::size_t(l) * samples + s] = value(l, s);
-  std::ofstream(name, std::ios::binary)
-      .write(reinterpret_cast<const char*>(data.data()), std::streamsize(data.size() * 4));
+    for (int s = 0; s < samples; ++s) {
+      const float v = value(l, s);
+      char b[4];
+      std::memcpy(b, &v, 4);
+      if (bigEndian) std::reverse(b, b + 4);
+      bytes.append(b, 4);
+    }
+  std::ofstream(name, std::ios::binary) << bytes;
 }
 
 std::string commandOutput(const std::string& command) {
@@ -142,8 +149,9 @@ TEST(RasterFile, TiffProductsAsGdalReadsThem) {
   const std::string dir = freshDir();
   DirGuard guard{dir};
   const std::string name = dir + "geo";
-  writeFloatRaster(name, 20, 30, [](int l, int s) { return 1.0f + l + 0.5f * s; });
+  writeFloatRaster(name, 20, 30, [](int l, int s) { return 1.0f + l + 0.5f * s; }, true);
   auto h = rasterHeader(20, 30, "FLOAT32");
+  h.setField("RasterInfo.BytesOrder").setString("MSBF");
   h.setField("RasterInfo.GeocodedImage").setString("YES");
   h.setField("CartographicSystem.State").setString("UTM-GLOBAL");
   h.setField("CartographicSystem.Zone").setInt(33);
@@ -176,6 +184,11 @@ TEST(RasterFile, TiffProductsAsGdalReadsThem) {
   info = commandOutput("gdalinfo '" + name + "'");
   EXPECT_TRUE(contains(info, "Driver: ENVI/")) << info;
   EXPECT_TRUE(contains(info, "Type=Float32")) << info;
+  EXPECT_EQ(commandOutput("gdallocationinfo -valonly '" + name + "' 4 3"), "6\n");
+  // Brightness grows with the line and the sample.
+  auto pixel = [&](int x, int y) { return std::stoi(commandOutput("gdallocationinfo -valonly '" + name + ".tif' " + std::to_string(x) + " " + std::to_string(y))); };
+  EXPECT_LT(pixel(0, 0), 20);
+  EXPECT_GT(pixel(29, 19), 200);
 
   // Geographic WGS 84, half the rows, and a palette from a parameter file.
   h.getField("CartographicSystem.State")->setString("GEO-GLOBAL");
@@ -186,12 +199,14 @@ TEST(RasterFile, TiffProductsAsGdalReadsThem) {
   ASSERT_EQ(tesv_write_description_text(h, name + "_hdr"), 0);
   std::string lut;
   for (int i = 0; i < 256; ++i) lut += std::to_string(i) + (i < 255 ? " " : "");
-  std::ofstream(dir + "tiff.par") << "[TiffParameters]\nTiffRowScale = 2\nTiffLUTRed = {" << lut
+  std::ofstream(dir + "tiff.par") << "[TiffParameters]\nTiffRowScale = 2\nTiffRowsInvert = 1\nTiffColsInvert = 1\nTiffLUTRed = {" << lut
                                   << "}\nTiffLUTGreen = {" << lut << "}\nTiffLUTBlue = {" << lut << "}\n";
   request.parameterFile = dir + "tiff.par";
   ASSERT_EQ(tesv_raster_to_geotiff(request), 0);
   info = commandOutput("gdalinfo '" + name + ".tif'");
   EXPECT_TRUE(contains(info, "Size is 30, 10")) << info;
+  EXPECT_GT(pixel(0, 0), 200);  // rows and columns reversed, every second row
+  EXPECT_LT(pixel(29, 9), 20);
   EXPECT_TRUE(contains(info, "ColorInterp=Palette")) << info;
   EXPECT_TRUE(contains(info, "GEOGCRS[\"WGS 84\"")) << info;
   EXPECT_FALSE(contains(info, "UTM")) << info;
@@ -205,4 +220,42 @@ TEST(RasterFile, TiffProductsAsGdalReadsThem) {
   const std::string err = testing::internal::GetCapturedStderr();
   EXPECT_TRUE(contains(err, "State specified in the Image header or GCP File is invalid.")) << err;
   EXPECT_FALSE(std::filesystem::exists(name + ".tif"));
+}
+
+TEST(RasterFile, MapKeyFailuresNameTheField) {
+  auto h = rasterHeader(2, 2, "FLOAT32");
+  h.setField("RasterInfo.GeocodedImage").setString("YES");
+  h.setField("CartographicSystem.State").setString("UTM-GLOBAL");
+  h.setField("CartographicSystem.Zone").setInt(61);
+  for (const char* key : {"LonEasting", "LatNorthing", "PixelSpacingLonEast", "PixelSpacingLatNorth"})
+    h.setField(std::string("RegistrationCoordinates.") + key).setDouble(1.0);
+  MapKeys keys;
+  std::string error;
+  EXPECT_EQ(ReadMapKeys(h, keys, error), 1);
+  EXPECT_EQ(error, "Zone not found [61]");
+  h.getField("CartographicSystem.Zone")->setInt(31);
+  h.setField("CartographicSystem.Hemisphere").setString("EAST");
+  EXPECT_EQ(ReadMapKeys(h, keys, error), 1);
+  EXPECT_EQ(error, "Hemisphere not found [EAST]");
+  h.getField("CartographicSystem.Hemisphere")->setString("SOUTH");
+  ASSERT_EQ(ReadMapKeys(h, keys, error), 0);
+  EXPECT_EQ(keys.Zone, 31);
+  // A projected state needs the map list of the map folder.
+  const std::string dir = freshDir();
+  DirGuard guard{dir};
+  setenv("TESSIVOR_MAP_FILES_DIR", dir.c_str(), 1);
+  h.getField("CartographicSystem.State")->setString("LAMBERT72");
+  EXPECT_EQ(ReadMapKeys(h, keys, error), 9);
+  EXPECT_EQ(error, "Error: missing map file " + dir + "map_list");
+  std::ofstream(dir + "map_list") << "[map_list]\nprojection_LCC = lcc.map\nhemisphere_NORTH = n\n";
+  h.setField("CartographicSystem.Projection").setString("LCC");
+  EXPECT_EQ(ReadMapKeys(h, keys, error), 1);
+  EXPECT_EQ(error, "Hemisphere not found [SOUTH]");
+  h.getField("CartographicSystem.Projection")->setString("TM");
+  EXPECT_EQ(ReadMapKeys(h, keys, error), 1);
+  EXPECT_EQ(error, "Projrction not found [TM]");
+  unsetenv("TESSIVOR_MAP_FILES_DIR");
+  h.getField("RegistrationCoordinates.LonEasting")->setString("east");
+  EXPECT_EQ(ReadMapKeys(h, keys, error), 1);
+  EXPECT_EQ(error, "Wrong map field. Please check.");
 }
