@@ -2,7 +2,8 @@
 // Rasters described by a text description header ("<name>_hdr"): layout
 // with row prefixes and suffixes, a file header and a footer, any cell type
 // in either byte order; rows delivered as real amplitudes for the
-// user-facing products (TIFF, KML overlay, ENVI header).
+// user-facing products (TIFF, KML overlay, ENVI header), and the byte
+// scaling of those amplitudes.
 #include <cstdint>
 #include <fstream>
 #include <string>
@@ -121,41 +122,9 @@ int ComputeScaling(CRasterFile& raster, const SampleGrid& grid, const TiffContro
 unsigned char ScaleToByte(float amplitude, bool null, const TiffControl& control,
                           const RasterStatistics& statistics);
 
-// Geographic state of a header's map keys.
-struct MapKeys {
-  bool geocoded = false;  // RasterInfo.GeocodedImage present
-  std::string State, Hemisphere, Projection, Ellipsoid, DatumShift;
-  int Zone = 0;
-  double ReferenceHeight = 0.0;
-  double LonEasting = 0.0, LatNorthing = 0.0;
-  double PixelSpacingLonEast = 0.0, PixelSpacingLatNorth = 0.0;
-};
+// Typed values of "Section.Field" of a header; false when absent or not
+// convertible.
+bool headerDouble(const tesv_description_section& h, const std::string& name, double& v);
+bool headerInt(const tesv_description_section& h, const std::string& name, long long& v);
+bool headerString(const tesv_description_section& h, const std::string& name, std::string& v);
 
-// Reads the map keys of the CartographicSystem and RegistrationCoordinates
-// sections. 0 (not geocoded included); 1 with "State specified in the Image
-// header or GCP File is invalid.", "Wrong map field. Please check." or
-// "<field> not found [<value>]" in error; 9 with "Error: missing map file "
-// when a projected state's map list is absent from TESSIVOR_MAP_FILES_DIR.
-int ReadMapKeys(const tesv_description_section& header, MapKeys& keys, std::string& error);
-
-// Writes an 8-bit TIFF of the raster (grey, or palette with the LUT
-// tables), subsampled and inverted as the control says, with the GeoTIFF
-// keys of the two global map states. The description tag reads
-// "Image generated with : <program>". 0, or the status of the failing step.
-int WriteRasterTiff(CRasterFile& raster, const std::string& tiffName, const TiffControl& control,
-                    const RasterStatistics& statistics, const MapKeys& map);
-
-// The KML 2.0 ground overlay of `imageHref` over the box of the header's
-// corner points. 0; 1 when the header has no usable corners; 5 on a write
-// failure.
-int WriteKmlOverlay(const tesv_description_section& header, const std::string& kmlName,
-                    const std::string& imageHref, const std::string& title);
-
-// The ENVI header "<raster>.hdr" of a raster, with the key names of the
-// description file ENVI_descriptions_<type>.des (type from
-// RasterInfo.ENVI_HeaderDescriptionType, else "default") in
-// TESSIVOR_CEOS_DES_FILES_DIR. An existing "<raster>.hdr" that is not an ENVI
-// header (a product record) is left alone (status 1). 0; 9 for a missing
-// description file; 10 for a layout ENVI cannot describe; 5 on a write
-// failure.
-int WriteEnviHeader(const CRasterFile& raster, std::string& error);

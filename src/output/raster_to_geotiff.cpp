@@ -9,6 +9,8 @@
 #include "diag/report.h"
 #include "output/general_sar_kelmir.h"
 #include "output/raster_file.h"
+#include "output/raster_side_files.h"
+#include "output/raster_tiff.h"
 
 namespace {
 

@@ -17,6 +17,8 @@
 #include "output/description_text.h"
 #include "output/output_test_util.h"
 #include "output/raster_file.h"
+#include "output/raster_side_files.h"
+#include "output/raster_tiff.h"
 #include "output/raster_to_geotiff.h"
 
 using output_test::DirGuard;
