@@ -94,6 +94,13 @@ TEST(FourierInterpolation, TonesAlongRowsAndColumnsStayTones) {
 
 TEST(StripMultilook, ConstantImageKeepsItsValueCoherentlyAndInAmplitude) {
   const std::string dir = record_test::freshDir();
+  struct Cleanup {
+    std::string dir;
+    ~Cleanup() {
+      std::error_code ec;
+      std::filesystem::remove_all(dir, ec);
+    }
+  } cleanup{dir};
   const std::string slc = dir + "/slc";
   const fcomplex value(0.75f, -1.0f);
   constantProduct(slc, 9, 12, value);
@@ -138,5 +145,4 @@ TEST(StripMultilook, ConstantImageKeepsItsValueCoherentlyAndInAmplitude) {
   ml.AzimuthMLFactor = 3;
   ml.RangeMLFactor = 0;
   EXPECT_EQ(ml.coherml(), 1);
-  std::filesystem::remove_all(dir);
 }
