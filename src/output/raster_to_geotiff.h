@@ -18,7 +18,8 @@ struct GeoTiffRequest {
   int sampleLimit = 1000000;           // most points of the statistics grid
   int zeros2[2] = {0, 0};              // TiffMinValue (0: 1, so that 0 stays for null cells),
                                        // TiffScale (0: from the statistics)
-  int unset[4] = {-1, -1, -1, -1};     // palette selector and reserved values (-1: grey image)
+  int unset[4] = {-1, -1, -1, -1};     // reserved, -1: unset (a palette comes from the LUT keys
+                                       // of the parameter file)
   int last = 0;                        // 1: no ENVI header
   std::string parameterFile;           // optional profile with the Tiff* keys (section
                                        // "TiffParameters"); its keys win over the values above
