@@ -87,6 +87,8 @@ int main(int argc, char** argv) {
   options.self = selfPath();
   options.focuser = options.self.parent_path() / "stripmap_focuser";
   if (argc > 1 && std::strcmp(argv[1], "--task") == 0) return taskMain(argc, argv, options);
+  // A stop asked for while the batch starts is kept for the loop below.
+  batch::installStopHandlers();
 
   std::string out = "stripmap_batch";
   bool slurm = false, stop = false, summaryOnly = false;
@@ -197,7 +199,6 @@ int main(int argc, char** argv) {
     return 2;
   }
   fs::remove(batch::stopFile(options.batchDir), ec);
-  batch::installStopHandlers();
 
   const std::vector<batch::Job> selected = batch::scenesToRun(jobs, options.all);
   if (!options.quiet && selected.size() < jobs.size())
