@@ -155,8 +155,11 @@ int main(int argc, char** argv) {
   std::string error;
   if (stop || summaryOnly || inputs.empty()) {
     if (!inputs.empty()) return usageError("--stop and --summary take no job files");
-    if (!batch::readManifest(manifest, jobs, error))
-      return usageError(error + " (no earlier batch in " + options.batchDir.string() + ")");
+    if (!batch::readManifest(manifest, jobs, error)) {
+      std::fprintf(stderr, "stripmap_batch: %s (no earlier batch in %s)\n", error.c_str(),
+                   options.batchDir.c_str());
+      return 2;
+    }
   } else if (!batch::collectJobs(inputs, options.batchDir, jobs, error)) {
     std::fprintf(stderr, "stripmap_batch: %s\n", error.c_str());
     return 2;

@@ -263,6 +263,23 @@ TEST(BatchRun, StackOnThisMachineThenOnlyTheRepairedSceneThenAStop) {
     EXPECT_EQ(summaryRow(batch, sceneName(i)).at("state"), "success") << sceneName(i);
 }
 
+TEST(BatchRun, JobsThatWouldShareProductsOrDoNotExistAreRefusedBeforeAnyRun) {
+  Folder dir("refused");
+  SceneFiles files;
+  files.image = dir / "scene.dat";
+  writeJob(dir / "a.txt", ersJob(files, dir / "out"));
+  writeJob(dir / "b.txt", ersJob(files, dir / "sub/../out"));
+  const BatchRun shared = runBatch({"--out", dir / "batch", dir / "a.txt", dir / "b.txt"}, dir / "shared.log");
+  EXPECT_EQ(shared.exitStatus, 2);
+  EXPECT_TRUE(contains(shared.output, dir / "a.txt") && contains(shared.output, dir / "b.txt") &&
+              contains(shared.output, "write the same products"))
+      << shared.output;
+  const BatchRun missing = runBatch({"--out", dir / "batch", dir / "c.txt"}, dir / "missing.log");
+  EXPECT_EQ(missing.exitStatus, 2);
+  EXPECT_TRUE(contains(missing.output, "job file not found: " + dir / "c.txt")) << missing.output;
+  EXPECT_FALSE(fs::exists(dir / "batch/work/a"));
+}
+
 TEST(BatchRun, SlurmArrayGivesTheProductsOfTheLocalRun) {
   Folder dir("slurm");
   LocalCluster cluster(dir / "cluster");
