@@ -7,6 +7,7 @@
 #include <sys/file.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -73,6 +74,7 @@ int taskMain(int argc, char** argv, batch::Options options) {
   const int index = std::atoi(argv[3]);
   const bool onlyIfFailed = argc > 4 && std::strcmp(argv[4], "--if-failed") == 0;
   options.batchDir = fs::absolute(argv[2]).parent_path().parent_path();
+  if (const char* cpus = std::getenv("SLURM_CPUS_PER_TASK")) options.threadsPerRun = std::atoi(cpus);
   batch::installStopHandlers();
   for (const batch::Job& job : jobs)
     if (job.index == index) return batch::runTask(job, options, onlyIfFailed);
@@ -221,6 +223,7 @@ int main(int argc, char** argv) {
       if (!options.quiet)
         std::printf("running %zu scene%s, %d at a time, in %s\n", selected.size(),
                     selected.size() == 1 ? "" : "s", parallel, options.batchDir.c_str());
+      options.threadsPerRun = std::max(1, batch::usableCores() / parallel);
       batch::runLocal(selected, options, parallel);
     }
   }

@@ -51,6 +51,11 @@ pid_t startFocuser(const Job& job, const Options& options, std::string& error) {
       continue;
     environment.push_back(entry);
   }
+  // Runs side by side share the cores instead of each taking all of them.
+  if (options.threadsPerRun > 0) {
+    for (const char* name : {"TESSIVOR_FFT_THREADS", "OMP_NUM_THREADS"})
+      if (!std::getenv(name)) environment.push_back(std::string(name) + "=" + std::to_string(options.threadsPerRun));
+  }
   environment.push_back("TESSIVOR_WORKING_DIR=" + job.workDir.string() + "/");
   environment.push_back("TESSIVOR_WORKING_FILE=" + job.progressFile().string());
   std::vector<char*> envp;
@@ -142,11 +147,15 @@ std::vector<Job> scenesToRun(const std::vector<Job>& jobs, bool all) {
   return selected;
 }
 
-int automaticParallelRuns(const std::vector<Job>& jobs, int marginMb) {
+int usableCores() {
   int cores = static_cast<int>(std::thread::hardware_concurrency());
   cpu_set_t set;
   if (sched_getaffinity(0, sizeof set, &set) == 0) cores = CPU_COUNT(&set);
-  cores = std::max(cores, 1);
+  return std::max(cores, 1);
+}
+
+int automaticParallelRuns(const std::vector<Job>& jobs, int marginMb) {
+  const int cores = usableCores();
   long availableMb = 0;
   std::ifstream meminfo("/proc/meminfo");
   std::string key;

@@ -18,6 +18,9 @@ struct Options {
   int memoryMarginMb = 256;  // added to a job's budget for what lies outside it
   bool all = false;          // rerun scenes that already have a product
   bool quiet = false;
+  // Threads of one focuser run (FFT and parallel loops), unless the
+  // environment says otherwise; 0 leaves the focuser's own choice.
+  int threadsPerRun = 0;
   // Slurm.
   int cpusPerTask = 1;
   int retries = 0;           // chained reruns of the failed tasks
@@ -39,6 +42,9 @@ std::vector<Job> scenesToRun(const std::vector<Job>& jobs, bool all);
 // Parallel runs that the machine affords: its cores, and its available
 // memory divided by the largest request (budget + margin) of the jobs.
 int automaticParallelRuns(const std::vector<Job>& jobs, int marginMb);
+
+// Cores this process may use.
+int usableCores();
 
 // Runs the jobs on this machine, `parallel` at a time; a failed scene does
 // not stop the others. Returns after every started run has ended.
