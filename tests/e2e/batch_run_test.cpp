@@ -1,6 +1,7 @@
 // A stack of six small simulated ERS scenes, one of them damaged, through
 // stripmap_batch: side by side on this machine, again for the failed scene
-// only, stopped by a signal, and as a Slurm job array on a one-node cluster
+// only, stopped by a signal and by a stop request, and as a Slurm job array
+// on a one-node cluster
 // started on this machine. Products are measured with sarpta.
 #include <signal.h>
 
@@ -201,7 +202,7 @@ class LocalCluster {
 
 }  // namespace
 
-TEST(BatchRun, StackOnThisMachineThenOnlyTheRepairedSceneThenAStop) {
+TEST(BatchRun, StackOnThisMachineThenOnlyTheRepairedSceneThenStops) {
   Folder dir("batch");
   Stack stack;
   simulateStack(dir, stack);
@@ -218,6 +219,8 @@ TEST(BatchRun, StackOnThisMachineThenOnlyTheRepairedSceneThenAStop) {
     const std::string work = batch + "/work/" + sceneName(i) + "/";
     EXPECT_TRUE(contains(readText(work + "Process.log"), i == kDamaged ? "[ERROR ID : 130560]" : "SUCCESSFUL"));
     EXPECT_EQ(fs::exists(work + "Tessivor_progress.txt_error"), i == kDamaged);
+    // The Doppler log goes to the run's current folder: one per scene.
+    EXPECT_EQ(fs::exists(work + "DCEST_resume.txt"), i != kDamaged);
   }
   EXPECT_TRUE(contains(readText(batch + "/progress.txt"), sceneName(0) + "\t"));
 
@@ -261,6 +264,26 @@ TEST(BatchRun, StackOnThisMachineThenOnlyTheRepairedSceneThenAStop) {
   EXPECT_TRUE(contains(stopped.output, "not started")) << stopped.output;
   for (int i = 1; i < kScenes; ++i)
     EXPECT_EQ(summaryRow(batch, sceneName(i)).at("state"), "success") << sceneName(i);
+
+  // Two at a time, stopped from another process once both run.
+  auto runs = [&](int i) {
+    const std::string work = batch + "/work/" + sceneName(i) + "/";
+    return contains(readText(work + "batch_run.txt"), "state = running") &&
+           fs::exists(work + "Tessivor_progress.txt");
+  };
+  bool asked = false;
+  const BatchRun second = runBatch(
+      {"--local", "2", "--all", "--out", batch, jobs}, dir / "stop2.log", {}, [&](pid_t) {
+        if (asked || !runs(0) || !runs(1)) return;
+        const BatchRun stop = runBatch({"--out", batch, "--stop"}, dir / "stop_command.log");
+        EXPECT_EQ(stop.exitStatus, 0) << stop.output;
+        EXPECT_TRUE(contains(stop.output, "stop value written for 2 running scenes")) << stop.output;
+        asked = true;
+      });
+  ASSERT_TRUE(asked) << second.output;
+  EXPECT_EQ(second.exitStatus, 1) << second.output;
+  for (int i = 0; i < kScenes; ++i)
+    EXPECT_EQ(summaryRow(batch, sceneName(i)).at("state"), i < 2 ? "stopped" : "success") << sceneName(i);
 }
 
 TEST(BatchRun, JobsThatWouldShareProductsOrDoNotExistAreRefusedBeforeAnyRun) {
