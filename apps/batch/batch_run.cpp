@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <chrono>
 #include <cstdio>
 #include <cstring>
@@ -275,6 +276,7 @@ int runTask(const Job& job, const Options& options, bool onlyIfFailed) {
   bool stopWritten = false;
   for (;;) {
     const pid_t done = wait4(pid, &status, WNOHANG, &usage);
+    if (done < 0 && errno == EINTR) continue;
     if (done == pid || done < 0) break;
     if (!stopWritten && stopAsked(options.batchDir)) stopWritten = writeStopValue(job);
     std::this_thread::sleep_for(std::chrono::milliseconds(200));

@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <csignal>
 #include <chrono>
 #include <cstdio>
 #include <cstring>
@@ -217,6 +218,7 @@ int runSlurm(const std::vector<Job>& all, const std::vector<Job>& jobs, const Op
   ProgressBoard board(options.batchDir, jobs, options.quiet);
   std::set<std::string> reported;
   bool stopped = false, cancelled = false;
+  int silent = 0;  // seconds without an answer from squeue
   double lastStop = 0.0;
   for (;;) {
     if (stopAsked(options.batchDir)) {
@@ -247,8 +249,28 @@ int runSlurm(const std::vector<Job>& all, const std::vector<Job>& jobs, const Op
     }
     board.flush();
     std::vector<std::string> still;
-    if (activeIds(ids, still) && still.empty()) break;
+    if (activeIds(ids, still)) {
+      if (still.empty()) break;
+      silent = 0;
+    } else if (++silent == 300) {
+      std::fprintf(stderr, "stripmap_batch: squeue has not answered for 5 minutes; the summary "
+                           "tells what the scenes have left so far\n");
+      break;
+    }
     std::this_thread::sleep_for(std::chrono::seconds(1));
+  }
+  // A task that left the queue without finishing its record was killed (by
+  // Slurm over its memory or time limit, or with its node).
+  for (const Job& job : jobs) {
+    RunRecord record;
+    if (!record.read(job.recordFile()) || record.finished || silent >= 300) continue;
+    record.finished = true;
+    record.signal = SIGKILL;
+    record.wallSeconds = wallClock() - record.started;
+    record.write(job.recordFile());
+    if (!options.quiet)
+      std::printf("%-24s killed: its task ended without its record (%s)\n", job.name.c_str(),
+                  record.runner.c_str());
   }
   board.flush(true);
   completeFromAccounting(jobs);

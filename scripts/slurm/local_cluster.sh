@@ -77,6 +77,13 @@ start_cluster() {
 
   # Munge: a key of our own, its socket in the cluster folder.
   local key="$dir/munge/munge.key" socket="$dir/munge/munge.socket"
+  [ ${#socket} -lt 100 ] || die 4 "the folder $dir is too deep for munge's socket path"
+  local port=${SLURM_LOCAL_PORT:-6817} p
+  for p in "$port" $((port + 1)); do
+    if (exec 3<>"/dev/tcp/127.0.0.1/$p") 2>/dev/null; then
+      die 4 "port $p is in use on this machine (choose others with SLURM_LOCAL_PORT)"
+    fi
+  done
   if [ ! -f "$key" ]; then
     if command -v mungekey >/dev/null; then
       mungekey --create --keyfile="$key" >/dev/null 2>&1 || die 4 "mungekey could not write $key"
@@ -90,7 +97,7 @@ start_cluster() {
     die 4 "munged did not start: $(tail -n 3 "$dir/log/munged.err" "$dir/log/munged.log" 2>/dev/null | tr '\n' ' ')"
 
   # The node as slurmd sees this machine: cores, sockets, memory.
-  local node host port=${SLURM_LOCAL_PORT:-6817}
+  local node host
   host=$(hostname -s)
   node=$(slurmd -C 2>/dev/null | head -n 1)
   [ -n "$node" ] || node="NodeName=$host CPUs=$(nproc) RealMemory=$(awk '/MemTotal/ {print int($2 / 1024)}' /proc/meminfo)"

@@ -1,8 +1,8 @@
 // A stack of six small simulated ERS scenes, one of them damaged, through
 // stripmap_batch: side by side on this machine, again for the failed scene
 // only, stopped by a signal and by a stop request, and as a Slurm job array
-// on a one-node cluster
-// started on this machine. Products are measured with sarpta.
+// on a one-node cluster started on this machine. Products are measured with
+// sarpta.
 #include <signal.h>
 
 #include <gtest/gtest.h>
