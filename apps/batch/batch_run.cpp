@@ -223,7 +223,8 @@ void runLocal(const std::vector<Job>& jobs, const Options& options, int parallel
       const pid_t pid = startFocuser(*job, options, error);
       if (pid < 0) {
         board.note(*job, error);
-        fs::remove(job->recordFile());
+        std::error_code ec;
+        fs::remove(job->recordFile(), ec);
         continue;
       }
       running.emplace(pid, std::move(run));
@@ -268,7 +269,8 @@ int runTask(const Job& job, const Options& options, bool onlyIfFailed) {
   const pid_t pid = startFocuser(job, options, error);
   if (pid < 0) {
     std::fprintf(stderr, "stripmap_batch: %s: %s\n", job.name.c_str(), error.c_str());
-    fs::remove(job.recordFile());
+    std::error_code ec;
+    fs::remove(job.recordFile(), ec);
     return 1;
   }
   int status = 0;
