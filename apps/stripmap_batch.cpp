@@ -27,7 +27,7 @@ constexpr const char* kUsage =
     "       stripmap_batch --out DIR [options]     (again the job files of DIR's last run)\n"
     "       stripmap_batch --out DIR --stop | --summary\n"
     "  --out DIR            batch folder: a working folder per scene, progress.txt, summary.csv,\n"
-    "                       summary.json (default: ./stripmap_batch)\n"
+    "                       summary.json (default: ./batch)\n"
     "  --local N            N scenes at a time on this machine (default: as many as the cores\n"
     "                       and the jobs' Memory budgets allow)\n"
     "  --slurm              one Slurm job array, a task per scene\n"
@@ -92,7 +92,7 @@ int main(int argc, char** argv) {
   // A stop asked for while the batch starts is kept for the loop below.
   batch::installStopHandlers();
 
-  std::string out = "stripmap_batch";
+  std::string out = "batch";
   bool slurm = false, stop = false, summaryOnly = false;
   std::vector<std::string> inputs;
   for (int i = 1; i < argc; ++i) {
