@@ -222,7 +222,15 @@ TEST(BatchRun, StackOnThisMachineThenOnlyTheRepairedSceneThenStops) {
     // The Doppler log goes to the run's current folder: one per scene.
     EXPECT_EQ(fs::exists(work + "DCEST_resume.txt"), i != kDamaged);
   }
-  EXPECT_TRUE(contains(readText(batch + "/progress.txt"), sceneName(0) + "\t"));
+  // The runs were followed stage by stage, and the table of the last state
+  // has one line per scene.
+  EXPECT_TRUE(std::regex_search(first.output, std::regex("scene_0 +[0-9]+%  Azimuth Focusing")))
+      << first.output;
+  const std::string table = readText(batch + "/progress.txt");
+  for (int i = 0; i < kScenes; ++i)
+    EXPECT_TRUE(std::regex_search(table, std::regex(sceneName(i) + "\t[^\n]*\t" +
+                                                    (i == kDamaged ? "failed" : "success") + "\n")))
+        << table;
 
   // The damaged scene repaired: a rerun runs it alone.
   std::map<int, std::string> records;
