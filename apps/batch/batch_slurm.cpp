@@ -73,23 +73,23 @@ std::string trim(std::string text) {
 }
 
 // Array indices as Slurm writes them: "0-3,5,7-8".
-std::string arraySpec(const std::vector<Job>& jobs) {
+std::string taskList(const std::vector<Job>& jobs) {
   std::vector<int> indices;
   for (const Job& job : jobs) indices.push_back(job.index);
   std::sort(indices.begin(), indices.end());
-  std::string spec;
+  std::string tasks;
   for (std::size_t i = 0; i < indices.size();) {
     std::size_t j = i;
     while (j + 1 < indices.size() && indices[j + 1] == indices[j] + 1) ++j;
-    if (!spec.empty()) spec += ",";
-    spec += std::to_string(indices[i]);
+    if (!tasks.empty()) tasks += ",";
+    tasks += std::to_string(indices[i]);
     if (j > i) {
-      spec += '-';
-      spec += std::to_string(indices[j]);
+      tasks += '-';
+      tasks += std::to_string(indices[j]);
     }
     i = j + 1;
   }
-  return spec;
+  return tasks;
 }
 
 fs::path submittedFile(const fs::path& batchDir) { return batchDir / "slurm" / "submitted.txt"; }
@@ -187,9 +187,9 @@ int runSlurm(const std::vector<Job>& all, const std::vector<Job>& jobs, const Op
   std::vector<std::string> earlier;
   activeIds(submittedIds(options.batchDir), earlier);
   std::vector<std::string> ids;
-  const std::string spec = arraySpec(jobs);
+  const std::string tasks = taskList(jobs);
   for (int attempt = 0; attempt <= options.retries; ++attempt) {
-    std::vector<std::string> args = {"sbatch", "--parsable", "--array=" + spec};
+    std::vector<std::string> args = {"sbatch", "--parsable", "--array=" + tasks};
     const std::vector<std::string> after = attempt == 0 ? earlier : std::vector<std::string>{ids.back()};
     if (!after.empty()) args.push_back("--dependency=afterany:" + joined(after, ":"));
     args.insert(args.end(), options.sbatchArguments.begin(), options.sbatchArguments.end());
@@ -209,7 +209,7 @@ int runSlurm(const std::vector<Job>& all, const std::vector<Job>& jobs, const Op
     ids.push_back(jobId);
     std::ofstream(submittedFile(options.batchDir), std::ios::app) << jobId << "\n";
     if (!options.quiet)
-      std::printf("submitted job array %s (tasks %s, %d MB each)%s\n", jobId.c_str(), spec.c_str(),
+      std::printf("submitted job array %s (tasks %s, %d MB each)%s\n", jobId.c_str(), tasks.c_str(),
                   memoryMb, attempt > 0 ? ", reruns the failed tasks" : "");
   }
   std::fflush(stdout);
