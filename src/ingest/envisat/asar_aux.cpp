@@ -13,6 +13,8 @@
 #include "base/status.h"
 #include "diag/report.h"
 #include "orbit/orbit_files.h"
+#include "product/acquisition_objects.h"
+#include "product/byte_order.h"
 
 namespace {
 
@@ -46,56 +48,11 @@ constexpr float kNoiseLevels[16] = {-0.05906f, -0.051f, -0.043f, -0.035f, -0.027
 
 int recordOf(const char* path, long size, std::vector<unsigned char>& record) {
   if (path == nullptr) return AUX_FAIL("File not opened! (no file name)", STATUS_NOT_OPENED);
-  if (int st = read_asar_record(path, size, record); st != 0) return AUX_CALLED(st);
+  if (int st = readAsarAuxRecord(path, std::size_t(size), record); st != 0) return AUX_CALLED(st);
   return 0;
 }
 
 }  // namespace
-
-float ch2float4(const unsigned char* p, int order) {
-  unsigned char b[4];
-  if (order == 'm') {
-    b[0] = p[3], b[1] = p[2], b[2] = p[1], b[3] = p[0];
-  } else {
-    std::memcpy(b, p, 4);
-  }
-  float v;
-  std::memcpy(&v, b, 4);
-  return v;
-}
-
-double ch2double8(const unsigned char* p, int order) {
-  unsigned char b[8];
-  for (int i = 0; i < 8; ++i) b[i] = order == 'm' ? p[7 - i] : p[i];
-  double v;
-  std::memcpy(&v, b, 8);
-  return v;
-}
-
-unsigned ch2uint2(const unsigned char* p, int order) {
-  return order == 'm' ? (unsigned(p[0]) << 8) | p[1] : (unsigned(p[1]) << 8) | p[0];
-}
-
-int read_asar_record(const std::string& path, long size, std::vector<unsigned char>& record) {
-  std::ifstream in(path, std::ios::binary);
-  if (!in) return AUX_FAIL("File not opened! " + path, STATUS_NOT_OPENED);
-  char sph[kAuxSphBytes + 1] = {};
-  in.seekg(kAsarMphBytes);
-  if (!in.read(sph, kAuxSphBytes)) return AUX_FAIL("File reading failed! " + path, STATUS_READ_FAILED);
-  char* end = nullptr;
-  const long offset = std::strtol(sph + 231, &end, 10);
-  if (end == sph + 231 || offset < kAsarMphBytes)
-    return AUX_FAIL("File reading failed! " + path + ": no data set offset in its SPH", STATUS_READ_FAILED);
-  try {
-    record.assign(std::size_t(size), 0);
-  } catch (const std::bad_alloc&) {
-    return AUX_FAIL("Memory allocation failed for the record of " + path, STATUS_NO_MEMORY);
-  }
-  in.seekg(offset);
-  if (!in.read(reinterpret_cast<char*>(record.data()), size))
-    return AUX_FAIL("File reading failed! " + path + ": its record is short", STATUS_READ_FAILED);
-  return 0;
-}
 
 FbaqTables& fbaq_tables() {
   static FbaqTables tables;
@@ -107,8 +64,8 @@ int LUTfbaq_f(const char* insPath, float* tableQ, float* tableI) {
   if (int st = recordOf(insPath, kInsRecordBytes, r); st != 0) return st;
   FbaqTables& t = fbaq_tables();
   for (int k = 0; k < kFbaqLevels * kFbaqCodes; ++k) {
-    t.Q[std::size_t(k)] = ch2float4(r.data() + ins::kTableQ + 4 * k);
-    t.I[std::size_t(k)] = ch2float4(r.data() + ins::kTableI + 4 * k);
+    t.Q[std::size_t(k)] = ch2float4(r.data() + ins::kTableQ + 4 * k, kMsbFirst);
+    t.I[std::size_t(k)] = ch2float4(r.data() + ins::kTableI + 4 * k, kMsbFirst);
   }
   if (tableQ) std::memcpy(tableQ, t.Q.data(), sizeof t.Q);
   if (tableI) std::memcpy(tableI, t.I.data(), sizeof t.I);
@@ -182,10 +139,10 @@ int fbaq_decode84fe(const unsigned char* data, float* out, int bytes, int sample
 int getDROOPgain(const char* insPath, float* gain, int count) {
   std::vector<unsigned char> r;
   if (int st = recordOf(insPath, kInsRecordBytes, r); st != 0) return st;
-  const float fs = ch2float4(r.data() + ins::kSampling);
-  const float T = ch2float4(r.data() + ins::kDroopTemperature);
+  const float fs = ch2float4(r.data() + ins::kSampling, kMsbFirst);
+  const float T = ch2float4(r.data() + ins::kDroopTemperature, kMsbFirst);
   float m[8];
-  for (int i = 0; i < 8; ++i) m[i] = static_cast<float>(ch2double8(r.data() + ins::kDroopModel + 8 * i));
+  for (int i = 0; i < 8; ++i) m[i] = static_cast<float>(ch2double8(r.data() + ins::kDroopModel + 8 * i, kMsbFirst));
   const float a1 = m[0], b1 = m[1], tau1 = m[2], a2 = m[3], b2 = m[4], tau2 = m[5], a3 = m[6], b3 = m[7];
   if (!(fs > 0.0f) || tau1 == 0.0f || tau2 == 0.0f)
     return AUX_FAIL("Bad sampling frequency or droop model in " + std::string(insPath), STATUS_BAD_PARAMETER);
@@ -215,11 +172,11 @@ int asainspar(const char* insPath, sarpar* par, int mode, const int* swathCodes,
       return AUX_FAIL("Swath code " + std::to_string(swathCodes[s]) + " outside the rank tables of " +
                           insPath,
                       STATUS_BAD_PARAMETER);
-    par[s].Sampling_frequency = ch2float4(r.data() + ins::kSampling);
-    par[s].Carrier_frequency = ch2float4(r.data() + ins::kCarrier);
-    par[s].Range_gate_bias = ch2float4(r.data() + ins::kRangeGateBias);
-    par[s].Swath_rank = static_cast<int>(ch2uint2(r.data() + rankTable + 2 * index));
-    par[s].secondRank = static_cast<int>(ch2uint2(r.data() + secondTable + 2 * index));
+    par[s].Sampling_frequency = ch2float4(r.data() + ins::kSampling, kMsbFirst);
+    par[s].Carrier_frequency = ch2float4(r.data() + ins::kCarrier, kMsbFirst);
+    par[s].Range_gate_bias = ch2float4(r.data() + ins::kRangeGateBias, kMsbFirst);
+    par[s].Swath_rank = static_cast<int>(ch2uint2(r.data() + rankTable + 2 * index, kMsbFirst));
+    par[s].secondRank = static_cast<int>(ch2uint2(r.data() + secondTable + 2 * index, kMsbFirst));
   }
   return 0;
 }
@@ -236,7 +193,7 @@ int xca_pattern_db(const char* xca, int polarisation, int swathNumber, int point
   in.seekg(kXcaPatternOffset + at);
   if (!in.read(reinterpret_cast<char*>(b), 4))
     return AUX_FAIL("File reading failed! " + std::string(xca), STATUS_READ_FAILED);
-  *value = ch2float4(b);
+  *value = ch2float4(b, kMsbFirst);
   return 0;
 }
 
@@ -254,12 +211,12 @@ int envi_rgpattern(const char* xca, const char* insPath, const sarpar* par, Rang
     if (!in.read(reinterpret_cast<char*>(block.data()), kXcaPatternBytes))
       return AUX_FAIL("File reading failed! " + std::string(xca), STATUS_READ_FAILED);
   }
-  pattern->firstAngle = ch2float4(r.data() + ins::kPatternAngle + 4 * par->swathNumber);
+  pattern->firstAngle = ch2float4(r.data() + ins::kPatternAngle + 4 * par->swathNumber, kMsbFirst);
   pattern->step = static_cast<float>(kPatternStepDeg);
   pattern->gain.resize(kPatternPoints);
   const long first = long(par->polarization_type + 4 * par->swathNumber) * kPatternPoints * 4 - 2424;
   for (int p = 0; p < kPatternPoints; ++p) {
-    const float db = ch2float4(block.data() + first + 4 * p);
+    const float db = ch2float4(block.data() + first + 4 * p, kMsbFirst);
     pattern->gain[std::size_t(p)] = static_cast<float>(std::pow(10.0, db / 20.0));
   }
   return 0;
@@ -300,10 +257,10 @@ int calibrationTables(const char* insPath, const char* xca, float* fn, float* gn
   std::vector<unsigned char> ri, rx;
   if (int st = recordOf(insPath, kInsRecordBytes, ri); st != 0) return st;
   if (int st = recordOf(xca, kXchRecordBytes, rx); st != 0) return st;
-  for (int k = 0; k < 64; ++k) gn[k] = ch2float4(rx.data() + 16 + 256 * polarisation + 4 * k);
+  for (int k = 0; k < 64; ++k) gn[k] = ch2float4(rx.data() + 16 + 256 * polarisation + 4 * k, kMsbFirst);
   for (int s = 0; s < swaths; ++s)
     for (int k = 0; k < 64; ++k)
-      fn[64 * s + k] = ch2float4(ri.data() + ins::kCalPulses + 256 * polarisation + 512 * s + 4 * k);
+      fn[64 * s + k] = ch2float4(ri.data() + ins::kCalPulses + 256 * polarisation + 512 * s + 4 * k, kMsbFirst);
   return 0;
 }
 }  // namespace

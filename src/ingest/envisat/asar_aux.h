@@ -11,11 +11,6 @@
 #include "base/fcomplex.h"
 #include "ingest/envisat/asar_records.h"
 
-// One big-endian (order 'm', 109) or little-endian value from a byte pointer.
-float ch2float4(const unsigned char* p, int order = 'm');
-double ch2double8(const unsigned char* p, int order = 'm');
-unsigned ch2uint2(const unsigned char* p, int order = 'm');
-
 inline constexpr long kAsarMphBytes = 1247;
 inline constexpr long kAuxSphBytes = 378;
 inline constexpr long kInsRecordBytes = 171648;
@@ -38,11 +33,6 @@ inline constexpr long kWsSecondRank = 161690, kWsRank = 161704;
 inline constexpr long kPatternAngle = 161916, kCalPulses = 162016;
 inline constexpr long kDroopTemperature = 171368, kDroopModel = 171372;
 }  // namespace ins
-
-// The data record of an auxiliary product: MPH, the first 378 bytes of the
-// SPH with the decimal DS_OFFSET at SPH offset 231, then `size` bytes from
-// there. 0, 9 "File not opened!" or 4 "File reading failed!" (reported).
-int read_asar_record(const std::string& path, long size, std::vector<unsigned char>& record);
 
 // Reconstruction tables of the 8-to-4 FBAQ, [level][block code].
 struct FbaqTables {
