@@ -343,4 +343,17 @@ inline double phaseSpread(const std::vector<double>& phases) {
   return worst;
 }
 
+// Every found target within 0.1 pixel of its zero-Doppler truth on both
+// axes, and the peak phases (less -4 pi R0 / lambda) within 5 degrees of
+// one another.
+inline void expectTargetsAtTruth(const PtaReport& pta) {
+  std::vector<double> phases;
+  for (const PtaTarget& t : pta.targets) {
+    EXPECT_LT(std::fabs(t.errorLine), 0.1) << pta.table;
+    EXPECT_LT(std::fabs(t.errorSample), 0.1) << pta.table;
+    if (t.found) phases.push_back(t.phaseError);
+  }
+  EXPECT_LT(phaseSpread(phases) * 180.0 / M_PI, 5.0) << pta.table;
+}
+
 }  // namespace e2e
