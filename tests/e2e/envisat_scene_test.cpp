@@ -86,6 +86,7 @@ TEST(EnvisatEndToEnd, ImageModeSceneWithLostPacketsFocusedWithinTheImageQualityB
   ASSERT_EQ(pta.exitStatus, 0) << pta.table;
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
   expectTargetsAtTruth(pta);
+  expectCornersOnTheGround(record, sim, dir / "sim/truth.txt");
 }
 
 TEST(EnvisatEndToEnd, FolderWithoutAValidInstrumentFileEndsWithItsCode) {
