@@ -7,7 +7,6 @@
 #include "diag/report.h"
 #include "ingest/envisat/enviextractor.h"
 #include "ingest/ers_extractor.h"
-#include "ingest/product_types.h"
 #include "product/profile.h"
 
 namespace {
@@ -167,12 +166,6 @@ int envisatLevel0Focuser::nameStages() {
     ORV_REPORT("enviextractor object not allocated!", REPORT_ERROR);
     return 1;
   }
-  // The two passes of alternating polarisation are not wired to the chain yet.
-  const EnvisatTypes types(level0Filename);
-  if (types.is_apc() || types.is_aph() || types.is_apv()) {
-    ORV_REPORT("Alternating polarisation focusing is not available: " + level0Filename, REPORT_ERROR);
-    return 1;
-  }
   work.rawFile = outputFilename + "." + "extracted";
   work.chirpFile = outputFilename + "." + "chirp";
   work.antennaFile = outputFilename + "." + "antenna";
@@ -236,7 +229,17 @@ int envisatLevel0Focuser::ingestion() {
   if (int st = extractor_->conf.checkpar(); st != 0) return calledError(st);
   if (int st = extractor_->input.checkpar(); st != 0) return calledError(st);
   if (int st = extractor_->run(); st != 0) return calledError(st);
-  if (int st = readWorkRecords(work, true); st != 0) return st;
+  // Alternating polarisation gives one raster set per channel ("<name>1",
+  // "<name>2"): the records of the first channel describe the scene.
+  const std::string names[3] = {work.rawFile, work.chirpFile, work.antennaFile};
+  if (extractor_->swaths > 1) {
+    work.rawFile = extractor_->numbered(names[0], 0);
+    work.chirpFile = extractor_->numbered(names[1], 0);
+    work.antennaFile = extractor_->numbered(names[2], 0);
+  }
+  const int read = readWorkRecords(work, true);
+  work.rawFile = names[0], work.chirpFile = names[1], work.antennaFile = names[2];
+  if (read != 0) return read;
   ORV_REPORT("Extraction completed", REPORT_CHECKPOINT);
   return 0;
 }
@@ -248,8 +251,10 @@ int envisatLevel0Focuser::preprocessing() {
 
 int envisatLevel0Focuser::postprocessing() {
   ORV_REPORT("No post processing has to be performed.", REPORT_CHECKPOINT);
+  // Alternating polarisation: the record of the first channel's product.
+  const std::string output = extractor_ && extractor_->swaths > 1 ? extractor_->numbered(outputFilename, 0) : outputFilename;
   GeneralSAR product;
-  if (int st = product.GSread(outputFilename + ".hdr"); st != 0) return calledError(st);
+  if (int st = product.GSread(output + ".hdr"); st != 0) return calledError(st);
   product.GSdestroy();
   return 0;
 }

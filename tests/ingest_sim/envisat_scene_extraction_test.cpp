@@ -222,6 +222,8 @@ TEST_F(AsarSceneTest, AlternatingPolarisationBursts) {
   ASSERT_EQ(raw.readhdr(files[0] + ".hdr"), 0);
   EXPECT_EQ(raw.dataSetInfo.Polarization, "H/V");
   EXPECT_EQ(raw.dataSetInfo.Swath, "IS2");
+  EXPECT_EQ(raw.swath.Echoes_per_burst, 40);  // read from the packets, for the de-scalloping
+  EXPECT_EQ(files[1], ex_.output.OutputRawFile + "2");
 }
 
 }  // namespace

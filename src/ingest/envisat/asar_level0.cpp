@@ -811,6 +811,7 @@ int Walk::run(const ExtractionFiles& files, Timeline& table) {
     p.nearRangeTime = lo / p.Sampling_frequency + shift;
     p.farRangeTime = hi / p.Sampling_frequency + shift;
     p.lines = w.lines;
+    if (ap) p.echoesPerBurst = table.burstLength;
     if (noiseLines > 0) p.noisePower = noiseSum / noiseLines;
   }
   ORV_REPORT("Extraction Ended", REPORT_CHECKPOINT);

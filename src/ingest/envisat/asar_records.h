@@ -30,6 +30,7 @@ struct sarpar {
   int SWL_noise_code = 0;
   int order = 0;                    // place in the burst cycle
   int Number_of_bursts = 0;
+  int echoesPerBurst = 0;           // AP: echoes of one polarisation in a burst
   int Noise_packets = 0;
   double meanLatitude = 0.0;        // degrees
   double noisePower = 0.0;

@@ -46,6 +46,11 @@ int writeHeader(const std::string& output, const sarpar* p, const std::string& l
   raw.pulse.PulseKRate = -999.0;
   raw.pulse.PulseSamplingRate = p->Sampling_frequency;
   raw.swath.Rank = p->Swath_rank;
+  if (p->echoesPerBurst > 0) {
+    // Alternating polarisation: a burst of each polarisation in turn.
+    raw.swath.Echoes_per_burst = p->echoesPerBurst;
+    raw.swath.Lines_per_burst = 2 * p->echoesPerBurst;
+  }
   raw.swath.Rgate_bias = p->Range_gate_bias;
 
   ROI_Obj& roi = raw.roi;
@@ -222,9 +227,12 @@ int enviextractor::readpar(const char* file) {
   return 0;
 }
 
-std::string enviextractor::outputName(int n) const {
-  if (asarModeInfo(ext.mode).files == 1) return output.OutputRawFile;
-  return output.OutputRawFile + std::to_string(n);
+std::string enviextractor::outputName(int n) const { return numbered(output.OutputRawFile, n); }
+
+std::string enviextractor::numbered(const std::string& name, int n) const {
+  // The chain reads the channels of a multi-file product as "<name>1", "<name>2", ...
+  if (asarModeInfo(ext.mode).files == 1) return name;
+  return name + std::to_string(n + 1);
 }
 
 int enviextractor::run() {
@@ -242,7 +250,6 @@ int enviextractor::run() {
   for (int n = 0; n < asarModeInfo(ext.mode).files; ++n) files.outputs.push_back(outputName(n));
   if (int st = envi_extract(files, par, &ext, &swaths); st != 0) return EX_CALLED(st);
 
-  const bool multi = swaths > 1;
   for (int n = 0; n < swaths; ++n) {
     const std::string raster = outputName(n);
     int st = 0;
@@ -268,7 +275,7 @@ int enviextractor::run() {
       antenna.Pattern = pattern.gain;
       antenna.StartAngle = pattern.firstAngle;
       antenna.DeltaAngle = pattern.step;
-      antenna.patternFile.filename = output.OutputAntennaPatternFile + (multi ? std::to_string(n) : "");
+      antenna.patternFile.filename = numbered(output.OutputAntennaPatternFile, n);
       if (int st = antenna.WritePatternArray(); st != 0) return EX_CALLED(st);
       if (int st = antenna.writehdr(); st != 0) return EX_CALLED(st);
       ROI_Obj roi;
@@ -283,26 +290,29 @@ int enviextractor::run() {
     }
   }
 
-  // Synthetic chirp of the first swath.
+  // Synthetic chirp of each swath.
   if (given(output.OutputChirpFile)) {
-    std::vector<fcomplex> chirp;
-    if (int st = envi_syntchirp(&par[0], &chirp); st != 0) return EX_CALLED(st);
-    std::ofstream out(output.OutputChirpFile, std::ios::binary | std::ios::trunc);
-    out.write(reinterpret_cast<const char*>(chirp.data()), std::streamsize(chirp.size() * sizeof(fcomplex)));
-    if (!out) return EX_FAIL("File writing failed! " + output.OutputChirpFile, STATUS_WRITE_FAILED);
-    out.close();
-    DataFile raster(output.OutputChirpFile);
-    raster.NrOfPixelsPerLine = static_cast<int>(chirp.size());
-    raster.NrOfLinesPerImage = 1;
-    raster.RowPrefix = 0;
-    raster.CellType = FLOAT_COMPLEX;
-    if (int st = raster.write_hdr(); st != 0) return EX_CALLED(st);
-    SARPulse_Obj pulse;
-    pulse.PulseLength = par[0].pulseLength;
-    pulse.Bandwidth = par[0].chirpBandwidth;
-    pulse.PulseSamplingRate = par[0].Sampling_frequency;
-    pulse.writehdr(output.OutputChirpFile + ".hdr");
-    SyncProfile(output.OutputChirpFile + ".hdr");
+    for (int n = 0; n < swaths; ++n) {
+      const std::string name = numbered(output.OutputChirpFile, n);
+      std::vector<fcomplex> chirp;
+      if (int st = envi_syntchirp(&par[n], &chirp); st != 0) return EX_CALLED(st);
+      std::ofstream out(name, std::ios::binary | std::ios::trunc);
+      out.write(reinterpret_cast<const char*>(chirp.data()), std::streamsize(chirp.size() * sizeof(fcomplex)));
+      if (!out) return EX_FAIL("File writing failed! " + name, STATUS_WRITE_FAILED);
+      out.close();
+      DataFile raster(name);
+      raster.NrOfPixelsPerLine = static_cast<int>(chirp.size());
+      raster.NrOfLinesPerImage = 1;
+      raster.RowPrefix = 0;
+      raster.CellType = FLOAT_COMPLEX;
+      if (int st = raster.write_hdr(); st != 0) return EX_CALLED(st);
+      SARPulse_Obj pulse;
+      pulse.PulseLength = par[n].pulseLength;
+      pulse.Bandwidth = par[n].chirpBandwidth;
+      pulse.PulseSamplingRate = par[n].Sampling_frequency;
+      pulse.writehdr(name + ".hdr");
+      SyncProfile(name + ".hdr");
+    }
     ORV_REPORT("Synthetic Chirp Extracted", REPORT_CHECKPOINT);
   }
   return 0;

@@ -49,8 +49,10 @@ class enviextractor {
   const int* getMissingVector(int n = 0) const { return ready(n) ? ext.missing[n].data() : nullptr; }
   const int* getSequenceVector(int n = 0) const { return ready(n) ? ext.sequence[n].data() : nullptr; }
   int getVectorLength(int n = 0) const { return ready(n) ? static_cast<int>(ext.swst[n].size()) : 0; }
-  // Raw raster of swath n.
+  // Raw raster of swath n (0-based): OutputRawFile, or in multi-file modes
+  // OutputRawFile with n + 1 appended.
   std::string outputName(int n) const;
+  std::string numbered(const std::string& name, int n) const;
 
   enviextractor_conf conf;
   enviextractor_input input;
