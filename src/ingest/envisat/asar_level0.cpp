@@ -491,6 +491,12 @@ class Walk {
     return static_cast<float>(code / p.Sampling_frequency + p.Swath_rank / p.prf - p.Range_gate_bias);
   }
   int writeLine(int s, int code, const float* samples, int missing, int sequence);
+  // Window code of a swath: the one in use, or before its first echo the
+  // most frequent code of the first pass.
+  int codeOf(int s) const {
+    const Swath& w = sw_[std::size_t(s)];
+    return w.haveCode ? w.code : par_[s].SWST_code;
+  }
   void note(int s, int code) {
     sw_[std::size_t(s)].minCode = std::min(sw_[std::size_t(s)].minCode, code);
     sw_[std::size_t(s)].maxCode = std::max(sw_[std::size_t(s)].maxCode, code);
@@ -676,7 +682,7 @@ int Walk::run(const ExtractionFiles& files, Timeline& table) {
     if (row.swath > 665) {
       row.swath = static_cast<std::uint16_t>(row.swath - 666);
       for (int s = 0; s < 2 && status == 0; ++s)
-        status = writeLine(s, sw_[std::size_t(s)].code, sw_[std::size_t(s)].zero.data(), 1, 0);
+        status = writeLine(s, codeOf(s), sw_[std::size_t(s)].zero.data(), 1, 0);
     }
     while (!end_ && (head_.modeCounter < expected || head_.modeCounter >= expected + kMaxCounterJump)) {
       if (!conf_->corrupted) {
@@ -697,7 +703,7 @@ int Walk::run(const ExtractionFiles& files, Timeline& table) {
         note(s, w.code);
         if (type == 0) {
           status = writeLine(s, w.code, w.line.data(), 1, 0);
-          if (ap && status == 0) status = writeLine(1 - s, sw_[std::size_t(1 - s)].code, sw_[std::size_t(1 - s)].zero.data(), 1, 0);
+          if (ap && status == 0) status = writeLine(1 - s, codeOf(1 - s), sw_[std::size_t(1 - s)].zero.data(), 1, 0);
           ++conf_->missingLines;
         }
       }
@@ -739,7 +745,7 @@ int Walk::run(const ExtractionFiles& files, Timeline& table) {
         status = writeLine(s, w.code, w.line.data(), 0, expected);
         if (ap && status == 0) {
           Swath& o = sw_[std::size_t(1 - s)];
-          status = writeLine(1 - s, o.haveCode ? o.code : par_[1 - s].SWST_code, o.zero.data(), 0, expected);
+          status = writeLine(1 - s, codeOf(1 - s), o.zero.data(), 0, expected);
         }
       }
     } else if (kind == 2 && (mode_ == ASAR_WS || mode_ == ASAR_GM)) {
@@ -780,7 +786,7 @@ int Walk::run(const ExtractionFiles& files, Timeline& table) {
         Swath& w = sw_[std::size_t(s)];
         if (!w.haveCode) w.code = par_[s].SWST_code;
         status = writeLine(s, w.code, w.line.data(), 1, 0);
-        if (ap && status == 0) status = writeLine(1 - s, sw_[std::size_t(1 - s)].code, sw_[std::size_t(1 - s)].zero.data(), 1, 0);
+        if (ap && status == 0) status = writeLine(1 - s, codeOf(1 - s), sw_[std::size_t(1 - s)].zero.data(), 1, 0);
       } else if (type == 1) {
         status = calibrationLines(s, head_.seconds85(), folder);
       }
