@@ -168,6 +168,15 @@ TEST_F(AsarSceneTest, CleanImageModeScene) {
   EXPECT_TRUE(fs::exists(ex_.output.OutputAntennaPatternFile));
 }
 
+TEST_F(AsarSceneTest, PartOfTheSceneByPercentages) {
+  ex_.input.PacketsToSkip = 10;
+  ex_.input.PacketsToExtract = 50;
+  ASSERT_EQ(extract(), 0);
+  ASSERT_EQ(ex_.getVectorLength(), 350);
+  EXPECT_EQ(ex_.getSequenceVector()[0], cfg_.firstLineCounter() + 70);
+  EXPECT_NEAR(ex_.par[0].Azimuth_time_reference, sim_->lineTime(70), 1e-6);
+}
+
 TEST_F(AsarSceneTest, DamagedPacketsAreRepairedAndReported) {
   scene_.dropLines = {50, 51, 52};          // lost packets
   cfg_.garbage = {{200, 3000}};             // garbage between two packets
