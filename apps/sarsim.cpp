@@ -1,10 +1,13 @@
 // sarsim: simulates a raw scene from a scene description and writes the
-// mission's files, the orbit archive and the truth of the targets.
+// mission's files, the orbit archive and the truth of the targets. An
+// ENVISAT scene gives an ASAR level-0 product with its auxiliary files and
+// DORIS orbit, as its [ASAR] section says.
 //   sarsim SCENE_FILE OUTPUT_DIR
 #include <cstdio>
 #include <exception>
 #include <string>
 
+#include "sim/envisat_level0_writer.h"
 #include "sim/raw_scene.h"
 
 int main(int argc, char** argv) {
@@ -18,11 +21,22 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "sarsim: %s\n", error.c_str());
     return 10;
   }
+  AsarSimConfig asar;
+  const bool envisat = scene.mission == "ENVISAT";
+  if (envisat) {
+    SimIni ini;
+    if (!ini.load(argv[1], error) || !AsarSimConfig::fromIni(ini, asar, error)) {
+      std::fprintf(stderr, "sarsim: %s: %s\n", argv[1], error.c_str());
+      return 10;
+    }
+    applyAsarInstrument(asar, scene);
+  }
   try {
     const RawSceneSimulator sim(scene);
     std::fprintf(stderr, "sarsim: %s, %d lines x %d samples, window code %d, %zu targets\n", sim.scene().mission.c_str(),
                  sim.scene().lines, sim.scene().samples, sim.swstCode(), sim.truth().size());
-    const int status = sim.writeErsScene(argv[2], error);
+    AsarSceneFiles asarFiles;
+    const int status = envisat ? writeEnvisatScene(sim, asar, argv[2], &asarFiles, error) : sim.writeErsScene(argv[2], error);
     if (status != 0) {
       std::fprintf(stderr, "sarsim: %s\n", error.c_str());
       return status;
@@ -32,8 +46,13 @@ int main(int argc, char** argv) {
       const TargetTruth& t = sim.truth()[i];
       std::printf("%-4zu %14.4f %14.4f %12.6f %12.6f %10.2f\n", i + 1, t.line, t.sample, t.latDeg, t.lonDeg, t.height);
     }
-    std::printf("leader %s\nimage  %s\norbit  %s\ntruth  %s/truth.txt\n", sim.leaderPath(argv[2]).c_str(),
-                sim.imagePath(argv[2]).c_str(), sim.odrPath(argv[2]).c_str(), argv[2]);
+    if (envisat)
+      std::printf("level0 %s\nins    %s\nxca    %s\nxch    %s\norbit  %s\ntruth  %s/truth.txt\n",
+                  asarFiles.level0.c_str(), asarFiles.ins.c_str(), asarFiles.xca.c_str(), asarFiles.xch.c_str(),
+                  asarFiles.orbit.c_str(), argv[2]);
+    else
+      std::printf("leader %s\nimage  %s\norbit  %s\ntruth  %s/truth.txt\n", sim.leaderPath(argv[2]).c_str(),
+                  sim.imagePath(argv[2]).c_str(), sim.odrPath(argv[2]).c_str(), argv[2]);
   } catch (const std::exception& ex) {
     std::fprintf(stderr, "sarsim: %s: %s\n", argv[1], ex.what());
     return 10;

@@ -272,7 +272,8 @@ bool SceneDescription::fromIni(const SimIni& ini, SceneDescription& s, std::stri
 
 RawSceneSimulator::RawSceneSimulator(SceneDescription s) : scene_(std::move(s)) {
   SceneDescription& d = scene_;
-  if (d.mission != "ERS1" && d.mission != "ERS2") throw std::runtime_error("mission must be ERS1 or ERS2, not " + d.mission);
+  if (d.mission != "ERS1" && d.mission != "ERS2" && d.mission != "ENVISAT")
+    throw std::runtime_error("mission must be ERS1, ERS2 or ENVISAT, not " + d.mission);
   if (d.lines <= 0 || d.samples <= 0 || d.samples > 100000)
     throw std::runtime_error("lines and samples must be positive (samples at most 100000)");
   if (!(d.prfHz > 0) || !(d.samplingRateHz > 0) || !(d.pulseLength > 0) || !(d.carrierHz > 0) || !(d.antennaLength > 0))
@@ -287,11 +288,13 @@ RawSceneSimulator::RawSceneSimulator(SceneDescription s) : scene_(std::move(s)) 
   d.startTime = std::round(d.startTime * 1000.0) / 1000.0;
   orbit_ = SimOrbit(d.orbit);
 
-  swstCode_ = static_cast<int>(std::lround((d.nearRangeTime - 0.005357529 + 6.627e-06) / 2.10943e-07));
+  swstCode_ = d.swstStep > 0.0
+                  ? static_cast<int>(std::lround((d.nearRangeTime - d.swstOffset) / d.swstStep))
+                  : static_cast<int>(std::lround((d.nearRangeTime - 0.005357529 + 6.627e-06) / 2.10943e-07));
   if (swstCode_ < 0 || swstCode_ + d.swstChangeCodes < 0 || swstCode_ + d.swstChangeCodes + d.corruptSwstDelta > 65535 ||
       swstCode_ + d.corruptSwstDelta > 65535)
     throw std::runtime_error("near range time gives a window code outside 0..65535");
-  swst_ = ersSwstSeconds(swstCode_);
+  swst_ = swstSeconds(swstCode_);
   if (replicaLength() >= d.samples) throw std::runtime_error("the window is shorter than the pulse");
   if (d.attitudeGiven) d.dopplerCentroidHz = attitudeDoppler(d.yawDeg, d.pitchDeg);
 
@@ -344,6 +347,10 @@ double RawSceneSimulator::rangePeakOffset() const {
 
 int RawSceneSimulator::swstCodeOf(int line) const {
   return (scene_.swstChangeLine >= 0 && line >= scene_.swstChangeLine) ? swstCode_ + scene_.swstChangeCodes : swstCode_;
+}
+
+double RawSceneSimulator::swstSeconds(int code) const {
+  return scene_.swstStep > 0.0 ? code * scene_.swstStep + scene_.swstOffset : ersSwstSeconds(code);
 }
 
 int RawSceneSimulator::priCode() const {
@@ -426,7 +433,7 @@ void RawSceneSimulator::addTargets(int line, fcomplex* row) const {
   const double lambda = wavelength();
   const double fs = d.samplingRateHz, T = d.pulseLength, K = chirpRate();
   const double dt = 1.0 / fs;
-  const double swst = ersSwstSeconds(swstCodeOf(line));
+  const double swst = swstSeconds(swstCodeOf(line));
   StateVector sv{};
   bool haveSv = false;
   for (const TargetTruth& t : truth_) {

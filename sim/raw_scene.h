@@ -83,6 +83,10 @@ struct SceneDescription {
   // moves by swstChangeCodes (4 / fs each).
   int swstChangeLine = -1;
   int swstChangeCodes = 0;
+  // Window start of a code for sensors other than ERS: code x swstStep +
+  // swstOffset seconds (used when swstStep > 0; ENVISAT: 1 / fs and
+  // rank / PRF - range gate bias).
+  double swstStep = 0.0, swstOffset = 0.0;
   std::vector<SimTarget> targets;
   std::vector<SimPixelTarget> pixelTargets;
   double clutterSigma = 0.0;             // counts per I/Q component, before quantisation
@@ -137,6 +141,8 @@ class RawSceneSimulator {
   double swst() const { return swst_; }
   // Window code of a line (with the scene's window change, if any).
   int swstCodeOf(int line) const;
+  // Window start of a code, two-way seconds.
+  double swstSeconds(int code) const;
   int replicaLength() const;
   // Where the range-compressed peak lies after the two-way delay, samples.
   double rangePeakOffset() const;

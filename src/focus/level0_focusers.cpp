@@ -5,6 +5,7 @@
 
 #include "base/status.h"
 #include "diag/report.h"
+#include "ingest/envisat/enviextractor.h"
 #include "ingest/ers_extractor.h"
 #include "product/profile.h"
 
@@ -153,7 +154,7 @@ int ersLevel0Focuser::finalize_modular() { return finalize(); }
 
 // ---- ENVISAT ---------------------------------------------------------------------
 
-envisatLevel0Focuser::envisatLevel0Focuser() = default;
+envisatLevel0Focuser::envisatLevel0Focuser() : extractor_(std::make_unique<enviextractor>()) {}
 envisatLevel0Focuser::~envisatLevel0Focuser() = default;
 
 int envisatLevel0Focuser::nameStages() {
@@ -161,9 +162,32 @@ int envisatLevel0Focuser::nameStages() {
     ORV_REPORT("ASA_INS filename not selected!", REPORT_ERROR);
     return 1;
   }
-  // The ASAR extractor is not part of this build.
-  ORV_REPORT("enviextractor object not allocated!", REPORT_ERROR);
-  return 1;
+  if (!extractor_) {
+    ORV_REPORT("enviextractor object not allocated!", REPORT_ERROR);
+    return 1;
+  }
+  work.rawFile = outputFilename + "." + "extracted";
+  work.chirpFile = outputFilename + "." + "chirp";
+  work.antennaFile = outputFilename + "." + "antenna";
+  work.rgfocFile = outputFilename + ".rgfoc";
+  work.outputFile = outputFilename;
+  enviextractor& x = *extractor_;
+  x.input.ASA_Level0_File = level0Filename;
+  x.input.ASA_INS_File = ASA_INSFilename;
+  x.input.ASA_XCA_File = ASA_XCAFilename;
+  x.input.ASA_XCH_File = ASA_XCHFilename;
+  x.input.Orbit_File = orbitFilename;
+  x.input.PacketsToExtract = extractLines;
+  x.input.PacketsToSkip = skipLines;
+  x.output.OutputRawFile = work.rawFile;
+  x.output.OutputChirpFile = work.chirpFile;
+  x.output.OutputAntennaPatternFile = work.antennaFile;
+  SARFocuser& f = focuser();
+  f.RawDataFile = work.rawFile;
+  f.ChirpFile = work.chirpFile;
+  f.AntennaFile = work.antennaFile;
+  f.OutputFilename = outputFilename;
+  return 0;
 }
 
 int envisatLevel0Focuser::initialize() {
@@ -177,21 +201,47 @@ int envisatLevel0Focuser::initialize() {
 int envisatLevel0Focuser::initialize_modular() {
   if (int st = stripmapGeneralFocuserModular::initialize_modular(); st != 0) return st;
   if (int st = nameStages(); st != 0) return st;
+  extractor_->conf.Verbose = 0;
+  extractor_->conf.Memory = Memory;
   if (int st = setConfFile(configurationFilename, 0); st != 0) return calledError(st);
   ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
   return 0;
 }
 
-int envisatLevel0Focuser::ingestion(const std::string&, const std::string&,
-                                    const std::string&) {
+int envisatLevel0Focuser::ingestion(const std::string& raw, const std::string& chirp,
+                                    const std::string& antenna) {
   if (outputSelected_) return 1;
+  work.rawFile = raw;
+  work.chirpFile = chirp;
+  work.antennaFile = antenna;
+  extractor_->output.OutputRawFile = raw;
+  extractor_->output.OutputChirpFile = chirp;
+  extractor_->output.OutputAntennaPatternFile = antenna;
   return ingestion();
 }
 
 int envisatLevel0Focuser::ingestion() {
   ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
-  ORV_REPORT("ASAR extraction not available in this build", REPORT_ERROR);
-  return 1;
+  if (!extractor_) {
+    ORV_REPORT("enviextractor object not allocated!", REPORT_ERROR);
+    return 1;
+  }
+  if (int st = extractor_->conf.checkpar(); st != 0) return calledError(st);
+  if (int st = extractor_->input.checkpar(); st != 0) return calledError(st);
+  if (int st = extractor_->run(); st != 0) return calledError(st);
+  // Alternating polarisation gives one raster set per channel ("<name>1",
+  // "<name>2"): the records of the first channel describe the scene.
+  const std::string names[3] = {work.rawFile, work.chirpFile, work.antennaFile};
+  if (extractor_->swaths > 1) {
+    work.rawFile = extractor_->numbered(names[0], 0);
+    work.chirpFile = extractor_->numbered(names[1], 0);
+    work.antennaFile = extractor_->numbered(names[2], 0);
+  }
+  const int read = readWorkRecords(work, true);
+  work.rawFile = names[0], work.chirpFile = names[1], work.antennaFile = names[2];
+  if (read != 0) return read;
+  ORV_REPORT("Extraction completed", REPORT_CHECKPOINT);
+  return 0;
 }
 
 int envisatLevel0Focuser::preprocessing() {
@@ -201,8 +251,10 @@ int envisatLevel0Focuser::preprocessing() {
 
 int envisatLevel0Focuser::postprocessing() {
   ORV_REPORT("No post processing has to be performed.", REPORT_CHECKPOINT);
+  // Alternating polarisation: the record of the first channel's product.
+  const std::string output = extractor_ && extractor_->swaths > 1 ? extractor_->numbered(outputFilename, 0) : outputFilename;
   GeneralSAR product;
-  if (int st = product.GSread(outputFilename + ".hdr"); st != 0) return calledError(st);
+  if (int st = product.GSread(output + ".hdr"); st != 0) return calledError(st);
   product.GSdestroy();
   return 0;
 }

@@ -7,6 +7,7 @@
 #include "focus/stripmap_general_focuser.h"
 
 class ATERSExtractor;
+class enviextractor;
 
 class ersLevel0Focuser : public stripmapGeneralFocuserModular {
  public:
@@ -31,8 +32,8 @@ class ersLevel0Focuser : public stripmapGeneralFocuserModular {
   std::unique_ptr<ATERSExtractor> extractor_;
 };
 
-// ASAR level 0; its extractor is not part of this build, so ingestion fails
-// with a report.
+// ASAR level 0 in image mode through enviextractor; the auxiliary files
+// ASA_INS, ASA_XCA and ASA_XCH come with the scene.
 class envisatLevel0Focuser : public stripmapGeneralFocuserModular {
  public:
   envisatLevel0Focuser();
@@ -51,9 +52,11 @@ class envisatLevel0Focuser : public stripmapGeneralFocuserModular {
   std::string ASA_INSFilename;
   std::string ASA_XCAFilename;
   std::string ASA_XCHFilename;
+  enviextractor* extractor() { return extractor_.get(); }
 
  private:
   int nameStages();
+  std::unique_ptr<enviextractor> extractor_;
 };
 
 // RADARSAT-1 level 0; its extractor is not part of this build, so ingestion

@@ -170,16 +170,17 @@ int ATmultiplatformFocuser::fillEnvisat(envisatLevel0Focuser& focuser) {
     const char* message;
     const char* what;  // the file in the user's words
     int input;         // its number in the job (INPUT FILE n, INPUT DIR n)
+    int missingLevel;  // fatal report level when the folder holds no valid file
   };
   const AuxSearch searches[] = {
       {&auxFile1, &auxDirectory1, 5, &Envisat_level0::getOrbitFilename,
-       "Error in defining Envisat Orbit", "DORIS orbit (DOR_VOR)", 1},
+       "Error in defining Envisat Orbit", "DORIS orbit (DOR_VOR)", 1, REPORT_DORVOR_MISSING},
       {&auxFile2, &auxDirectory2, 2, &Envisat_level0::getASAINSFilename,
-       "Error in defining Envisat ASA_INS file", "ASA_INS", 2},
+       "Error in defining Envisat ASA_INS file", "ASA_INS", 2, REPORT_INS_MISSING},
       {&auxFile3, &auxDirectory3, 3, &Envisat_level0::getASAXCAFilename,
-       "Error in defining Envisat ASA_XCA file", "ASA_XCA", 3},
+       "Error in defining Envisat ASA_XCA file", "ASA_XCA", 3, REPORT_XCA_MISSING},
       {&auxFile4, &auxDirectory4, 4, &Envisat_level0::getASAXCHFilename,
-       "Error in defining Envisat ASA_XCH file", "ASA_XCH", 4},
+       "Error in defining Envisat ASA_XCH file", "ASA_XCH", 4, REPORT_XCH_MISSING},
   };
   for (const AuxSearch& s : searches) {
     if (!s.file->empty()) continue;
@@ -188,10 +189,11 @@ int ATmultiplatformFocuser::fillEnvisat(envisatLevel0Focuser& focuser) {
     *s.file = (product.*s.getter)();
     if (s.file->empty()) {
       const std::string n = std::to_string(s.input);
+      // The run ends here with the code of the missing file.
       ORV_REPORT("No ENVISAT " + std::string(s.what) + " valid for the scene found in " +
                      *s.directory + ": give the file as INPUT FILE " + n +
                      " or a folder holding it as INPUT DIR " + n,
-                 REPORT_ERROR);
+                 s.missingLevel);
     }
   }
   focuser.orbitFilename = auxFile1;

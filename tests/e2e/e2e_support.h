@@ -16,6 +16,7 @@
 #include <functional>
 #include <map>
 #include <regex>
+#include <set>
 #include <sstream>
 #include <string>
 #include <thread>
@@ -341,6 +342,72 @@ inline double phaseSpread(const std::vector<double>& phases) {
   double worst = 0.0;
   for (double p : phases) worst = std::max(worst, std::fabs(std::remainder(p - mean, 2.0 * M_PI)));
   return worst;
+}
+
+// Every found target within 0.1 pixel of its zero-Doppler truth on both
+// axes, and the peak phases (less -4 pi R0 / lambda) within 5 degrees of
+// one another.
+inline void expectTargetsAtTruth(const PtaReport& pta) {
+  std::vector<double> phases;
+  for (const PtaTarget& t : pta.targets) {
+    EXPECT_LT(std::fabs(t.errorLine), 0.1) << pta.table;
+    EXPECT_LT(std::fabs(t.errorSample), 0.1) << pta.table;
+    if (t.found) phases.push_back(t.phaseError);
+  }
+  EXPECT_LT(phaseSpread(phases) * 180.0 / M_PI, 5.0) << pta.table;
+}
+
+// Value of a key of the truth file's [Scene] section.
+inline double truthValue(const std::string& truthFile, const std::string& key) {
+  SimIni ini;
+  std::string error;
+  if (!ini.load(truthFile, error)) return std::nan("");
+  return ini.getDouble("Scene", key, std::nan(""));
+}
+
+// Distance between two points on the ellipsoid, metres.
+inline double groundDistance(double lat1, double lon1, double lat2, double lon2) {
+  return norm(geodeticToEcef(lat1, lon1, 0.0) - geodeticToEcef(lat2, lon2, 0.0));
+}
+
+// Corners and centre of a focused product's record: each within 30 m of
+// the ground point that its pixel shows (zero Doppler, on the ellipsoid).
+inline void expectCornersOnTheGround(const GeneralSAR& record, const RawSceneSimulator& sim,
+                                     const std::string& truthFile) {
+  const ROI_Obj& roi = record.roi.roi;
+  const double offset = truthValue(truthFile, "range_peak_offset_samples");
+  const double c = 299792458.0;
+  const double t0 = roi.SlowStartTime, t1 = t0 + roi.SlowTimeDelta * roi.Lines;
+  const double r0 = roi.FastStartTime - offset * roi.FastTimeDelta;
+  const double r1 = r0 + roi.FastTimeDelta * roi.Samples;
+  const int lookSign = sim.scene().lookSign;
+  struct Corner {
+    double lat, lon;
+  };
+  std::vector<Corner> truth;
+  for (double t : {t0, t1})
+    for (double r : {r0, r1}) {
+      Corner k{};
+      ASSERT_TRUE(zeroDopplerPoint(sim.orbit(), t, r * c / 2.0, 0.0, lookSign, k.lat, k.lon));
+      truth.push_back(k);
+    }
+  const geoCoords_Obj& corners = record.geoCoords;
+  std::set<int> matched;
+  for (const geopoint* g : {&corners.NW, &corners.NE, &corners.SW, &corners.SE}) {
+    int best = -1;
+    double bestDistance = 1e30;
+    for (int k = 0; k < 4; ++k) {
+      const double d = groundDistance(g->lat, g->lon, truth[k].lat, truth[k].lon);
+      if (d < bestDistance) bestDistance = d, best = k;
+    }
+    EXPECT_LT(bestDistance, 30.0) << g->lat << " " << g->lon;
+    matched.insert(best);
+  }
+  EXPECT_EQ(matched.size(), 4u);
+  Corner centre{};
+  ASSERT_TRUE(zeroDopplerPoint(sim.orbit(), 0.5 * (t0 + t1), 0.5 * (r0 + r1) * c / 2.0, 0.0, lookSign,
+                               centre.lat, centre.lon));
+  EXPECT_LT(groundDistance(corners.center.lat, corners.center.lon, centre.lat, centre.lon), 30.0);
 }
 
 }  // namespace e2e

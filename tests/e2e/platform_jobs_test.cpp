@@ -67,7 +67,7 @@ TEST(PlatformJobs, RadarsatWithoutOrbitIsRefusedAndEnvisatTellsWhichFileIsMissin
   writeText(dir / "ASA_IM__0P.N1", "PRODUCT=\"ASA_IM__0PNPDE20040101" + std::string(100, ' '));
   writeJob(dir / "job.txt", jobOf("ENVISAT", dir / "ASA_IM__0P.N1", dir / "out"));
   run = runFocuser(dir.str(), dir / "job.txt");
-  EXPECT_EQ(run.errorCode, 130560) << run.errorFile;
+  EXPECT_EQ(run.errorCode, EC_DORVOR_MISSING) << run.errorFile;
   // The folders are "NotOK" as the job gives them: nothing is found there.
   EXPECT_TRUE(contains(run.log,
                        "No ENVISAT DORIS orbit (DOR_VOR) valid for the scene found in NotOK: give "

@@ -428,6 +428,6 @@ TEST(SceneDescriptionFile, ParsesSectionsTargetsAndDamage) {
   EXPECT_NE(err.find("lines"), std::string::npos);
   EXPECT_FALSE(ini.loadText("[Scene\n", err));
   s = SceneDescription{};
-  s.mission = "ENVISAT";
+  s.mission = "RADARSAT";
   EXPECT_THROW(RawSceneSimulator{s}, std::runtime_error);
 }
