@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include "support/files.h"
+
 #include <cmath>
 #include <cstdio>
 #include <filesystem>
@@ -76,13 +78,7 @@ void expectCorrected(const fcomplex* got, const fcomplex* clean, std::size_t n) 
 
 class OrtogTest : public ::testing::Test {
  protected:
-  void SetUp() override {
-    dir_ = std::filesystem::path(testing::TempDir()) /
-           ("ortog_" + std::string(::testing::UnitTest::GetInstance()->current_test_info()->name()));
-    std::filesystem::create_directories(dir_);
-  }
-  void TearDown() override { std::filesystem::remove_all(dir_); }
-  std::filesystem::path dir_;
+  support::TempFolder dir_{"ortog"};
 };
 
 TEST_F(OrtogTest, EstimateAndApplyRemoveOffsetGainAndSkew) {
@@ -94,7 +90,7 @@ TEST_F(OrtogTest, EstimateAndApplyRemoveOffsetGainAndSkew) {
   r.slowTimeDelta = 1.0 / 1680.0;
   const auto ch = makeChannels(static_cast<std::size_t>(r.lines) * r.samples, 3.5, -2.0, 1.25,
                                6.0 * kDeg, 1);
-  const std::string path = (dir_ / "raw").string();
+  const std::string path = (dir_ / "raw");
   {
     std::FILE* f = std::fopen(path.c_str(), "wb");
     ASSERT_NE(f, nullptr);
@@ -132,7 +128,7 @@ TEST_F(OrtogTest, EstimateAndApplyRemoveOffsetGainAndSkew) {
       EXPECT_NEAR(fromRecord.iMean[i], o.iMean[i], 1e-9 * (1 + std::abs(o.iMean[i])));
       EXPECT_NEAR(fromRecord.phase[i], o.phase[i], 1e-9 * (1 + std::abs(o.phase[i])));
     }
-    EXPECT_EQ(Ortog((dir_ / "none").string(), 1, 50).estimate(), 9);
+    EXPECT_EQ(Ortog((dir_ / "none"), 1, 50).estimate(), 9);
   }
 
   std::vector<fcomplex> line(ch.distorted.begin() + 100 * r.samples,
@@ -159,7 +155,7 @@ TEST_F(OrtogTest, EstimateAndApplyRemoveOffsetGainAndSkew) {
 }
 
 TEST_F(OrtogTest, EstimateFailuresAndDeadQChannel) {
-  Ortog o((dir_ / "missing").string(), 1, 50);
+  Ortog o((dir_ / "missing"), 1, 50);
   OrtogRaster r;
   r.lines = 0;
   r.samples = 10;
@@ -167,13 +163,13 @@ TEST_F(OrtogTest, EstimateFailuresAndDeadQChannel) {
   r.lines = 10;
   EXPECT_EQ(o.estimate(r), 9);
   // More lines per block than the pitch: nothing to do.
-  Ortog skip((dir_ / "missing").string(), 60, 50);
+  Ortog skip((dir_ / "missing"), 60, 50);
   EXPECT_EQ(skip.estimate(r), 0);
 
   // Dead Q channel: zero skew, Q stays zero.
   r.lines = 100;
   r.samples = 64;
-  const std::string path = (dir_ / "deadq").string();
+  const std::string path = (dir_ / "deadq");
   std::vector<fcomplex> data(r.lines * r.samples);
   for (std::size_t k = 0; k < data.size(); ++k) data[k] = fcomplex(std::sin(0.7f * k) + 2.0f, 0);
   std::FILE* f = std::fopen(path.c_str(), "wb");

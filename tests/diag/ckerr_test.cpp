@@ -6,7 +6,12 @@
 
 #include "diag/ckerr.h"
 #include "diag/report.h"
-#include "diag_fixture.h"
+#include "diag/ckerr.h"
+#include "diag/report.h"
+#include "support/files.h"
+
+using namespace support;
+using DiagEnvironment = WorkingFolderTest;
 
 using CheckedCalls = DiagEnvironment;
 
@@ -85,24 +90,6 @@ TEST_F(CheckedCalls, FreeallAfterSwapWithLastFindsAllEntriesOfTheCall) {
   EXPECT_EQ(ckerr_live_allocations(), 0);
 }
 
-TEST_F(CheckedCalls, MatrixAllocationAndRelease) {
-  set_ckerr_fun("matrix()");
-  void** m = matalloc_ckerr(5, 24);
-  ASSERT_NE(m, nullptr);
-  EXPECT_EQ(ckerr_live_allocations(), 6);
-  for (int r = 0; r < 5; ++r) {
-    ASSERT_NE(m[r], nullptr);
-    EXPECT_EQ(static_cast<char*>(m[r])[23], 0);
-  }
-  matfree_ckerr(m, 5);
-  EXPECT_EQ(ckerr_live_allocations(), 0);
-  void** bare = matalloc_ckerr(0, 24);
-  EXPECT_NE(bare, nullptr);
-  EXPECT_EQ(ckerr_live_allocations(), 1);
-  freeall_ckerr();
-  deccurdep();
-}
-
 TEST_F(CheckedCalls, FullTableAndDeepStackAreReportedNotCorrupted) {
   std::vector<void*> blocks;
   for (int i = 0; i < 1024; ++i) blocks.push_back(malloc_ckerr(1));
@@ -148,22 +135,4 @@ TEST_F(CheckedCalls, ExitReportsLeaksWithTheirCallCoordinates) {
   ::testing::internal::CaptureStderr();
   exit_ckerr();
   EXPECT_EQ(::testing::internal::GetCapturedStderr(), "");
-}
-
-TEST_F(CheckedCalls, WriteDebugDumpsHeadAndCells) {
-  const float cells[6] = {1, 2, 3, 4, 5, 6};
-  const std::string file = path("dump.bin");
-  EXPECT_EQ(write_debug(file.c_str(), cells, 1, 3, 2), 0);
-  const std::string bytes = readText(file);
-  ASSERT_EQ(bytes.size(), 12u + 24u);
-  std::int32_t head[3];
-  std::memcpy(head, bytes.data(), 12);
-  EXPECT_EQ(head[0], 1);
-  EXPECT_EQ(head[1], 3);
-  EXPECT_EQ(head[2], 2);
-  EXPECT_EQ(std::memcmp(bytes.data() + 12, cells, 24), 0);
-  EXPECT_EQ(write_debug(file.c_str(), cells, 0, 1, 3), 0);  // complex cells: 8 bytes
-  EXPECT_EQ(readText(file).size(), 12u + 24u);
-  EXPECT_EQ(write_debug(file.c_str(), cells, 12, 1, 1), 10);
-  EXPECT_EQ(write_debug((working_ + "no/such/dir/x").c_str(), cells, 1, 1, 1), 9);
 }

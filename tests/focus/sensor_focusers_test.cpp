@@ -58,44 +58,6 @@ TEST_F(SensorFocusers, ErsInitializeNamesTheExtractorAndTheChain) {
   EXPECT_FALSE(traced("Memory set to default value"));  // only ENVISAT says so
 }
 
-TEST_F(SensorFocusers, ErsRunStopsAtAFailingExtractor) {
-  ersLevel0Focuser f;
-  fill(f);
-  f.LEAFilename = path("scene.lea");  // not a CEOS leader
-  testing::internal::CaptureStdout();
-  const int status = f.run();
-  const std::string printed = testing::internal::GetCapturedStdout();
-  EXPECT_NE(status, 0);
-  EXPECT_TRUE(traced("Starting ingestion"));
-  EXPECT_FALSE(traced("ERS image extracted"));
-  EXPECT_FALSE(traced("ERS focuser doesn't do anything in the preprocessor module"));
-  EXPECT_FALSE(traced("Range Focusing"));
-  EXPECT_EQ(printed.find("- finalize"), std::string::npos);
-  EXPECT_FALSE(std::filesystem::exists(path("out.rgfoc")));
-  EXPECT_FALSE(std::filesystem::exists(path("out")));
-
-  // An empty LEA name fails before anything is extracted.
-  ersLevel0Focuser g;
-  fill(g);
-  EXPECT_EQ(g.run(), 1);
-  EXPECT_FALSE(std::filesystem::exists(path("out.extracted")));
-
-  // The named ingestion refuses when an output was selected.
-  EXPECT_EQ(g.initialize(), 1);
-  EXPECT_EQ(g.ingestion("r", "c", "a"), 1);
-}
-
-TEST_F(SensorFocusers, ErsStagesReportAndFinalizePrints) {
-  ersLevel0Focuser f;
-  EXPECT_EQ(f.preprocessing(), 0);
-  EXPECT_EQ(f.postprocessing(), 0);
-  EXPECT_TRUE(traced("ERS focuser doesn't do anything in the preprocessor module"));
-  EXPECT_TRUE(traced("ERS focuser doesn't do anything in the postprocessor module"));
-  testing::internal::CaptureStdout();
-  EXPECT_EQ(f.finalize(), 0);
-  EXPECT_EQ(testing::internal::GetCapturedStdout(), "- finalize \n");
-}
-
 TEST_F(SensorFocusers, EnvisatAndRadarsatFailCleanlyWithoutExtractor) {
   envisatLevel0Focuser e;
   fill(e);
