@@ -263,93 +263,11 @@ void patchWalk(const std::string& dir, bool update, int64_t window, uint32_t see
 
 }  // namespace
 
-TEST(RasterBufferFile, WriteWindowPatchesEqualPlainStdio) {
+TEST(RasterBufferFile, WriteAndUpdatePatchesEqualPlainStdio) {
   const std::string dir = tempDir();
-  for (int64_t window : {64, 1000, 4097}) {
-    SCOPED_TRACE("window " + std::to_string(window));
-    patchWalk(dir, false, window, 1u + uint32_t(window));
-  }
-}
-
-TEST(RasterBufferFile, UpdateWindowPatchesEqualPlainStdio) {
-  const std::string dir = tempDir();
-  for (int64_t window : {64, 1000, 4097}) {
-    SCOPED_TRACE("window " + std::to_string(window));
-    patchWalk(dir, true, window, 99u + uint32_t(window));
-  }
-}
-
-TEST(RasterBufferFile, RowsWithPrefixPatchesLikeAnExtractor) {
-  // Rows written whole, then each row's prefix patched afterwards: the
-  // pattern of the extractors' raw output.
-  const std::string dir = tempDir();
-  const Layout l{INT8_COMPLEX, false, 300, 50, 4, 0};
-  const std::vector<unsigned char> ref = referenceRaster(l);
-  BufferFile f(dir + "/raw");
-  f.setType(BufferFile::INT8_COMPLEX);
-  f.setSamples(l.pixels);
-  f.setLines(l.lines);
-  f.setRowPrefix(l.prefix);
-  ASSERT_TRUE(f.open(BufferFile::WRITE));
-  f.initbuffer(4096, 0);
-  const int64_t rowlen = f.rowlength();
-  for (int r = 0; r < l.lines; ++r) {
-    f.seek(rowlen * r + l.prefix, BufferFile::FROM_START);
-    f.write(ref.data() + rowlen * r + l.prefix, rowlen - l.prefix);
-    if (r >= 3) {  // patch the prefix of a row three rows back
-      f.seek(rowlen * (r - 3), BufferFile::FROM_START);
-      f.write(ref.data() + rowlen * (r - 3), l.prefix);
+  for (bool update : {false, true})
+    for (int64_t window : {64, 1000, 4097}) {
+      SCOPED_TRACE((update ? "update, window " : "write, window ") + std::to_string(window));
+      patchWalk(dir, update, window, (update ? 99u : 1u) + uint32_t(window));
     }
-  }
-  for (int r = l.lines - 3; r < l.lines; ++r) {
-    f.seek(rowlen * r, BufferFile::FROM_START);
-    f.write(ref.data() + rowlen * r, l.prefix);
-  }
-  f.close();
-  EXPECT_EQ(slurp(dir + "/raw"), ref);
-}
-
-TEST(RasterBufferFile, StateCopyAndClone) {
-  const std::string dir = tempDir();
-  BufferFile f;
-  EXPECT_EQ(f.getType(), BufferFile::UNDEFINED);
-  EXPECT_EQ(f.pixelsizeof(), 0);
-  EXPECT_FALSE(f.open(BufferFile::READ));  // no name
-  f.setFilename(dir + "/nothing");
-  EXPECT_FALSE(f.exists());
-  EXPECT_FALSE(f.open(BufferFile::READ));
-  EXPECT_FALSE(f.open(BufferFile::OperationType(7)));
-  EXPECT_EQ(f.getOpType(), BufferFile::NOT_OPEN);
-  float v = 1.0f;
-  EXPECT_EQ(f.read(&v, 4), 0);  // nothing open: nothing happens
-  EXPECT_EQ(f.write(&v, 4), 0);
-  EXPECT_EQ(f.readbuffer(&v, 0, 1, 0, 1), 0);
-  EXPECT_EQ(v, 1.0f);
-
-  const Layout l{FLOAT_COMPLEX, false, 5, 6, 4, 13};
-  std::vector<unsigned char> ref = referenceRaster(l);
-  ref.resize(ref.size() + 9, 0xEE);
-  spit(dir + "/src", ref);
-  BufferFile s;
-  describe(s, dir + "/src", l);
-  EXPECT_TRUE(s.exists());
-  EXPECT_TRUE(s.is_complex());
-  EXPECT_EQ(s.pixelsizeof(), 8);
-  ASSERT_TRUE(s.open(BufferFile::READ));
-  EXPECT_FALSE(s.is_writing());
-  BufferFile c;
-  ASSERT_TRUE(s.open(BufferFile::READ));
-  s.clone(&c);
-  EXPECT_EQ(c.getFilename(), s.getFilename());
-  EXPECT_EQ(c.getLines(), 5);
-  EXPECT_EQ(c.getSamples(), 6);
-  EXPECT_EQ(c.getRowPrefix(), 4);
-  EXPECT_EQ(c.getOffsetSize(), 13);
-  EXPECT_EQ(c.getType(), BufferFile::FLOAT_COMPLEX);
-  EXPECT_FALSE(c.is_open());
-  for (int chunk : {5, 100, 1 << 20}) {
-    const std::string out = dir + "/copy" + std::to_string(chunk);
-    EXPECT_EQ(s.copy(out, chunk), int64_t(ref.size()) - 9);
-    EXPECT_EQ(slurp(out), std::vector<unsigned char>(ref.begin(), ref.end() - 9));
-  }
 }

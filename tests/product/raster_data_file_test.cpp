@@ -226,38 +226,6 @@ TEST(RasterDataFile, ReadConversionTableIsPinned) {
   }
 }
 
-TEST(RasterDataFile, WriteConversionTableMirrorsTheReadTable) {
-  const std::string dir = tempDir();
-  for (int mt = 0; mt < 8; ++mt) {
-    const Layout src{mt, false, 1, 5, 0, 0};
-    const std::vector<unsigned char> mem = referenceRaster(src);
-    for (int ft = 0; ft < 8; ++ft) {
-      SCOPED_TRACE("memory " + std::to_string(mt) + " file " + std::to_string(ft));
-      DataFile f;
-      f.filename = dir + "/m" + std::to_string(mt) + "f" + std::to_string(ft);
-      f.CellType = ft;
-      f.NrOfPixelsPerLine = 5;
-      f.NrOfLinesPerImage = 1;
-      BufferIO io{&f, 0, 5, 0, 1, mt};
-      ASSERT_EQ(io.writebuffer(mem.data()), STATUS_OK);
-      ASSERT_EQ(f.close(), STATUS_OK);
-      const std::vector<unsigned char> bytes = slurp(f.filename);
-      const TypeInfo fi = typeInfo(ft);
-      ASSERT_EQ(bytes.size(), size_t(5 * fi.bytes * fi.parts));
-      const bool served = kReadPairs[ft][mt] == 1;
-      const bool mc = typeInfo(mt).parts == 2;
-      for (int c = 0; c < 5; ++c) {
-        // Complex to real keeps the real part; real to complex has im 0; an
-        // unserved pair leaves the row as allocated (zeros).
-        EXPECT_EQ(component(bytes.data(), ft, size_t(c), 0), served ? pixelValue(0, c, 0) : 0.0);
-        if (fi.parts == 2) {
-          EXPECT_EQ(component(bytes.data(), ft, size_t(c), 1), served && mc ? pixelValue(0, c, 1) : 0.0);
-        }
-      }
-    }
-  }
-}
-
 TEST(RasterDataFile, WriteConversionsRoundHalfAwayFromZero) {
   const std::string dir = tempDir();
   const std::vector<float> values = {2.5f, -2.5f, 1.49f, -0.5f, 0.5f, -1.5f, 3.0f, 70000.0f};
@@ -467,56 +435,4 @@ TEST(RasterDataFile, BufferedWritingKeepsItsSeekRule) {
   ASSERT_EQ(io.writebuffer(ref.data()), STATUS_OK);
   ASSERT_EQ(g.close(), STATUS_OK);
   EXPECT_EQ(slurp(dir + "/rows"), ref);
-}
-
-TEST(RasterDataFile, BufferedUpdateWritesInPlace) {
-  const std::string dir = tempDir();
-  spit(dir + "/u", std::vector<unsigned char>(40, '.'));
-  DataFile f(dir + "/u");
-  f.buffersize = 16;
-  ASSERT_EQ(f.open(3), STATUS_OK);
-  char buf[8];
-  ASSERT_EQ(f.read(buf, 5), STATUS_OK);
-  ASSERT_EQ(f.write("XY", 2), STATUS_OK);  // at 5, the buffer is dropped
-  EXPECT_EQ(f.tell(), 7);
-  ASSERT_EQ(f.seek(20, 0), STATUS_OK);
-  ASSERT_EQ(f.write("Z", 1), STATUS_OK);
-  ASSERT_EQ(f.seek(4, 0), STATUS_OK);
-  ASSERT_EQ(f.read(buf, 4), STATUS_OK);  // reads what was written
-  EXPECT_EQ(std::string(buf, 4), ".XY.");
-  ASSERT_EQ(f.close(), STATUS_OK);
-  const std::vector<unsigned char> bytes = slurp(dir + "/u");
-  std::string want(40, '.');
-  want.replace(5, 2, "XY");
-  want[20] = 'Z';
-  EXPECT_EQ(std::string(bytes.begin(), bytes.end()), want);
-}
-
-TEST(RasterDataFile, CopyAndClone) {
-  const std::string dir = tempDir();
-  const Layout l{SHORT_COMPLEX, true, 7, 5, 3, 11};
-  std::vector<unsigned char> ref = referenceRaster(l);
-  ref.resize(ref.size() + 50, 0x77);  // bytes past the raster are not copied
-  spit(dir + "/src", ref);
-  DataFile f;
-  describe(f, dir + "/src", l);
-  DataFile g;
-  ASSERT_EQ(f.open(0), STATUS_OK);
-  g.filename = "other";
-  ASSERT_EQ(f.clone(&g), STATUS_OK);
-  EXPECT_EQ(g.filename, f.filename);
-  EXPECT_EQ(g.NrOfLinesPerImage, 7);
-  EXPECT_EQ(g.NrOfPixelsPerLine, 5);
-  EXPECT_EQ(g.RowPrefix, 3);
-  EXPECT_EQ(g.HeaderOffset, 11);
-  EXPECT_EQ(g.CellType, SHORT_COMPLEX);
-  EXPECT_EQ(g.ByteOrder, 1);
-  EXPECT_FALSE(g.is_open());
-  for (int chunk : {1, 7, 64, 10000}) {
-    const std::string out = dir + "/copy" + std::to_string(chunk);
-    f.copy(out, chunk);  // the side file needs the parameter documents
-    std::vector<unsigned char> want(ref.begin(), ref.end() - 50);
-    EXPECT_EQ(slurp(out), want) << chunk;
-  }
-  EXPECT_EQ(f.copy(dir + "/bad", 0), STATUS_BAD_CONDITION);
 }
