@@ -2,6 +2,8 @@
 // written here in the products' own layouts.
 #include <gtest/gtest.h>
 
+#include "support/files.h"
+
 #include <cmath>
 #include <cstdio>
 #include <cstring>
@@ -23,11 +25,7 @@ const std::string kDorVor =
 
 bool realDataPresent() { return fs::exists(kDorVor); }
 
-std::string tempDir(const std::string& name) {
-  fs::path p = fs::path(testing::TempDir()) / ("orbit_files_" + name);
-  fs::create_directories(p);
-  return p.string();
-}
+std::string tempDir(const std::string& name) { return support::scratchDir("orbit_files_" + name); }
 
 double norm3(const double* v) { return std::sqrt(v[0] * v[0] + v[1] * v[1] + v[2] * v[2]); }
 
@@ -104,23 +102,6 @@ std::string dorisFile(const std::string& product, double tFirst, int count) {
 }
 
 }  // namespace
-
-TEST(OrbitTableSize, ShortAndLongScenes) {
-  double t0;
-  int n;
-  orbitTableSize(1000.0, 14.999, 5.0, &t0, &n);
-  EXPECT_EQ(n, 5);
-  EXPECT_DOUBLE_EQ(t0, 1000.0 + 14.999 / 2 - 10.0);
-  orbitTableSize(1000.0, 15.0, 5.0, &t0, &n);
-  // x = (1.4 * 15 / 5 + 1) / 2 = 2.6 -> 3, 7 vectors from t - 3.
-  EXPECT_EQ(n, 7);
-  EXPECT_DOUBLE_EQ(t0, 997.0);
-  orbitTableSize(0.0, 16.07, 5.0, &t0, &n);  // x = 2.7496 -> 3
-  EXPECT_EQ(n, 7);
-  orbitTableSize(0.0, 100.0, 5.0, &t0, &n);  // x = 14.5 -> 15 (half away from zero)
-  EXPECT_EQ(n, 31);
-  EXPECT_DOUBLE_EQ(t0, -20.0);
-}
 
 TEST(InterpOrbLagrange, ExactOnNodesAndPolynomialsOfDegreeEight) {
   double times[9], pts[27];
@@ -296,15 +277,6 @@ std::vector<unsigned char> odrFile(const char* id, const char* sat, int first, i
 }
 
 }  // namespace
-
-TEST(DeosReader, ConversionOfARecord) {
-  double x[3];
-  deos_to_cartesian(0.0, 0.0, 0.0, x);
-  EXPECT_NEAR(x[0], 6378137.0, 1e-3);
-  deos_to_cartesian(90.0, 0.0, 1000.0, x);
-  EXPECT_NEAR(x[2], 6356752.314147896 + 1000.0, 1e-3);
-  EXPECT_NEAR(x[0], 0.0, 1e-6);
-}
 
 TEST(DeosReader, RealArcs) {
   if (!realDataPresent()) GTEST_SKIP() << "real data folder absent";
