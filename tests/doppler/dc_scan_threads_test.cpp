@@ -13,9 +13,11 @@
 #include <vector>
 
 #include "doppler/dc_driver.h"
-#include "doppler/dc_scene.h"
+#include "support/files.h"
+#include "support/scenes.h"
 
-using namespace dc_scene;
+using namespace support::clutter;
+using support::scratchDir;
 
 namespace {
 
@@ -47,7 +49,7 @@ TEST(DcBinScan, ThreadsGiveTheSameBinsAndContrastAsOneThread) {
   const Radar rd;
   // 7 bins across (the last 40 samples belong to no bin), 5 bin rows.
   const int ns = 7 * 64 + 40, nl = 5 * 256 + 17;
-  const std::string dir = tempDir("scan_threads");
+  const std::string dir = scratchDir("scan_threads");
   const std::string path = dir + "/scene.rgfoc";
   ASSERT_TRUE(writeRaster(path, makeVaryingClutter(rd, {0.3, 0.1 / ns, 0.05 / nl}, ns, nl, 10.0, 5)));
   const DcEstState one = scan(rd, path, dir, ns, nl, 1);
@@ -87,7 +89,7 @@ TEST(DcBinScan, ThreadsGiveTheSameBinsAndContrastAsOneThread) {
 TEST(DcBinScan, OnePassScanEqualsTheBlockEstimateAndTheCellMeans) {
   const Radar rd;
   const int ns = 5 * 64 + 8, nl = 3 * 256;
-  const std::string dir = tempDir("scan_reference");
+  const std::string dir = scratchDir("scan_reference");
   const std::string path = dir + "/scene.rgfoc";
   const std::vector<fcomplex> data = makeVaryingClutter(rd, {0.7, -0.1 / ns, 0.0}, ns, nl, 3.0, 9);
   ASSERT_TRUE(writeRaster(path, data));

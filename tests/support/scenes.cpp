@@ -146,7 +146,11 @@ std::vector<fcomplex> makeClutter(const ClutterScene& sc, int samples, int lines
   FFTBuffer data(static_cast<size_t>(samples) * lines);
   for (auto& v : data) v = fcomplex(n01(rng), n01(rng)) * static_cast<float>(std::sqrt(0.5));
   std::uniform_int_distribution<size_t> where(0, data.size() - 1);
-  for (int i = 0; i < sc.points; ++i) data[where(rng)] += static_cast<float>(sc.pointAmp);
+  std::uniform_real_distribution<double> phase(0.0, 2.0 * std::numbers::pi);
+  for (int i = 0; i < sc.points; ++i) {
+    const size_t at = where(rng);
+    data[at] += fcomplex(std::polar(sc.pointAmp, phase(rng)));
+  }
   fft_c(samples, samples, lines, lines, FFT_FORWARD, FFT_FORWARD, data.data(), data.data());
   const double fdc = sc.dcPrf * sc.prf;
   const double k2 = std::pow(c / (2.0 * sc.velocity), 2);
@@ -188,6 +192,18 @@ std::vector<fcomplex> makeClutter(const ClutterScene& sc, int samples, int lines
   return out;
 }
 
+std::vector<fcomplex> makeClutter(const Radar& rd, double dcPrf, int samples, int lines, double snrDb,
+                                  unsigned seed, int points, double pointAmp) {
+  ClutterScene sc;
+  static_cast<Radar&>(sc) = rd;
+  sc.dcPrf = dcPrf;
+  sc.snrDb = snrDb;
+  sc.seed = seed;
+  sc.points = points;
+  sc.pointAmp = pointAmp;
+  return makeClutter(sc, samples, lines);
+}
+
 bool writeRaster(const std::string& path, const std::vector<fcomplex>& data,
                         int byteOrder) {
   std::ofstream f(path, std::ios::binary);
@@ -207,10 +223,10 @@ bool writeRaster(const std::string& path, const std::vector<fcomplex>& data,
 }
 
 // Estimation state with ERS-like settings, scaled to small test rasters.
-DcEstState ersState(const Radar& rd) {
+DcEstState ersState(const Radar& rd, int blocks, int blockl) {
   DcEstState st;
-  st.blocks = 64;
-  st.blockl = 256;
+  st.blocks = blocks;
+  st.blockl = blockl;
   st.memory = int64_t(64) << 20;
   st.nBest = 10;
   st.nWdar = 5;

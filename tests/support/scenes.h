@@ -304,6 +304,7 @@ struct Radar {
 
 // Clutter whose Doppler spectrum is centred on an absolute centroid.
 struct ClutterScene : Radar {
+  ClutterScene() { bandFraction = 0.8; }
   double dcPrf = 1.3;      // absolute Doppler centroid, PRF units
   double snrDb = 30.0;     // clutter to noise power
   int points = 0;          // bright point scatterers added to the clutter
@@ -325,6 +326,9 @@ struct Centroid {
 // migration), unit clutter power, plus receiver noise: `lines` rows of
 // `samples` samples. For the ambiguity estimators.
 std::vector<fcomplex> makeClutter(const ClutterScene& sc, int samples, int lines);
+// The same for the radar `rd`, with `points` scatterers of amplitude `pointAmp`.
+std::vector<fcomplex> makeClutter(const Radar& rd, double dcPrf, int samples, int lines, double snrDb,
+                                  unsigned seed, int points = 0, double pointAmp = 0.0);
 
 // Azimuth lines of a moving-average process whose autocorrelation is that of
 // the two-way antenna pattern, modulated to a centroid varying linearly in
@@ -336,8 +340,9 @@ std::vector<fcomplex> makeVaryingClutter(const Radar& rd, const Centroid& dc, in
 // Writes a FLOAT_COMPLEX raster, little-endian (byteOrder 0) or big-endian (1).
 bool writeRaster(const std::string& path, const std::vector<fcomplex>& data, int byteOrder = 0);
 
-// Estimation state with ERS-like settings, scaled to small test rasters.
-DcEstState ersState(const Radar& rd);
+// Estimation state with ERS-like settings, scaled to small test rasters
+// (blocks of `blocks` samples x `blockl` lines).
+DcEstState ersState(const Radar& rd, int blocks = 64, int blockl = 256);
 // Input record of a raster written by the test.
 DcEstInput inputFor(const Radar& rd, const std::string& path, const std::string& dir, int samples, int lines);
 // Centroid of a Hz polynomial (range time from the first sample, azimuth
