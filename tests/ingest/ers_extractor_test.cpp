@@ -113,16 +113,6 @@ float swstOf(int code) { return static_cast<float>(code * 2.10943e-07 + 0.005357
 
 }  // namespace
 
-TEST(ERSExtractorTest, ElementTable) {
-  ATERSExtractor a;
-  ASSERT_EQ(a.getNumberOfElements(), 10);
-  const char* names[] = {"Memory", "ReportFilename", "ReportLevel", "Incore", "Verbose",
-                         "ImgFilename", "LeaFilename", "OrbitFilename", "OutputFile", "ChirpFile"};
-  for (int k = 0; k < 10; ++k) EXPECT_EQ(a.getElement(k).name, names[k]);
-  EXPECT_EQ(a.ReportFilename, "ATERSExtractor.report");
-  EXPECT_EQ(a.getSwstVector(), nullptr);
-}
-
 TEST(ERSExtractorTest, RealLeaderFields) {
   if (!ingest_test::realDataPresent()) GTEST_SKIP() << "real data folder absent";
   ATERSExtractor x;
@@ -302,60 +292,4 @@ TEST(ERSExtractorTest, PartOfTheSceneAndFirstRecordOffset) {
     EXPECT_EQ(x.getVectorLength(), 9);
     EXPECT_EQ(x.rawData.roi.Lines, 9);
   }
-}
-
-TEST(ERSExtractorTest, FailuresEndWithTheirStatus) {
-  TempFolder dir;
-  const std::string good = leader();
-  writeBytes(dir / "DAT_01.001", imageFile(2, {{1, 900, 0, 0}, {2, 900, 0, 0}}));
-  auto leaderStatus = [&](const std::string& bytes) {
-    writeBytes(dir / "LEA", bytes);
-    ATERSExtractor x;
-    x.LeaFilename = dir / "LEA";
-    return x.readLeader();
-  };
-  EXPECT_EQ(leaderStatus(good), 0);
-  EXPECT_EQ(leaderStatus(good.substr(0, 2000)), 4);
-  EXPECT_EQ(leaderStatus(good.substr(0, 2992 + 4 * 132)), 4);  // the last vector is cut
-  std::string bad = good;
-  bad.replace(1654, 16, "            0.00");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  bad = good;
-  bad.replace(1430, 16, "                ");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  bad = good;
-  bad.replace(2534, 24, "NOT A DATE AT ALL       ");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  bad = good;
-  bad.replace(2754, 4, "0013");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  ATERSExtractor none;
-  none.LeaFilename = dir / "absent";
-  EXPECT_EQ(none.readLeader(), 9);
-  EXPECT_EQ(none.run(), 9);
-
-  ATERSExtractor x;
-  writeBytes(dir / "LEA", good);
-  x.LeaFilename = dir / "LEA";
-  x.OutputFile = dir / "out";
-  ASSERT_EQ(x.readLeader(), 0);
-  x.ImgFilename = dir / "absent";
-  EXPECT_EQ(x.readImage(), 9);
-  writeBytes(dir / "short", std::string(5000, ' '));
-  x.ImgFilename = dir / "short";
-  EXPECT_EQ(x.readImage(), 4);
-  writeBytes(dir / "empty", std::string(11644, ' '));
-  x.ImgFilename = dir / "empty";
-  EXPECT_EQ(x.readImage(), 10);
-  // Fewer records than the descriptor says.
-  writeBytes(dir / "cut", imageFile(2, {{1, 900, 0, 0}}, 3));
-  x.ImgFilename = dir / "cut";
-  EXPECT_EQ(x.readImage(), 4);
-  EXPECT_EQ(x.getSwstVector(), nullptr);
-  // An orbit file that does not exist stops the run before the image pass.
-  x.ImgFilename = dir / "DAT_01.001";
-  x.OrbitFilename = dir / "no_orbit";
-  x.OutputFile = dir / "run_out";
-  EXPECT_NE(x.run(), 0);
-  EXPECT_FALSE(std::filesystem::exists(dir / "run_out"));
 }

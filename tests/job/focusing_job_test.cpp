@@ -118,22 +118,3 @@ TEST(FocusingJob, EnvisatProfileByProductType) {
   EXPECT_EQ(shortFile.is_im0(), 0);
   EXPECT_EQ(EnvisatTypes(dir + "absent.N1").is_im0(), 0);
 }
-
-TEST(ProductTypes, RealEnvisatAndErsFiles) {
-  const std::string real = TESSIVOR_REALDATA_DIR;
-  if (!std::filesystem::exists(real)) GTEST_SKIP() << "real data folder absent";
-  const EnvisatTypes im0(real + "/envisat/ASA_IM__0CNPDE20120329_071134_000000163113_00121_52721_6279.N1");
-  EXPECT_EQ(im0.is_im0(), 1);
-  EXPECT_EQ(im0.is_aph() + im0.is_apv() + im0.is_apc(), 0);
-  const EnvisatTypes xca(real + "/envisat/ASA_XCA_AXVIEC20070517_153558_20070204_165113_20071231_000000");
-  EXPECT_EQ(xca.is_im0() + xca.is_aph() + xca.is_apv() + xca.is_apc(), 0);
-
-  // ERS-1 with a lower-case leader, ERS-2 with an upper-case one.
-  const ErsTypes ers1(real + "/ers1_2000_orbit44928");
-  EXPECT_EQ(ers1.leaderPath(), real + "/ers1_2000_orbit44928/lea_01.001");
-  EXPECT_EQ(ers1.is_ers1(), 1);
-  const ErsTypes ers2(real + "/ers2_2010_orbit77106/");
-  EXPECT_EQ(ers2.leaderPath(), real + "/ers2_2010_orbit77106/LEA_01.001");
-  EXPECT_EQ(ers2.is_ers1(), 0);
-  EXPECT_EQ(ErsTypes(real + "/envisat").is_ers1(), 0);
-}

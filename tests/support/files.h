@@ -26,9 +26,10 @@ class TempFolder {
   ~TempFolder();
   TempFolder(const TempFolder&) = delete;
   TempFolder& operator=(const TempFolder&) = delete;
-  // Path of a name inside the folder; str() ends with '/'.
+  // Path of a name inside the folder; str() ends with '/', path() does not.
   std::string operator/(const std::string& name) const { return dir_ + name; }
   const std::string& str() const { return dir_; }
+  std::string path() const { return dir_.substr(0, dir_.size() - 1); }
 
  private:
   std::string dir_;
