@@ -150,26 +150,6 @@ TEST(FftPlan, SubRectangleLeavesTheRestUntouched) {
   EXPECT_EQ(out[uy * nx], fcomplex(9, 9));
 }
 
-TEST(FftPlan, TwoDimensionalForwardAndRoundTrip) {
-  const int nx = 12, ux = 12, ny = 10, uy = 10;
-  auto a = randomSignal(nx * ny, 3);
-  std::vector<fcomplex> f(nx * ny), back(nx * ny);
-  ASSERT_EQ(fft_c(nx, ux, ny, uy, FFT_FORWARD, FFT_FORWARD, a.data(), f.data()), 0);
-  // 2-D DFT by definition at a few bins.
-  for (auto [kx, ky] : {std::pair{0, 0}, std::pair{3, 7}, std::pair{11, 1}}) {
-    dcomplex s = 0.0;
-    for (int y = 0; y < uy; ++y)
-      for (int x = 0; x < ux; ++x)
-        s += dcomplex(a[y * nx + x]) *
-             std::polar(1.0, -2.0 * std::numbers::pi * (double(x) * kx / ux + double(y) * ky / uy));
-    EXPECT_LT(std::abs(dcomplex(f[ky * nx + kx]) - s), 1e-4);
-  }
-  ASSERT_EQ(fft_c(nx, ux, ny, uy, FFT_BACKWARD_NORMALISED, FFT_BACKWARD_NORMALISED, f.data(),
-                  back.data()),
-            0);
-  for (int i = 0; i < nx * ny; ++i) EXPECT_LT(std::abs(back[i] - a[i]), 1e-5f);
-}
-
 TEST(FftPlan, ReusedPlanOnUnalignedAndSwappedPlacement) {
   const int n = 64, rows = 3;
   FFTPlan p;

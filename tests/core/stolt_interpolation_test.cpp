@@ -92,27 +92,6 @@ TEST(StoltInterpolation, LeastSquaresTableResamplesTheRowSpectrum) {
   EXPECT_LT(errorDb(row.data(), want), -30.0);
 }
 
-TEST(StoltInterpolation, LeastSquaresCoarserGridPacksRows) {
-  // scale 2: output spacing 2 dr on 100 samples packed at pitch 100 in `out`;
-  // a row band-limited to the coarser grid is resampled at every other input
-  // position (gain samples / M of the unnormalised resampling).
-  const int ns = 200, n = 100;
-  const double dr = kC / (2 * 18.96e6);
-  const std::vector<double> targets = {51.2, 120.7};
-  auto row = bandLimited(ns, 0.4, targets, ns);
-  const auto want = bandLimited(ns, 0.4, targets, n, 2.0);
-  std::vector<fcomplex> out(n, fcomplex(9.0f, 9.0f));
-  auto par = zeroDopplerLine(ns);
-  par.interp = 5;
-  par.pad = 0.4;
-  par.scale = 2.0;
-  par.data = row.data();
-  par.out = out.data();
-  const double kx = 0.0, kx2 = 0.0, dk = 0.0;
-  ASSERT_EQ(LSInterpWK(par, 288, n, n, &kx, &kx2, &dk, 2 * dr, 0.0, par.Req), 0);
-  EXPECT_LT(errorDb(out.data(), want, 2.0f), -24.0);
-}
-
 TEST(StoltInterpolation, ChirpZoomResamplesTheRowSpectrum) {
   // The two-tap interpolator is exact for content at the middle of the
   // zoomed window and good near it.

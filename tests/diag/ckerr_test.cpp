@@ -15,39 +15,6 @@ using DiagEnvironment = WorkingFolderTest;
 
 using CheckedCalls = DiagEnvironment;
 
-TEST_F(CheckedCalls, StackDepthNamesAndAlignment) {
-  EXPECT_EQ(ckflg_ckerr(), 1);
-  EXPECT_EQ(ckerr_depth(), 0);
-  EXPECT_STREQ(ckerr_current_function(), "main()");
-  EXPECT_EQ(set_ckerr_fun("outer()"), 1);
-  {
-    CheckedCall inner("inner()");
-    EXPECT_EQ(ckerr_depth(), 2);
-    EXPECT_STREQ(ckerr_current_function(), "inner()");
-    void* p = malloc_ckerr(100);
-    ASSERT_NE(p, nullptr);
-    EXPECT_EQ(reinterpret_cast<std::uintptr_t>(p) % 16, 0u);
-    auto* z = static_cast<unsigned char*>(calloc_ckerr(10, 7));
-    ASSERT_NE(z, nullptr);
-    EXPECT_EQ(reinterpret_cast<std::uintptr_t>(z) % 16, 0u);
-    for (int i = 0; i < 70; ++i) EXPECT_EQ(z[i], 0);
-    EXPECT_EQ(ckerr_live_allocations(), 2);
-    freeall_ckerr();
-    EXPECT_EQ(ckerr_live_allocations(), 0);
-  }
-  EXPECT_EQ(ckerr_depth(), 1);
-  deccurdep();
-  EXPECT_EQ(ckerr_depth(), 0);
-  // Inactive layer: names are not pushed, memory is still released.
-  exit_ckerr();
-  EXPECT_EQ(ckflg_ckerr(), 0);
-  set_ckerr_fun("ignored()");
-  EXPECT_EQ(ckerr_depth(), 0);
-  void* loose = malloc_ckerr(8);
-  EXPECT_EQ(ckerr_live_allocations(), 0);
-  free_ckerr(loose);
-}
-
 TEST_F(CheckedCalls, FreeallReleasesOnlyWhatWasAllocatedBelowTheCurrentCall) {
   void* top = malloc_ckerr(16);  // allocated by main()
   set_ckerr_fun("first()");

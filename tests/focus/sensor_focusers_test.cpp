@@ -27,37 +27,6 @@ class SensorFocusers : public FocusTest {
   }
 };
 
-TEST_F(SensorFocusers, ErsInitializeNamesTheExtractorAndTheChain) {
-  ersLevel0Focuser f;
-  fill(f);
-  EXPECT_EQ(f.initialize(), 1);
-  EXPECT_TRUE(traced("LEA filename not selected!"));
-  f.LEAFilename = path("none.lea");
-  EXPECT_EQ(f.initialize(), 1);
-  EXPECT_TRUE(traced("LEA file does not exist!"));
-
-  f.LEAFilename = path("scene.lea");
-  ASSERT_EQ(f.initialize(), 0);
-  EXPECT_TRUE(traced("Initialization completed"));
-  const ATERSExtractor& x = *f.extractor();
-  EXPECT_EQ(x.ImgFilename, path("scene.dat"));
-  EXPECT_EQ(x.LeaFilename, path("scene.lea"));
-  EXPECT_EQ(x.OrbitFilename, path("orbit.txt"));
-  EXPECT_EQ(x.OutputFile, path("out.extracted"));
-  EXPECT_EQ(x.ChirpFile, path("out.chirp"));
-  EXPECT_EQ(x.extractPercent, 95);
-  EXPECT_EQ(x.skipPercent, 10);
-  EXPECT_EQ(f.focuser().RawDataFile, path("out.extracted"));
-  EXPECT_EQ(f.focuser().ChirpFile, path("out.chirp"));
-  EXPECT_EQ(f.focuser().AntennaFile, "antenna not exist");
-  EXPECT_EQ(f.focuser().OutputFilename, path("out"));
-  EXPECT_EQ(f.conf().Memory, 256);
-  EXPECT_EQ(f.conf().RangeOverlap, 20);
-  EXPECT_EQ(f.conf().Flag_rangefoc, 1);
-  EXPECT_EQ(f.conf().Flag_set, 0);
-  EXPECT_FALSE(traced("Memory set to default value"));  // only ENVISAT says so
-}
-
 TEST_F(SensorFocusers, EnvisatAndRadarsatFailCleanlyWithoutExtractor) {
   envisatLevel0Focuser e;
   fill(e);

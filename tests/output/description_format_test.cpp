@@ -137,30 +137,6 @@ TEST(DescriptionXml, WrittenLayoutAndRoundTrip) {
   EXPECT_GT(validateAgainstSchema(dir + "broken.sml"), 0);
 }
 
-TEST(DescriptionXml, TemporaryEscapesAndOtherRoots) {
-  EXPECT_EQ(tesv_decode_temporary_escapes("##quot##apos##amp##lt##gt####BIGend"), "\"'&<>end");
-  EXPECT_EQ(tesv_decode_temporary_escapes("#plain## text#"), "#plain## text#");
-  EXPECT_EQ(tesv_xml_escape("&<>\"'x"), "&amp;&lt;&gt;&quot;&apos;x");
-
-  // Values holding the temporary escapes come back as their characters.
-  tesv_description_section root;
-  const std::string doc =
-      "<?xml version=\"1.0\" ?>\n<PARAMETERS_INFO_FOCUS>\n<NumberOfElements>1</NumberOfElements>\n"
-      "<SECTION><NAME>P</NAME><NumberOfElements>1</NumberOfElements>"
-      "<FIELD NAME = \"F\" MANDATORY = \"0\"><String><Value>x##amp####BIGy</Value></String></FIELD>"
-      "</SECTION>\n</PARAMETERS_INFO_FOCUS>\n";
-  ASSERT_EQ(tesv_parse_description_xml(doc, root, "PARAMETERS_INFO_"), 0);
-  EXPECT_EQ(root.name, "PARAMETERS_INFO_FOCUS");
-  EXPECT_EQ(root.getField("P.F")->strings.at(0), "x&y");
-
-  // A root without HEADER_INFO keeps its bare tag.
-  tesv_description_section plain("PARAMETERS_INFO_X");
-  plain.openSection("S").setField("v").setInt(1);
-  std::string text = tesv_description_xml_text(plain);
-  EXPECT_NE(text.find("\n<PARAMETERS_INFO_X>\n"), std::string::npos);
-  EXPECT_EQ(text.find("xmlns"), std::string::npos);
-}
-
 TEST(DescriptionXml, MalformedDocumentsGiveParserErrors) {
   struct Case {
     const char* document;

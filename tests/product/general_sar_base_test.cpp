@@ -87,15 +87,6 @@ class ATOther : public GeneralSAR_Base {
   int Level = 2;
 };
 
-// A table of no rows: every registration is refused.
-class ATEmpty : public GeneralSAR_Base {
- public:
-  ATEmpty() { createElementsVector(0); }
-  void refreshParameters() override { lastAdd = addElementInt("x", &x, 1, 0, 1, false); }
-  int x = 0;
-  int lastAdd = -1;
-};
-
 class GeneralSarBaseTest : public ::testing::Test {
  protected:
   std::string path(const std::string& name) const { return dir / name; }

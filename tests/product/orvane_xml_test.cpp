@@ -144,33 +144,6 @@ TEST_F(OrvaneXmlTest, LegacyFlatFormAndTooFewItems) {
   EXPECT_EQ(i[0], 7);
 }
 
-TEST_F(OrvaneXmlTest, ForeignFilesAreReplacedAtTheNextWrite) {
-  const std::string notXml = make("text.xml", "this is not a parameter document\n");
-  const std::string otherRoot = make("other.xml", "<?xml version=\"1.0\"?><Root><A>1</A></Root>\n");
-  const std::string noDescription = make(
-      "nodesc.xml", "<OrvaneXmlDoc><NumberOfChannels>0</NumberOfChannels></OrvaneXmlDoc>");
-  for (const std::string& f : {notXml, otherRoot, noDescription, path("absent.xml")}) {
-    orvanexml doc(f);
-    EXPECT_TRUE(doc.isOpen()) << f;
-    EXPECT_FALSE(doc.isRecognised()) << f;
-    const int one = 1;
-    ASSERT_EQ(doc.writeInt(2, "X/Y", &one, 1), 0);
-    ASSERT_EQ(doc.write(), 0);
-    EXPECT_EQ(slurp(f),
-              "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n"
-              "<OrvaneXmlDoc>\n"
-              "  <NumberOfChannels>1</NumberOfChannels>\n"
-              "  <Description>My description</Description>\n"
-              "  <Channel Number=\"2\">\n"
-              "    <X>\n"
-              "      <Y>1</Y>\n"
-              "    </X>\n"
-              "  </Channel>\n"
-              "</OrvaneXmlDoc>\n")
-        << f;
-  }
-}
-
 TEST_F(OrvaneXmlTest, InvalidElementNamesAreRefused) {
   const std::string f = path("names.xml");
   orvanexml doc(f);

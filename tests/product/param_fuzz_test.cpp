@@ -78,50 +78,6 @@ std::string randomText(std::mt19937& rng, size_t maxLen, bool syntaxHeavy) {
   return s;
 }
 
-// Every reader on a few likely names; only the absence of faults is checked.
-void readEverything(const std::string& f) {
-  for (const char* sec : {"a", "b", "", "a\nb"}) {
-    for (const char* key : {"a", "b", "1", "ab"}) {
-      std::string s;
-      char buf[8];
-      int i[3];
-      int64_t ll[3];
-      long l[3];
-      float fl[3];
-      double d[3];
-      std::vector<std::string> sv;
-      GetMyProfileString(sec, key, s, f);
-      GetMyProfileString(sec, key, buf, int(sizeof buf), f);
-      GetMyProfileIntArray(sec, key, i, 3, f);
-      GetMyProfileInt64Array(sec, key, ll, 3, f);
-      GetMyProfileLongArray(sec, key, l, 3, f);
-      GetMyProfileFloatArray(sec, key, fl, 3, f);
-      GetProfileDoubleArray(sec, key, d, 3, f);
-      int rc = GetMyProfileStringArray(sec, key, sv, 3, 64, f);
-      EXPECT_TRUE(rc == 0 || rc == 10 || (rc > 0 && rc < 3));
-    }
-  }
-}
-
-TEST_F(ParamFuzzTest, ProfileRandomInputsReadAndRewriteStably) {
-  std::mt19937 rng(20240611u);
-  for (int round = 0; round < 200; ++round) {
-    const std::string f = make("r.hdr", randomText(rng, 2000, round % 3 != 0));
-    FreeProfile();
-    readEverything(f);
-    // What was parsed is written out; parsing and writing that again gives
-    // the same text.
-    ASSERT_EQ(WriteMyProfileString("Fz", "k", "v = [w]", f), 0);
-    ASSERT_EQ(SyncProfile(f), 0);
-    const std::string first = slurp(f);
-    FreeProfile();
-    std::string v;
-    ASSERT_EQ(GetMyProfileString("Fz", "k", v, f), 0) << "round " << round;
-    EXPECT_EQ(v, "v = [w]");
-    ASSERT_EQ(SyncProfile(f), 0);
-    ASSERT_EQ(slurp(f), first) << "round " << round;
-  }
-}
 
 TEST_F(ParamFuzzTest, ProfileVeryLongLines) {
   const std::string huge(3 << 20, 'k');

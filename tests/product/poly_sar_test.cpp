@@ -20,38 +20,6 @@ void fillRows(std::vector<T>& rows) {
   }
 }
 
-TEST(PolySAR, RowSelectionAndNumbers) {
-  polySAR ps;
-  ps.CreatePolys(3, 3);
-  fillRows(ps.DC);
-  double v = 0;
-  // First row at or after az; x = 0.001, y = az - taz0 of that row.
-  ASSERT_EQ(ps.EvaluateDC(0.006, 105.0, &v), 0);
-  EXPECT_NEAR(v, 11 + 0.0005 + 2 * -5.0 + 0.1 * 0.001 * -5.0, 1e-12);
-  EXPECT_NEAR(ps.EvaluateDC(0.006, 110.0), 11 + 0.0005, 1e-12);  // exactly on row 1
-  EXPECT_NEAR(ps.EvaluateDC(0.006, 50.0), 1 + 0.0005 + 2 * -50.0 + 0.1 * 0.001 * -50.0, 1e-12);
-  EXPECT_NEAR(ps.EvaluateDC(0.006, 200.0), 21 + 0.0005 + 2 * 80.0 + 0.1 * 0.001 * 80.0, 1e-12);
-
-  int n = -1;
-  ps.getDCnum(50.0, &n);
-  EXPECT_EQ(n, 0);
-  ps.getDCnum(105.0, &n);
-  EXPECT_EQ(n, 0);
-  ps.getDCnum(110.0, &n);  // on a row: the row before it
-  EXPECT_EQ(n, 0);
-  ps.getDCnum(115.0, &n);
-  EXPECT_EQ(n, 1);
-  ps.getDCnum(120.0, &n);
-  EXPECT_EQ(n, 2);
-  ps.getDCnum(500.0, &n);
-  EXPECT_EQ(n, 2);
-
-  // Empty tables report and give 10.
-  EXPECT_EQ(ps.EvaluateSL2GR(0.006, 105.0, &v), 10);
-  EXPECT_EQ(ps.EvaluateGR2SLinterp(0.006, 105.0, &v), 10);
-  EXPECT_EQ(ps.EvaluateFR(0.006, 105.0, &v), 0);
-}
-
 TEST(PolySAR, InterpolationAndExtrapolation) {
   polySAR ps;
   ps.CreatePolys(3, 3, 3, 3, 3, 3);

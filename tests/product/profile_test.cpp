@@ -287,40 +287,6 @@ TEST_F(ProfileTest, StringReaders) {
   EXPECT_EQ(GetMyProfileString("S", "missing", buf, 3, f), 10);
 }
 
-TEST_F(ProfileTest, MissingFileSyncAndCache) {
-  const std::string f = path("new.hdr");
-  std::string v;
-  EXPECT_EQ(GetMyProfileString("S", "k", v, f), 10);
-  EXPECT_FALSE(fs::exists(f));
-  EXPECT_EQ(WriteMyProfileString("S", "k", "v", f), 0);
-  EXPECT_FALSE(fs::exists(f));  // nothing reaches the disk before the sync
-  EXPECT_EQ(SyncProfile(f), 0);
-  EXPECT_EQ(slurp(f), "\n[S]\nk = v\n");
-  EXPECT_EQ(SyncProfile(path("not_cached.hdr")), 0);
-  EXPECT_FALSE(fs::exists(path("not_cached.hdr")));
-
-  // FreeProfile loses unsaved changes; a later access re-reads the disk.
-  EXPECT_EQ(WriteMyProfileString("S", "k", "unsaved", f), 0);
-  FreeProfile(f);
-  EXPECT_EQ(get("S", "k", f), "v");
-
-  // Sync of all files: -1 when all went well.
-  const std::string g = path("second.hdr");
-  EXPECT_EQ(WriteMyProfileInt("T", "n", 1, g), 0);
-  EXPECT_EQ(SyncProfile(), -1);
-  EXPECT_EQ(slurp(g), "\n[T]\nn = 1\n");
-
-  // A file that cannot be opened: 1 alone; 0 from the whole walk when it is
-  // the newest, -1 again when an older one failed.
-  const std::string bad = path("no_such_dir/x.hdr");
-  EXPECT_EQ(WriteMyProfileInt("T", "n", 1, bad), 0);
-  EXPECT_EQ(SyncProfile(bad), 1);
-  EXPECT_EQ(SyncProfile(nullptr), 0);
-  EXPECT_EQ(WriteMyProfileInt("T", "n", 2, path("third.hdr")), 0);
-  EXPECT_EQ(SyncProfile(nullptr), -1);
-  EXPECT_EQ(slurp(path("third.hdr")), "\n[T]\nn = 2\n");
-}
-
 TEST_F(ProfileTest, LargeValuesAndFiles) {
   const std::string f = path("big.hdr");
   std::vector<double> many(20000);

@@ -151,50 +151,6 @@ TEST(RasterBufferFile, TypedWritesGiveTheReferenceBytes) {
   for (int i = 0; i < 4; ++i) EXPECT_EQ(component(s.data(), INT16, size_t(i), 0), want[i]);
 }
 
-TEST(RasterBufferFile, ReadWindowWithBackReachFollowsTheFile) {
-  const std::string dir = tempDir();
-  std::vector<unsigned char> data(50000);
-  uint32_t x = 777;
-  for (auto& b : data) b = (unsigned char)((x = x * 1664525u + 1013904223u) >> 24);
-  spit(dir + "/d", data);
-  BufferFile f(dir + "/d");
-  ASSERT_TRUE(f.open(BufferFile::READ));
-  f.initbuffer(1000, 300);
-  EXPECT_TRUE(f.is_buffered());
-  int64_t pos = 0;
-  std::vector<unsigned char> got(3000);
-  for (int i = 0; i < 2000; ++i) {
-    x = x * 1664525u + 1013904223u;
-    const int kind = int(x >> 29);
-    if (kind == 0) {
-      pos = int64_t((x >> 3) % 52000);  // may lie beyond the end
-      f.seek(pos, BufferFile::FROM_START);
-    } else if (kind <= 2) {
-      const int64_t off = int64_t((x >> 5) % 700) - 350;  // short steps back and forth
-      if (pos + off >= 0) {
-        f.seek(off, BufferFile::FROM_CURRENT);
-        pos += off;
-      }
-    }
-    ASSERT_EQ(f.tell(), pos);
-    const int64_t n = (x >> 4) % 3 == 0 ? int64_t(x % 3000) : int64_t(x % 40);
-    const int64_t want = std::max<int64_t>(0, std::min<int64_t>(n, int64_t(data.size()) - pos));
-    ASSERT_EQ(f.read(got.data(), n), want) << "at " << pos;
-    if (want > 0) {
-      ASSERT_EQ(0, std::memcmp(got.data(), data.data() + pos, size_t(want))) << "at " << pos;
-    }
-    pos += want;
-    if (want < n && pos < int64_t(data.size())) FAIL();
-    if (want < n) {
-      pos = int64_t(data.size());
-      f.seek(pos, BufferFile::FROM_START);
-    }
-  }
-  f.seek(-10, BufferFile::FROM_END);
-  EXPECT_EQ(f.tell(), int64_t(data.size()) - 10);
-  EXPECT_EQ(f.read(got.data(), 100), 10);
-}
-
 namespace {
 
 // The same random walk of seeks, small prefix patches, long writes and (in

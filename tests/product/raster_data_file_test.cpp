@@ -82,48 +82,6 @@ TEST(RasterDataFile, EveryTypeAndByteOrderReadsBackThroughWindows) {
   }
 }
 
-TEST(RasterDataFile, ManyRowsBehindSmallPrefixesAndATruncatedFile) {
-  // Long windows whose rows lie behind small gaps (prefix and a few columns)
-  // are gathered into few transfers; the values and the short-read status
-  // must be those of the row by row reading.
-  const std::string dir = tempDir();
-  for (int type : {FLOAT_COMPLEX, INT16}) {
-    SCOPED_TRACE("type " + std::to_string(type));
-    const Layout l{type, false, 1200, 20, 4, 3};
-    std::vector<unsigned char> ref = referenceRaster(l);
-    const std::string name = dir + "/many" + std::to_string(type);
-    spit(name, ref);
-    const TypeInfo ti = typeInfo(type);
-    const size_t ms = size_t(ti.bytes * ti.parts);
-    const int stride = 19;
-    std::vector<unsigned char> dst(ms * stride * 1199, 0xAB);
-    DataFile f;
-    describe(f, name, l);
-    BufferIO io{&f, 1, 18, 1, 1199, type};
-    ASSERT_EQ(io.readbuffer(dst.data(), stride), STATUS_OK);
-    EXPECT_EQ(f.tell(), f.rowstart(1200));
-    for (int r = 0; r < io.rows; ++r)
-      for (int c = 0; c < stride; ++c) {
-        const size_t i = size_t(r * stride + c);
-        if (c == 18) {
-          ASSERT_EQ(dst[i * ms], 0xAB);
-          continue;
-        }
-        for (int k = 0; k < ti.parts; ++k)
-          ASSERT_EQ(component(dst.data(), type, i, k), pixelValue(1 + r, 1 + c, k)) << r << " " << c;
-      }
-    f.close();
-    // Cut inside row 1100: a short read, rows before it delivered.
-    ref.resize(size_t(f.rowstart(1100) + 17));
-    spit(name, ref);
-    std::fill(dst.begin(), dst.end(), 0xAB);
-    EXPECT_EQ(io.readbuffer(dst.data(), stride), STATUS_READ_FAILED);
-    for (int r : {0, 600, 1098})
-      EXPECT_EQ(component(dst.data(), type, size_t(r * stride + 5), 0), pixelValue(1 + r, 6, 0));
-    f.close();
-  }
-}
-
 TEST(RasterDataFile, WriteBufferAndPrefixesGiveTheReferenceBytes) {
   const std::string dir = tempDir();
   for (int type = 0; type <= 9; ++type) {
@@ -406,33 +364,4 @@ TEST(RasterDataFile, BufferedReadsMatchTheFileAtRandomSeeks) {
     EXPECT_EQ(0, std::memcmp(got.data(), data.data() + data.size() - 100, 100));
     f.close();
   }
-}
-
-TEST(RasterDataFile, BufferedWritingKeepsItsSeekRule) {
-  const std::string dir = tempDir();
-  DataFile f(dir + "/bw");
-  f.buffersize = 16;
-  ASSERT_EQ(f.open(1), STATUS_OK);
-  ASSERT_EQ(f.write("AAAAAAAAAA", 10), STATUS_OK);
-  EXPECT_EQ(f.tell(), 10);
-  // Flushes, then counts the offset from the buffer's first byte (0).
-  ASSERT_EQ(f.seek(5, 1), STATUS_OK);
-  ASSERT_EQ(f.write("BB", 2), STATUS_OK);
-  // A write that does not fit flushes and goes straight to the file.
-  ASSERT_EQ(f.write("CCCCCCCCCCCCCCCCCCCC", 20), STATUS_OK);
-  ASSERT_EQ(f.write("DD", 2), STATUS_OK);
-  ASSERT_EQ(f.close(), STATUS_OK);
-  const std::vector<unsigned char> bytes = slurp(dir + "/bw");
-  EXPECT_EQ(std::string(bytes.begin(), bytes.end()), "AAAAABBCCCCCCCCCCCCCCCCCCCCDD");
-  // Sequential buffered writing of rows equals the unbuffered result.
-  const Layout l{FLOAT_COMPLEX, false, 40, 33, 0, 0};
-  const std::vector<unsigned char> ref = referenceRaster(l);
-  DataFile g;
-  describe(g, dir + "/rows", l);
-  g.buffersize = 1000;
-  ASSERT_EQ(g.open(1), STATUS_OK);
-  BufferIO io{&g, 0, l.pixels, 0, l.lines, FLOAT_COMPLEX};
-  ASSERT_EQ(io.writebuffer(ref.data()), STATUS_OK);
-  ASSERT_EQ(g.close(), STATUS_OK);
-  EXPECT_EQ(slurp(dir + "/rows"), ref);
 }
