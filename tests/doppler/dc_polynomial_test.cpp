@@ -220,60 +220,6 @@ class DcBlockFile : public testing::Test {
   support::TempFolder dir_{"dc_block"};
 };
 
-TEST_F(DcBlockFile, ReadsBlocksFromFileAndMemory) {
-  const int ns = 40, nl = 30;
-  std::vector<fcomplex> raster(ns * nl);
-  for (int l = 0; l < nl; ++l)
-    for (int s = 0; s < ns; ++s) raster[l * ns + s] = fcomplex(s + 0.25f, -l - 0.5f);
-  // Big-endian file with a 16-byte header.
-  const std::string path = dir_ / "raster.bin";
-  {
-    std::ofstream f(path, std::ios::binary);
-    const char header[16] = {};
-    f.write(header, 16);
-    for (const fcomplex& v : raster) {
-      float p[2] = {v.real(), v.imag()};
-      for (float x : p) {
-        unsigned char b[4];
-        std::memcpy(b, &x, 4);
-        if (get_endian() != kMsbFirst) std::swap(b[0], b[3]), std::swap(b[1], b[2]);
-        f.write(reinterpret_cast<char*>(b), 4);
-      }
-    }
-  }
-  DcEstInput in;
-  in.rasterFile = path;
-  in.samples = ns;
-  in.lines = nl;
-  in.byteOrder = 1;
-  in.headerOffset = 16;
-  DcEstState st;
-  st.blocks = 8;
-  st.blockl = 6;
-  ASSERT_EQ(read_block(st, in, 20, 30), 0);
-  for (int l = 0; l < 6; ++l)
-    for (int s = 0; s < 8; ++s) EXPECT_EQ(st.blockBuf[l * 8 + s], raster[(20 + l) * ns + 30 + s]);
-
-  DcEstState mem = st;
-  mem.inMemory = 1;
-  mem.data = raster.data();
-  mem.blockBuf.clear();
-  DcEstInput nofile = in;
-  nofile.rasterFile = "/nonexistent/raster.bin";
-  ASSERT_EQ(read_block(mem, nofile, 24, 32), 0);
-  EXPECT_EQ(mem.blockBuf[0], raster[24 * ns + 32]);
-  EXPECT_EQ(mem.blockBuf[47], raster[29 * ns + 39]);
-
-  // Outside the raster, missing file, truncated file.
-  EXPECT_EQ(read_block(st, in, 25, 0), 1);
-  EXPECT_EQ(read_block(st, in, 0, 33), 1);
-  EXPECT_EQ(read_block(st, in, -1, 0), 1);
-  EXPECT_EQ(read_block(st, nofile, 0, 0), 9);
-  std::filesystem::resize_file(path, 16 + 8 * ns * 10);
-  EXPECT_EQ(read_block(st, in, 8, 0), 4);
-  EXPECT_EQ(read_block(st, in, 0, 0), 0);
-}
-
 // Contrast map of the raster: cell mean of |x|^4 over the squared cell mean
 // of |x|^2.
 void contrastMap(const std::vector<fcomplex>& r, int ns, int nl, DcEstState& st) {
