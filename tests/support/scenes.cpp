@@ -34,18 +34,23 @@ SceneDescription ersScene(int lines, int samples, double dopplerHz) {
   return s;
 }
 
+SensorScene ersSceneFiles(const RawSceneSimulator& sim, const std::string& folder) {
+  SensorScene out;
+  out.root = folder + "sim";
+  out.truth = out.root + "/truth.txt";
+  out.files = {{"image", sim.imagePath(out.root)},
+               {"leader", sim.leaderPath(out.root)},
+               {"orbit", sim.odrPath(out.root)},
+               {"orbit_archive", out.root + "/orbits"}};
+  return out;
+}
+
 bool simulateErs(const SceneDescription& scene, const std::string& folder, SensorScene& out,
                  std::string& error) {
   try {
     const RawSceneSimulator sim(scene);
-    out.root = folder + "sim";
-    if (sim.writeErsScene(out.root, error) != 0) return false;
-    out.truth = out.root + "/truth.txt";
-    out.files = {{"image", sim.imagePath(out.root)},
-                 {"leader", sim.leaderPath(out.root)},
-                 {"orbit", sim.odrPath(out.root)},
-                 {"orbit_archive", out.root + "/orbits"}};
-    return true;
+    out = ersSceneFiles(sim, folder);
+    return sim.writeErsScene(out.root, error) == 0;
   } catch (const std::exception& e) {
     error = e.what();
     return false;

@@ -39,9 +39,11 @@ struct SensorScene {
 // The orbit and radar of the example ERS-2 scene (a descending pass).
 SceneDescription ersScene(int lines, int samples, double dopplerHz);
 
+// The files of an ERS scene simulated under folder/sim, by role: "image",
+// "leader", "orbit", "orbit_archive".
+SensorScene ersSceneFiles(const RawSceneSimulator& sim, const std::string& folder);
 // Writes an ERS scene (CEOS image and leader, DEOS orbit arc and its archive
-// folder) under folder/sim. Roles: "image", "leader", "orbit",
-// "orbit_archive". false with the message on failure.
+// folder) under folder/sim. false with the message on failure.
 bool simulateErs(const SceneDescription& scene, const std::string& folder, SensorScene& out,
                  std::string& error);
 
