@@ -206,24 +206,3 @@ TEST_F(Environment, ErrorFileForARasterAndItsLimits) {
   EXPECT_EQ(cut.find("line 29"), std::string::npos);
   EXPECT_NE(readText(path("Process.trace")).find("(aTotLen + aLen) ["), std::string::npos);
 }
-
-TEST_F(Environment, MoveFileSetTakesItsCompanions) {
-  for (const char* suffix : {"", "_hdr", ".hdr", ".sml", ".shp"}) writeText(path("src") + suffix, suffix);
-  writeText(path("dst"), "old");
-  writeText(path("dst_hdr"), "old");
-  moveFileSet(path("src"), path("dst"), true);
-  EXPECT_EQ(readText(path("dst")), "");
-  EXPECT_EQ(readText(path("dst_hdr")), "_hdr");
-  EXPECT_EQ(readText(path("dst.hdr")), ".hdr");
-  EXPECT_EQ(readText(path("dst.sml")), ".sml");
-  EXPECT_EQ(readText(path("dst.shp")), ".shp");
-  EXPECT_FALSE(fs::exists(path("dst.shx")));
-  EXPECT_FALSE(fs::exists(path("src.hdr")));
-  writeText(path("bare"), "x");
-  moveFileSet(path("bare"), path("moved"), false);
-  EXPECT_EQ(readText(path("moved")), "x");
-  moveFileSet(path("absent"), path("moved2"), true);
-  EXPECT_FALSE(fs::exists(path("moved2")));
-  EXPECT_NE(readText(path("Process.trace")).find("Not found : " + path("absent_hdr")),
-            std::string::npos);
-}

@@ -28,21 +28,6 @@ TEST_F(Progress, PercentageIsCappedAndTheBatchFlagRemoved) {
   EXPECT_TRUE(fs::exists(path("progress.txt_batch_ok")));
 }
 
-TEST_F(Progress, MissingFileIsCreatedAndTheOperatorStopIsSeen) {
-  const std::string file = path("progress.txt");
-  EXPECT_TRUE(getAndSetPerc(0, 7, "start"));
-  EXPECT_EQ(readText(file), "7\nstart\n");
-  EXPECT_NE(readText(path("Process.trace")).find("getAndSetPerc - Not found the file : " + file),
-            std::string::npos);
-  writeText(file, "101\nstop please\n");
-  EXPECT_FALSE(getAndSetPerc(7, 8, nullptr));
-  EXPECT_FALSE(getAndSetPerc(8, 8, nullptr));
-  EXPECT_EQ(readText(file), "101\nstop please\n");
-  writeText(file, "100\n\n");
-  EXPECT_TRUE(getAndSetPerc(8, 9, nullptr));
-  EXPECT_EQ(readText(file), "9\n\n");
-}
-
 TEST_F(Progress, WaitbarClampsAndSkipsRepeatedPercentages) {
   const std::string file = path("progress.txt");
   EXPECT_EQ(waitbar_open("Azimuth focusing"), 0);

@@ -86,54 +86,6 @@ TEST(DcBinScan, ThreadsGiveTheSameBinsAndContrastAsOneThread) {
   EXPECT_EQ(one.bins[8].line, 256 + 128);
 }
 
-TEST(DcBinScan, OnePassScanEqualsTheBlockEstimateAndTheCellMeans) {
-  const Radar rd;
-  const int ns = 5 * 64 + 8, nl = 3 * 256;
-  const std::string dir = scratchDir("scan_reference");
-  const std::string path = dir + "/scene.rgfoc";
-  const std::vector<fcomplex> data = makeVaryingClutter(rd, {0.7, -0.1 / ns, 0.0}, ns, nl, 3.0, 9);
-  ASSERT_TRUE(writeRaster(path, data));
-  const DcEstState st = scan(rd, path, dir, ns, nl, 2);
-
-  // Reference: every bin copied out and estimated alone, every contrast
-  // cell summed on its own, then the same smoothing of the maps.
-  DcEstState ref = ersState(rd);
-  DcEstInput in = inputFor(rd, path, dir, ns, nl);
-  ASSERT_EQ(setprocbuf(in, ref), 0);
-  ASSERT_EQ(dcTheoreticAutocorrelation(in, ref), 0);
-  std::vector<fcomplex> block(size_t(ref.blocks) * ref.blockl);
-  for (int by = 0; by < ref.nBinsY; ++by)
-    for (int bx = 0; bx < ref.nBinsX; ++bx) {
-      for (int l = 0; l < ref.blockl; ++l)
-        for (int s = 0; s < ref.blocks; ++s)
-          block[size_t(l) * ref.blocks + s] = data[size_t(by * ref.blockl + l) * ns + bx * ref.blocks + s];
-      DcBin expect;
-      dcBinEstimate(block.data(), ref, expect);
-      const DcBin& got = st.bins[size_t(by) * ref.nBinsX + bx];
-      EXPECT_EQ(got.valid, expect.valid);
-      EXPECT_TRUE(sameBits(got.dcWrapped, expect.dcWrapped)) << bx << " " << by;
-      EXPECT_TRUE(sameBits(got.contrast, expect.contrast)) << bx << " " << by;
-      EXPECT_TRUE(sameBits(got.noise, expect.noise)) << bx << " " << by;
-    }
-  const double norm = 1.0 / (double(ref.patchs) * ref.patchl);
-  for (int cy = 0; cy < ref.cmHeight; ++cy)
-    for (int cx = 0; cx < ref.cmWidth; ++cx) {
-      double p2 = 0.0, p4 = 0.0;
-      for (int l = cy * ref.patchl; l < (cy + 1) * ref.patchl; ++l)
-        for (int s = cx * ref.patchs; s < (cx + 1) * ref.patchs; ++s) {
-          const double a = std::norm(data[size_t(l) * ns + s]);
-          p2 += a;
-          p4 += a * a;
-        }
-      ref.contrastPow[size_t(cy) * ref.cmWidth + cx] = static_cast<float>(p2 * norm);
-      ref.contrastMap[size_t(cy) * ref.cmWidth + cx] = static_cast<float>(p4 * norm);
-    }
-  ASSERT_EQ(getcontrast(ref), 0);
-  ASSERT_EQ(ref.contrastMap.size(), st.contrastMap.size());
-  EXPECT_EQ(std::memcmp(ref.contrastMap.data(), st.contrastMap.data(), st.contrastMap.size() * sizeof(float)), 0);
-  EXPECT_EQ(std::memcmp(ref.contrastPow.data(), st.contrastPow.data(), st.contrastPow.size() * sizeof(float)), 0);
-}
-
 TEST(DcBinScan, ReadsInBoundedChunksWhateverTheMemory) {
   const Radar rd;
   DcEstState st = ersState(rd);

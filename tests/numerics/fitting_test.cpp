@@ -101,17 +101,4 @@ TEST(RootFinding, RtbisFindsBracketedRootsAndRefusesOthers) {
   EXPECT_NEAR(r3, 0.3, 1e-5);
 }
 
-TEST(RootFinding, BrentAndOptimBrFindMinima) {
-  double xmin = 0;
-  int status = -1;
-  const double fmin = brent(0.0, 1.0, 4.0, [](double x) { return (x - 2.5) * (x - 2.5) + 1.0; },
-                            1e-10, &xmin, &status);
-  EXPECT_EQ(status, 0);
-  EXPECT_NEAR(xmin, 2.5, 3e-8);  // a flat minimum: sqrt of the precision
-  EXPECT_NEAR(fmin, 1.0, 1e-15);
-  optim_br([](double x) { return -std::sin(x); }, 0.0, 3.0, 1e-10, &xmin, &status);
-  EXPECT_EQ(status, 0);
-  EXPECT_NEAR(xmin, M_PI / 2, 1e-7);
-}
-
 }  // namespace

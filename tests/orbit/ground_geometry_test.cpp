@@ -195,36 +195,4 @@ TEST(InverseSolution, ReturnsAzimuthAndRangeTimeOfAGroundPoint) {
   EXPECT_EQ(inv_grpt_opt(&t, &tau, cx, cy, cz, bad, 4 * dt, kLambda, 0.0), 12);
 }
 
-TEST(Baseline, ComponentsOfATranslatedOrbit) {
-  CircularOrbit orbit;
-  const double dt = 5.0;
-  double pts1[15], pts2[15];
-  orbit.positions(0.0, dt, 5, pts1);
-  // Geometry at t = 10 s to build the offset from its line of sight and
-  // horizontal direction.
-  double cx[5], cy[5], cz[5], S[3], V[3], A[3], G[3], G2[3];
-  ASSERT_EQ(orb_interp(0.0, pts1, dt, cx, cy, cz, 5), 0);
-  POSVELACC_5(10.0, cx, cy, cz, S, V, A);
-  const double tau = tauOf(860e3);
-  ASSERT_EQ(gr_pt(G, S, V, tau, 0.0, kLambda, 0.0, 1.0, kA, kB), 0);
-  ASSERT_EQ(gr_pt(G2, S, V, tau + 5e-6, 0.0, kLambda, 0.0, 1.0, kA, kB), 0);
-  double l[3], hdir[3];
-  const double d[3] = {G[0] - S[0], G[1] - S[1], G[2] - S[2]};
-  make_versor(d, l);
-  const double d2[3] = {G2[0] - S[0], G2[1] - S[1], G2[2] - S[2]};
-  const double ld = dot3(l, d2);
-  const double hr[3] = {d2[0] - l[0] * ld, d2[1] - l[1] * ld, d2[2] - l[2] * ld};
-  make_versor(hr, hdir);
-  const double along = 35.0, horiz = 150.0;
-  for (int i = 0; i < 5; ++i)
-    for (int k = 0; k < 3; ++k) pts2[3 * i + k] = pts1[3 * i + k] + along * l[k] + horiz * hdir[k];
-  double out[3], t2, tau2;
-  ASSERT_EQ(baseline(10.0, pts1, pts2, dt, dt, tau, kLambda, 0.0, 1.0, out, &t2, &tau2), 0);
-  EXPECT_NEAR(out[0], horiz, 1e-4);
-  EXPECT_NEAR(out[1], along, 1e-4);
-  EXPECT_NEAR(out[2], 0.0, 1e-4);
-  EXPECT_NEAR(t2, 10.0, 1e-7);
-  EXPECT_EQ(baseline(25.0, pts1, pts2, dt, dt, tau, kLambda, 0.0, 1.0, out), 12);
-}
-
 }  // namespace
