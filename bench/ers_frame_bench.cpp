@@ -7,73 +7,42 @@
 //   TESSIVOR_BENCH_CACHE   cache folder (default <build>/bench-cache/ers_frame)
 //   TESSIVOR_BENCH_FOCUSER focuser executable (default next to this one)
 #include <benchmark/benchmark.h>
-
-#include <fcntl.h>
-#include <sys/resource.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <array>
-#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <string>
-#include <thread>
-#include <vector>
 
-#include "sim/raw_scene.h"
+#include "support/files.h"
+#include "support/host_run.h"
+#include "support/scenes.h"
 
 namespace {
 
 namespace fs = std::filesystem;
+using support::readText;
 
 constexpr int kLines = 28000;
 constexpr int kSamples = 5616;
 
 SceneDescription frameScene() {
-  SceneDescription s;
-  s.mission = "ERS2";
-  s.orbit.semiMajorAxis = 7159500.0;
-  s.orbit.eccentricity = 0.0011;
-  s.orbit.inclinationDeg = 98.52;
-  s.orbit.nodeLongitudeDeg = 0.0;
-  s.orbit.argPerigeeDeg = 90.0;
-  s.orbit.meanAnomalyDeg = -50.0;
-  double start = 0.0;
-  simParseDate("18-JAN-2010 17:49:28.683", start);
-  s.orbit.epoch = start;
-  s.startTime = start;
-  s.lines = kLines;
-  s.samples = kSamples;
-  s.nearRangeTime = 0.00555;
-  s.dopplerCentroidHz = 250.0;
-  s.orbitNumber = 77106;
-  s.frame = 2925;
-  s.arcNumber = 123;
+  SceneDescription s = support::ersScene(kLines, kSamples, 250.0);
   s.sceneDir = "ERS2_FRAME";
   for (int i = 0; i < 8; ++i)
     s.pixelTargets.push_back({3000.0 + 3000.0 * i + 0.25, 400.0 + 650.0 * i + 0.5, 20.0 * (i % 3), 4.0});
-  s.clutterSigma = 2.0;
-  s.noiseSigma = 1.0;
   s.seed = 17;
   return s;
 }
 
-std::string readText(const std::string& file) {
-  std::ifstream in(file, std::ios::binary);
-  std::stringstream s;
-  s << in.rdbuf();
-  return s.str();
-}
-
 fs::path executableDir() { return fs::read_symlink("/proc/self/exe").parent_path(); }
 
-fs::path cacheDir() {
-  if (const char* c = std::getenv("TESSIVOR_BENCH_CACHE")) return c;
-  return executableDir().parent_path() / "bench-cache" / "ers_frame";
+std::string cacheDir() {
+  if (const char* c = std::getenv("TESSIVOR_BENCH_CACHE")) return std::string(c) + "/";
+  return (executableDir().parent_path() / "bench-cache" / "ers_frame").string() + "/";
 }
 
 std::string focuserPath() {
@@ -82,22 +51,22 @@ std::string focuserPath() {
 }
 
 // Simulates the frame unless the cache already holds it.
-bool ensureScene(const fs::path& cache, std::string& error) {
+bool ensureScene(const std::string& cache, support::SensorScene& files, std::string& error) {
   const SceneDescription scene = frameScene();
-  const fs::path stamp = cache / "sim.done";
+  const std::string stamp = cache + "sim.done";
   const std::string key = "ers frame " + std::to_string(kLines) + "x" + std::to_string(kSamples) + " seed " +
                           std::to_string(scene.seed) + " targets " + std::to_string(scene.pixelTargets.size()) + "\n";
-  if (fs::exists(stamp) && readText(stamp.string()) == key) return true;
-  fs::remove_all(cache / "sim");
-  fs::create_directories(cache);
   try {
-    const RawSceneSimulator sim(scene);
-    if (sim.writeErsScene((cache / "sim").string(), error) != 0) return false;
+    files = support::ersSceneFiles(RawSceneSimulator(scene), cache);
   } catch (const std::exception& e) {
     error = e.what();
     return false;
   }
-  std::ofstream(stamp) << key;
+  if (fs::exists(stamp) && readText(stamp) == key) return true;
+  fs::remove_all(cache + "sim");
+  fs::create_directories(cache);
+  if (!support::simulateErs(scene, cache, files, error)) return false;
+  support::writeText(stamp, key);
   return true;
 }
 
@@ -133,113 +102,69 @@ constexpr std::array<Stage, 8> kStages{{
 }};
 
 struct RunTimes {
-  int status = -1;
   std::array<double, kStages.size()> wall{}, cpu{};
   double totalWall = 0.0, totalCpu = 0.0, peakMiB = 0.0;
   std::string message;
 };
 
-void writeJob(const fs::path& sim, const fs::path& run, const fs::path& job) {
-  // The 24 positional parameters: platform, scene, output root, leader,
-  // orbit folder (the arc is looked up), whole scene, erase temporaries.
-  const std::string n = "NotOK";
-  const std::vector<std::string> p = {
-      "ERS", (sim / "ERS2_FRAME" / "DAT_01.001").string(), n, n, n, (run / "frame").string(), n,
-      (sim / "ERS2_FRAME" / "LEA_01.001").string(), n, n, n, (sim / "orbits").string(), n, n, n, n,
-      "0", "0", "1", n, "0", "0", n, "0"};
-  std::ofstream out(job);
-  out << "ers frame benchmark\n";
-  for (const auto& v : p) out << v << "\n";
-}
-
-RunTimes runFocuser(const fs::path& cache) {
+// One run on the cached scene: the orbit arc looked up in the archive, the
+// whole scene, temporary files erased.
+RunTimes runFrame(const std::string& cache, const support::SensorScene& files) {
   RunTimes t;
-  const fs::path run = cache / "run";
+  const std::string run = cache + "run/";
   fs::remove_all(run);
   fs::create_directories(run);
-  const fs::path job = run / "job.txt";
-  writeJob(cache / "sim", run, job);
-  const std::string folder = run.string() + "/";
-  const std::string trace = folder + "Process.trace";
-  const std::string exe = focuserPath();
-  const std::string command = "main_focussing_stripmap#" + job.string();
+  support::Job job = support::ersJob(files, run + "frame");
+  job[6] = "NotOK";
+  job[11] = files["orbit_archive"];
+  job[18] = "1";
+  support::writeJob(run + "job.txt", job);
 
-  const auto started = std::chrono::steady_clock::now();
-  const pid_t pid = fork();
-  if (pid == 0) {
-    setenv("TESSIVOR_WORKING_DIR", folder.c_str(), 1);
-    setenv("TESSIVOR_WORKING_FILE", (folder + "progress.txt").c_str(), 1);
-    setenv("TESSIVOR_CEOS_DES_FILES_DIR", TESSIVOR_DEFAULT_RESOURCE_DIR, 1);
-    setenv("TESSIVOR_TRACING", "ACTIVE", 1);
-    if (chdir(folder.c_str()) != 0) _exit(126);
-    const int fd = open((folder + "console.txt").c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
-    if (fd >= 0) {
-      dup2(fd, STDOUT_FILENO);
-      dup2(fd, STDERR_FILENO);
-    }
-    execl(exe.c_str(), "stripmap_focuser", command.c_str(), static_cast<char*>(nullptr));
-    _exit(127);
-  }
-  if (pid < 0) {
-    t.message = "fork failed";
-    return t;
-  }
-
-  auto seconds = [&] {
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - started).count();
-  };
   std::size_t next = 0;  // next stage whose end is awaited
   double lastWall = 0.0, lastCpu = 0.0;
-  int status = 0;
-  rusage usage{};
-  for (;;) {
-    if (next + 1 < kStages.size()) {
-      const double cpu = processCpu(pid);
-      const std::string text = readText(trace);
-      while (next + 1 < kStages.size() && text.find(kStages[next].endMarker) != std::string::npos) {
-        const double wall = seconds();
-        t.wall[next] = wall - lastWall;
-        t.cpu[next] = cpu >= 0.0 ? cpu - lastCpu : 0.0;
-        lastWall = wall;
-        if (cpu >= 0.0) lastCpu = cpu;
-        ++next;
-      }
+  const auto started = std::chrono::steady_clock::now();
+  support::RunOptions options;
+  options.executable = focuserPath();
+  options.pollMilliseconds = 5;
+  options.timeoutSeconds = 7200;
+  options.hook = [&](const support::RunningFocuser& running) {
+    if (next + 1 >= kStages.size()) return;
+    const double cpu = processCpu(running.pid);
+    const std::string text = readText(running.folder + "Process.trace");
+    while (next + 1 < kStages.size() && text.find(kStages[next].endMarker) != std::string::npos) {
+      const double wall = std::chrono::duration<double>(std::chrono::steady_clock::now() - started).count();
+      t.wall[next] = wall - lastWall;
+      t.cpu[next] = cpu >= 0.0 ? cpu - lastCpu : 0.0;
+      lastWall = wall;
+      if (cpu >= 0.0) lastCpu = cpu;
+      ++next;
     }
-    const pid_t done = wait4(pid, &status, WNOHANG, &usage);
-    if (done == pid) break;
-    if (done < 0) {
-      t.message = "wait failed";
-      return t;
-    }
-    std::this_thread::sleep_for(std::chrono::milliseconds(5));
-  }
-  t.totalWall = seconds();
-  t.totalCpu = usage.ru_utime.tv_sec + 1e-6 * usage.ru_utime.tv_usec + usage.ru_stime.tv_sec +
-               1e-6 * usage.ru_stime.tv_usec;
-  t.peakMiB = usage.ru_maxrss / 1024.0;
+  };
+  const support::FocuserRun r = support::runFocuser(run, run + "job.txt", options);
+  t.totalWall = r.seconds;
+  t.totalCpu = r.cpuSeconds;
+  t.peakMiB = r.peakMiB;
   t.wall[kStages.size() - 1] = t.totalWall - lastWall;
   t.cpu[kStages.size() - 1] = t.totalCpu - lastCpu;
-  t.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
-  if (t.status != 0 || fs::exists(folder + "progress.txt_error"))
-    t.message = "focuser failed (status " + std::to_string(t.status) + "), see " + folder + "Process.log";
-  else if (next + 1 < kStages.size()) {
-    t.message = "checkpoint not found in the trace: ";
-    t.message += kStages[next].endMarker;
-  }
+  if (r.exitStatus != 0 || r.errorCode != 0)
+    t.message = "focuser failed (status " + std::to_string(r.exitStatus) + "), see " + run + "Process.log";
+  else if (next + 1 < kStages.size())
+    t.message = std::string("checkpoint not found in the trace: ") + kStages[next].endMarker;
   return t;
 }
 
 void BM_ErsFrame(benchmark::State& state) {
-  const fs::path cache = cacheDir();
+  const std::string cache = cacheDir();
+  support::SensorScene files;
   std::string error;
-  if (!ensureScene(cache, error)) {
+  if (!ensureScene(cache, files, error)) {
     state.SkipWithError(("simulation failed: " + error).c_str());
     return;
   }
   RunTimes sum;
   int runs = 0;
   for (auto _ : state) {
-    const RunTimes t = runFocuser(cache);
+    const RunTimes t = runFrame(cache, files);
     if (!t.message.empty()) {
       state.SkipWithError(t.message.c_str());
       return;

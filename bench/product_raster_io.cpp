@@ -1,7 +1,7 @@
 // Block I/O of a FLOAT_COMPLEX raster (2 GiB by default) by blocks of lines
 // through DataFile+BufferIO and BufferFile, against plain fread/fwrite of the
 // same bytes. Environment: TESSIVOR_BENCH_DIR (folder of the scratch file,
-// default /tmp), TESSIVOR_BENCH_RASTER_MB (file size, default 2048).
+// default a scratch folder removed at exit), TESSIVOR_BENCH_RASTER_MB (file size, default 2048).
 #include <benchmark/benchmark.h>
 
 #include <unistd.h>
@@ -16,6 +16,7 @@
 #include "product/buffer_file.h"
 #include "product/buffer_io.h"
 #include "product/data_file.h"
+#include "support/files.h"
 
 namespace {
 
@@ -30,10 +31,11 @@ int64_t megabytes() {
 int lines() { return int(megabytes() * (1 << 20) / (int64_t(kPixels) * 8)); }
 int64_t totalBytes() { return int64_t(lines()) * kPixels * 8; }
 
+// In TESSIVOR_BENCH_DIR when set, else in a scratch folder removed at exit.
 std::string scratchName() {
   const char* d = std::getenv("TESSIVOR_BENCH_DIR");
-  return std::string(d ? d : "/tmp") + "/tessivor_bench_raster_" + std::to_string(::getpid()) +
-         ".slc";
+  return (d ? std::string(d) + "/" : support::scratchDir("bench_raster")) + "tessivor_bench_raster_" +
+         std::to_string(::getpid()) + ".slc";
 }
 const std::string& scratch() {
   static const std::string name = scratchName();

@@ -29,7 +29,6 @@ std::vector<float> patternBlock(int lines, int samples, F energyOf) {
   return v;
 }
 
-double wrapPi(double a) { return std::remainder(a, 2 * kPi); }
 
 TEST(AzimuthCentreEstimate, RecoversPhaseOfPeriodicEnergyPattern) {
   // One cycle of energy across the block; with L = 2 pi step / scale the
@@ -52,45 +51,6 @@ TEST(AzimuthCentreEstimate, RecoversPhaseOfPeriodicEnergyPattern) {
       const double cycles = (value - target) / L;
       EXPECT_NEAR(cycles, std::round(cycles), 0.01 / (2 * kPi)) << phi << " " << start;
     }
-  }
-}
-
-TEST(AzimuthCentreEstimate, OnlyRowsInsideTheBlockAndEveryGthLineCount) {
-  // Phase of the pattern per residue of the line index: 8k lines 0.0, 4 mod 8
-  // lines 1.0, 2 mod 4 lines 2.0 and odd lines 3.0. The chosen group g reads
-  // lines 0, g, 2g, ..., so the recovered phase is that of the mean phasor of
-  // the classes it visits.
-  auto phaseOf = [](int l) {
-    if (l % 8 == 0) return 0.0;
-    if (l % 4 == 0) return 1.0;
-    if (l % 2 == 0) return 2.0;
-    return 3.0;
-  };
-  auto expected = [](int g) {
-    // Share of the visited lines in each class times its phasor.
-    std::complex<double> s = std::polar(g / 8.0, 0.0);
-    if (g <= 4) s += std::polar(g / 8.0, 1.0);
-    if (g <= 2) s += std::polar(g / 4.0, 2.0);
-    if (g <= 1) s += std::polar(0.5, 3.0);
-    return std::arg(s);
-  };
-  struct Case {
-    int lines;
-    int g;
-  };
-  for (const Case c : {Case{4096, 8}, Case{4095, 4}, Case{2048, 4}, Case{2047, 2}, Case{1024, 2},
-                       Case{1023, 1}, Case{600, 1}}) {
-    const int samples = 4;
-    // The rows after the block carry a different pattern and must be ignored.
-    const int rows = c.lines + 64;
-    const auto block = patternBlock(rows, samples, [&](int l) {
-      if (l >= c.lines) return 1e6 * (1.0 + std::cos(0.1 * l));
-      return 10.0 + 4.0 * std::cos(2 * kPi * l / c.lines + phaseOf(l));
-    });
-    double value = 0.0;
-    ASSERT_EQ(EnPhaseAzCntrlWNestimate(value, rows, c.lines, samples, block.data(), 1.0, 1.0), 0);
-    // L = 2 pi: value = -phase.
-    EXPECT_NEAR(wrapPi(-value - expected(c.g)), 0.0, 0.03) << c.lines;
   }
 }
 

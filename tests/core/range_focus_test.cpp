@@ -10,33 +10,19 @@
 #include <string>
 #include <vector>
 
+#include "base/status.h"
 #include "core/fft.h"
-#include "synthetic_raw.h"
+#include "support/files.h"
+#include "support/scenes.h"
 
 namespace {
 
-using namespace synthetic_raw;
-
-std::vector<fcomplex> readAll(const std::string& path) {
-  std::ifstream f(path, std::ios::binary | std::ios::ate);
-  const auto bytes = static_cast<std::size_t>(f.tellg());
-  std::vector<fcomplex> v(bytes / sizeof(fcomplex));
-  f.seekg(0);
-  f.read(reinterpret_cast<char*>(v.data()), bytes);
-  return v;
-}
+using namespace support::raw;
 
 class RangeFocTest : public ::testing::Test {
  protected:
-  void SetUp() override {
-    dir_ = std::filesystem::path(testing::TempDir()) /
-           ("rangefoc_" +
-            std::string(::testing::UnitTest::GetInstance()->current_test_info()->name()));
-    std::filesystem::create_directories(dir_);
-  }
-  void TearDown() override { std::filesystem::remove_all(dir_); }
-  std::string path(const char* name) const { return (dir_ / name).string(); }
-  std::filesystem::path dir_;
+  std::string path(const std::string& name) const { return dir_ / name; }
+  support::TempFolder dir_{"rangefoc"};
 };
 
 void checkFocused(const Scene& sc, const std::vector<fcomplex>& out, int O) {
@@ -79,7 +65,7 @@ TEST_F(RangeFocTest, PointEchoesFocusAtTheirSamplesAlignedToSwstMin) {
     const int V = sc.samples - sc.pulse.n() + 1;
     EXPECT_EQ(w.outSamples, V + sc.maxShift);
     EXPECT_EQ(w.outLines, sc.lines);
-    checkFocused(sc, readAll(path("rgfoc")), w.outSamples);
+    checkFocused(sc, support::readComplex(path("rgfoc")), w.outSamples);
   }
 
   // Against a direct correlation of one shifted line.
@@ -87,7 +73,7 @@ TEST_F(RangeFocTest, PointEchoesFocusAtTheirSamplesAlignedToSwstMin) {
   w.replica = replica.data();
   w.replicaLen = static_cast<int>(replica.size());
   ASSERT_EQ(rangefoc(sc.params(path("raw"), path("rgfoc")), w), 0);
-  const auto out = readAll(path("rgfoc"));
+  const auto out = support::readComplex(path("rgfoc"));
   const int l = 25, O = w.outSamples;
   const auto x = sc.line(l);
   for (int k : {0, 1, 150, 700, 1344}) {
@@ -117,7 +103,7 @@ TEST_F(RangeFocTest, InCoreMatchesTheFilePath) {
   ASSERT_EQ(rangefoc(p, wc), 0);
   ASSERT_EQ(dest_buffer(p, wc), 0);
   EXPECT_TRUE(wc.data.empty());
-  const auto a = readAll(path("file_out")), b = readAll(path("core_out"));
+  const auto a = support::readComplex(path("file_out")), b = support::readComplex(path("core_out"));
   ASSERT_EQ(a.size(), b.size());
   for (std::size_t i = 0; i < a.size(); ++i) ASSERT_LT(std::abs(a[i] - b[i]), 1e-3f) << i;
 }
@@ -156,6 +142,13 @@ TEST_F(RangeFocTest, FailuresAndLimits) {
     EXPECT_EQ(ws.outSamples, 1 + small.maxShift);
     small.samples = sc.pulse.n() - 1;
     EXPECT_EQ(rangefoc(small.params(path("small"), path("out")), ws), 1);
+  }
+  // A device that takes nothing: write failure, whatever the pass.
+  if (std::filesystem::exists("/dev/full")) {
+    for (int perBlock : {1, 8, 1000}) {
+      w.linesPerBlock = perBlock;
+      EXPECT_EQ(rangefoc(sc.params(path("raw"), "/dev/full"), w), STATUS_WRITE_FAILED) << perBlock;
+    }
   }
 }
 

@@ -9,22 +9,17 @@
 #include <vector>
 
 #include "product/general_sar.h"
-#include "synthetic_raw.h"
+#include "support/files.h"
+#include "support/scenes.h"
 
 namespace {
 
-using namespace synthetic_raw;
+using namespace support::raw;
 
 class RangeFocuserTest : public ::testing::Test {
  protected:
-  void SetUp() override {
-    dir_ = std::filesystem::path(testing::TempDir()) /
-           ("atrangefoc_" +
-            std::string(::testing::UnitTest::GetInstance()->current_test_info()->name()));
-    std::filesystem::create_directories(dir_);
-  }
-  void TearDown() override { std::filesystem::remove_all(dir_); }
-  std::string path(const char* name) const { return (dir_ / name).string(); }
+  std::string path(const std::string& name) const { return dir_ / name; }
+  support::TempFolder dir_{"rangefocuser"};
 
   // Raw raster of the scene with its record.
   void writeRaw(const Scene& sc, const std::string& raw, const char* imageType = "RAW DATA") {
@@ -56,17 +51,7 @@ class RangeFocuserTest : public ::testing::Test {
     ASSERT_EQ(rec.GSwrite(raw + ".hdr"), 0);
   }
 
-  std::filesystem::path dir_;
 };
-
-std::vector<fcomplex> readAll(const std::string& p) {
-  std::ifstream f(p, std::ios::binary | std::ios::ate);
-  const auto bytes = static_cast<std::size_t>(f.tellg());
-  std::vector<fcomplex> v(bytes / sizeof(fcomplex));
-  f.seekg(0);
-  f.read(reinterpret_cast<char*>(v.data()), bytes);
-  return v;
-}
 
 TEST_F(RangeFocuserTest, FocusesAlignsAndUpdatesTheRecord) {
   const Scene sc = makeScene();
@@ -84,7 +69,7 @@ TEST_F(RangeFocuserTest, FocusesAlignsAndUpdatesTheRecord) {
   EXPECT_EQ(f.getLinesToProcess(), sc.lines);
 
   const int n = sc.pulse.n(), V = sc.samples - n + 1, O = V + sc.maxShift;
-  const auto out = readAll(path("rgfoc"));
+  const auto out = support::readComplex(path("rgfoc"));
   ASSERT_EQ(out.size(), static_cast<std::size_t>(O) * sc.lines);
   for (int l = 0; l < sc.lines; ++l) {
     const fcomplex* row = &out[static_cast<std::size_t>(l) * O];
@@ -129,7 +114,7 @@ TEST_F(RangeFocuserTest, SkipAndProcessPercentagesAndTheRecordTimes) {
   EXPECT_NEAR(rec.roi.roi.SlowStartTime, 6.0e8 + 10 / 1679.9, 1e-6);
   EXPECT_NEAR(rec.swath.Acquisition_Start_Time, 6.0e8 + 10 / 1679.9, 1e-6);
   const int O = sc.samples - sc.pulse.n() + 1 + sc.maxShift;
-  const auto out = readAll(path("rgfoc"));
+  const auto out = support::readComplex(path("rgfoc"));
   ASSERT_EQ(out.size(), static_cast<std::size_t>(O) * 20);
   // Line 10 of the scene is the first output line: its peaks are in place.
   EXPECT_NEAR(std::abs(out[sc.targets[0].peak]), sc.pulse.n(), 1e-3 * sc.pulse.n());
@@ -190,19 +175,6 @@ TEST_F(RangeFocuserTest, ReplicaPriorityAndFailures) {
   writeRaw(sc, path("slc"), "AZIMUTH FOCUSED");
   f.RawData = path("slc");
   EXPECT_EQ(f.run(), 1);
-}
-
-TEST(RangeFocuserTable, ElementsInOrder) {
-  ATRangeFocuser f;
-  const char* names[] = {"Memory",     "ReportFilename", "ReportLevel", "Incore",
-                         "Verbose",    "RawData",        "ChirpFile",   "OutputFile",
-                         "DataToSkip", "DataToProcess",  "ChirpBuf",    "ChirpLen",
-                         "ChirpBand",  "ChirpFs"};
-  ASSERT_EQ(f.getNumberOfElements(), 14);
-  for (int i = 0; i < 14; ++i) EXPECT_EQ(f.getElement(i).getName(), names[i]);
-  EXPECT_EQ(f.getElement(10).getSize(), 0);  // the replica buffer is not persisted
-  EXPECT_EQ(f.Memory, 256);
-  EXPECT_EQ(f.ReportFilename, "ATRangeFocuser.report");
 }
 
 }  // namespace

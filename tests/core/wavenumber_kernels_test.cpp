@@ -56,16 +56,6 @@ TEST(PhaseRotation, LargeAndNonFiniteArgumentsFallBack) {
   EXPECT_TRUE(std::isnan(wk_sin(-std::numeric_limits<double>::infinity())));
 }
 
-TEST(PhaseRotation, RotateTurnsTheSampleByThePhase) {
-  const fcomplex x(3.0f, -4.0f);
-  const double phase = 123456.789;
-  const fcomplex y = wk_rotate(x, phase);
-  const std::complex<double> e = std::complex<double>(3.0, -4.0) * std::polar(1.0, phase);
-  EXPECT_NEAR(y.real(), e.real(), 2e-6);
-  EXPECT_NEAR(y.imag(), e.imag(), 2e-6);
-  EXPECT_NEAR(std::abs(y), 5.0f, 2e-6);
-}
-
 }  // namespace
 
 namespace {

@@ -6,42 +6,14 @@
 
 #include "diag/ckerr.h"
 #include "diag/report.h"
-#include "diag_fixture.h"
+#include "diag/ckerr.h"
+#include "diag/report.h"
+#include "support/files.h"
+
+using namespace support;
+using DiagEnvironment = WorkingFolderTest;
 
 using CheckedCalls = DiagEnvironment;
-
-TEST_F(CheckedCalls, StackDepthNamesAndAlignment) {
-  EXPECT_EQ(ckflg_ckerr(), 1);
-  EXPECT_EQ(ckerr_depth(), 0);
-  EXPECT_STREQ(ckerr_current_function(), "main()");
-  EXPECT_EQ(set_ckerr_fun("outer()"), 1);
-  {
-    CheckedCall inner("inner()");
-    EXPECT_EQ(ckerr_depth(), 2);
-    EXPECT_STREQ(ckerr_current_function(), "inner()");
-    void* p = malloc_ckerr(100);
-    ASSERT_NE(p, nullptr);
-    EXPECT_EQ(reinterpret_cast<std::uintptr_t>(p) % 16, 0u);
-    auto* z = static_cast<unsigned char*>(calloc_ckerr(10, 7));
-    ASSERT_NE(z, nullptr);
-    EXPECT_EQ(reinterpret_cast<std::uintptr_t>(z) % 16, 0u);
-    for (int i = 0; i < 70; ++i) EXPECT_EQ(z[i], 0);
-    EXPECT_EQ(ckerr_live_allocations(), 2);
-    freeall_ckerr();
-    EXPECT_EQ(ckerr_live_allocations(), 0);
-  }
-  EXPECT_EQ(ckerr_depth(), 1);
-  deccurdep();
-  EXPECT_EQ(ckerr_depth(), 0);
-  // Inactive layer: names are not pushed, memory is still released.
-  exit_ckerr();
-  EXPECT_EQ(ckflg_ckerr(), 0);
-  set_ckerr_fun("ignored()");
-  EXPECT_EQ(ckerr_depth(), 0);
-  void* loose = malloc_ckerr(8);
-  EXPECT_EQ(ckerr_live_allocations(), 0);
-  free_ckerr(loose);
-}
 
 TEST_F(CheckedCalls, FreeallReleasesOnlyWhatWasAllocatedBelowTheCurrentCall) {
   void* top = malloc_ckerr(16);  // allocated by main()
@@ -83,24 +55,6 @@ TEST_F(CheckedCalls, FreeallAfterSwapWithLastFindsAllEntriesOfTheCall) {
   deccurdep();
   free_ckerr(keep);
   EXPECT_EQ(ckerr_live_allocations(), 0);
-}
-
-TEST_F(CheckedCalls, MatrixAllocationAndRelease) {
-  set_ckerr_fun("matrix()");
-  void** m = matalloc_ckerr(5, 24);
-  ASSERT_NE(m, nullptr);
-  EXPECT_EQ(ckerr_live_allocations(), 6);
-  for (int r = 0; r < 5; ++r) {
-    ASSERT_NE(m[r], nullptr);
-    EXPECT_EQ(static_cast<char*>(m[r])[23], 0);
-  }
-  matfree_ckerr(m, 5);
-  EXPECT_EQ(ckerr_live_allocations(), 0);
-  void** bare = matalloc_ckerr(0, 24);
-  EXPECT_NE(bare, nullptr);
-  EXPECT_EQ(ckerr_live_allocations(), 1);
-  freeall_ckerr();
-  deccurdep();
 }
 
 TEST_F(CheckedCalls, FullTableAndDeepStackAreReportedNotCorrupted) {
@@ -148,22 +102,4 @@ TEST_F(CheckedCalls, ExitReportsLeaksWithTheirCallCoordinates) {
   ::testing::internal::CaptureStderr();
   exit_ckerr();
   EXPECT_EQ(::testing::internal::GetCapturedStderr(), "");
-}
-
-TEST_F(CheckedCalls, WriteDebugDumpsHeadAndCells) {
-  const float cells[6] = {1, 2, 3, 4, 5, 6};
-  const std::string file = path("dump.bin");
-  EXPECT_EQ(write_debug(file.c_str(), cells, 1, 3, 2), 0);
-  const std::string bytes = readText(file);
-  ASSERT_EQ(bytes.size(), 12u + 24u);
-  std::int32_t head[3];
-  std::memcpy(head, bytes.data(), 12);
-  EXPECT_EQ(head[0], 1);
-  EXPECT_EQ(head[1], 3);
-  EXPECT_EQ(head[2], 2);
-  EXPECT_EQ(std::memcmp(bytes.data() + 12, cells, 24), 0);
-  EXPECT_EQ(write_debug(file.c_str(), cells, 0, 1, 3), 0);  // complex cells: 8 bytes
-  EXPECT_EQ(readText(file).size(), 12u + 24u);
-  EXPECT_EQ(write_debug(file.c_str(), cells, 12, 1, 1), 10);
-  EXPECT_EQ(write_debug((working_ + "no/such/dir/x").c_str(), cells, 1, 1, 1), 9);
 }

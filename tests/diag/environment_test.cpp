@@ -1,15 +1,22 @@
 #include <gtest/gtest.h>
 
+#include <fstream>
+
 #include "base/status.h"
 #include "diag/environment.h"
 #include "diag/error_catalog.h"
 #include "diag/orvane_exception.h"
 #include "diag/parameter_lines.h"
-#include "diag_fixture.h"
+#include "diag/ckerr.h"
+#include "diag/report.h"
+#include "support/files.h"
+
+using namespace support;
+using DiagEnvironment = WorkingFolderTest;
 
 class EnvironmentBeforeInit : public DiagEnvironment {
  protected:
-  EnvironmentBeforeInit() { startEnvironment_ = false; }
+  EnvironmentBeforeInit() { startReports_ = false; }
 };
 using Environment = DiagEnvironment;
 
@@ -45,35 +52,6 @@ TEST_F(EnvironmentBeforeInit, VariablesDefaultsAndExceptionsBeforeTheEnvironment
   EXPECT_EQ(message, "AN ERROR OCCUR DURING Tessivor INIT  : [456963]");
 }
 
-TEST(OrvaneException, Constructors) {
-  orvaneException plain;
-  EXPECT_EQ(plain.getMessage(), "generic orvane exception.\n");
-  EXPECT_EQ(plain.getLine(), 0);
-  EXPECT_EQ(plain.getFunction(), "");
-  orvaneException where(42, "fun", "file.cpp");
-  EXPECT_EQ(where.getMessage(), "file.cpp: fun (42): exception found");
-  errno = EACCES;
-  orvaneException told(7, "g", "h.cpp", "told");
-  EXPECT_EQ(told.getMessage(), "told");
-  EXPECT_EQ(told.getErrorNumber(), EACCES);
-  orvaneException bare("bare");
-  EXPECT_EQ(bare.getLine(), -1);
-  EXPECT_EQ(bare.getFunction(), "UNKNOWN FUNCTION");
-  EXPECT_EQ(bare.getFile(), "UNKNOWN FILE");
-}
-
-TEST(ParameterLines, TrimCarriageReturnCommentAndMarker) {
-  const std::string file = ::testing::TempDir() + "tessivor_parameter_lines_" + std::to_string(getpid()) + ".txt";
-  std::ofstream(file, std::ios::binary) << "  first \r\n\n\tsecond\tpart \nx\ry\n   \n#cut\nafter\n";
-  std::vector<std::string> lines;
-  ASSERT_TRUE(readParameterLines(file, lines));
-  EXPECT_EQ(lines, (std::vector<std::string>{"first", "", "second\tpart", "x", ""}));
-  std::filesystem::remove(file);
-  EXPECT_FALSE(readParameterLines(file, lines));
-  EXPECT_EQ(cutAtTessivorMarker("a/job.txt###Tessivor###rest###Tessivor###"), "a/job.txt");
-  EXPECT_EQ(cutAtTessivorMarker("plain"), "plain");
-}
-
 TEST(ErrorCatalogue, ShippedCataloguesHoldEveryCodeOfTheProgram) {
   const int codes[] = {1,       130560,  261122,  261123,  326400,  456962,  456963,  848646,
                        1305601, 1305602, 1305603, 1305604, 1305605, 1305606, 1370881, 1370882,
@@ -106,7 +84,7 @@ TEST(ErrorCatalogue, ShippedCataloguesHoldEveryCodeOfTheProgram) {
 }
 
 TEST(ErrorCatalogue, LayoutAndItsFaults) {
-  const std::string file = ::testing::TempDir() + "tessivor_catalogue_" + std::to_string(getpid()) + ".des";
+  const std::string file = scratchDir("catalogue") + "catalogue.des";
   std::ofstream(file) << "2\n4, file\n7\nFILE\nJOB\nErrorCodeInfo_4\n1\nzero\nErrorCodeInfo_7\n"
                          "3\na\n\nc\n";
   ErrorCatalogue catalogue;
@@ -149,7 +127,7 @@ TEST_F(Environment, PhaseBannersAndSuccessfulClose) {
   logWrite("late\n");
   EXPECT_EQ(readText(path("Process.log")).find("late"), std::string::npos);
   // No dated copy of the trace for a successful run.
-  for (const auto& entry : std::filesystem::directory_iterator(dir_))
+  for (const auto& entry : std::filesystem::directory_iterator(working_))
     EXPECT_EQ(entry.path().filename().string().rfind("Tessivor_", 0), std::string::npos);
 }
 
@@ -180,7 +158,7 @@ TEST_F(Environment, FatalPathWritesErrorFileLogsAndDatedTrace) {
   const std::string error = readText(path("progress.txt_error"));
   EXPECT_EQ(error.rfind("FILE ACCESS ERROR\nFile not found.", 0), 0u);
   EXPECT_NE(error.find("\n/data/missing.txt\n [EC : 261122]\n"), std::string::npos);
-  EXPECT_FALSE(exists(path("progress.txt_tmp")));
+  EXPECT_FALSE(fs::exists(path("progress.txt_tmp")));
   const std::string log = readText(path("Process.log"));
   EXPECT_NE(log.find("\n\n Extraction [ERROR ID : 261122]\n  File not found."), std::string::npos);
   EXPECT_NE(log.find("[FILE ACCESS ERROR]\n  /data/missing.txt \n\n"), std::string::npos);
@@ -189,7 +167,7 @@ TEST_F(Environment, FatalPathWritesErrorFileLogsAndDatedTrace) {
   EXPECT_NE(trace.find("\nERROR : File not found."), std::string::npos);
   EXPECT_NE(trace.find("(/data/missing.txt) \n  Extraction   "), std::string::npos);
   int dated = 0;
-  for (const auto& entry : std::filesystem::directory_iterator(dir_)) {
+  for (const auto& entry : std::filesystem::directory_iterator(working_)) {
     const std::string name = entry.path().filename().string();
     if (name.rfind("Tessivor_", 0) == 0 && name.size() > 10 &&
         name.substr(name.size() - 10) == "_trace.txt") {
@@ -208,14 +186,14 @@ TEST_F(Environment, WarningFormGoesOn) {
   EXPECT_NE(readText(path("Process.log")).find("\nWARNING : [ERROR ID : 261122]A file was not found"),
             std::string::npos);
   EXPECT_NE(readText(path("Process.log")).find("FILE=f.cpp   LINE=9"), std::string::npos);
-  EXPECT_FALSE(exists(path("progress.txt_error")));
+  EXPECT_FALSE(fs::exists(path("progress.txt_error")));
 }
 
 TEST_F(Environment, ErrorFileForARasterAndItsLimits) {
   writeErrorFile(EC_STAGE_FAILED, std::string(3000, 'd') + "\n" + std::string(40, 'e'),
                  path("raster").c_str());
-  EXPECT_TRUE(exists(path("raster_hdr")));
-  EXPECT_TRUE(exists(path("raster.sml")));
+  EXPECT_TRUE(fs::exists(path("raster_hdr")));
+  EXPECT_TRUE(fs::exists(path("raster.sml")));
   const std::string error = readText(path("progress.txt_error"));
   std::string expected(1, '\n');
   expected.append(1023, 'd').append(1, '\n').append(40, 'e').append("\n [EC : 130560]\n");
@@ -227,25 +205,4 @@ TEST_F(Environment, ErrorFileForARasterAndItsLimits) {
   EXPECT_NE(cut.find("line 28\n [EC : 130560]\n"), std::string::npos);
   EXPECT_EQ(cut.find("line 29"), std::string::npos);
   EXPECT_NE(readText(path("Process.trace")).find("(aTotLen + aLen) ["), std::string::npos);
-}
-
-TEST_F(Environment, MoveFileSetTakesItsCompanions) {
-  for (const char* suffix : {"", "_hdr", ".hdr", ".sml", ".shp"}) writeText(path("src") + suffix, suffix);
-  writeText(path("dst"), "old");
-  writeText(path("dst_hdr"), "old");
-  moveFileSet(path("src"), path("dst"), true);
-  EXPECT_EQ(readText(path("dst")), "");
-  EXPECT_EQ(readText(path("dst_hdr")), "_hdr");
-  EXPECT_EQ(readText(path("dst.hdr")), ".hdr");
-  EXPECT_EQ(readText(path("dst.sml")), ".sml");
-  EXPECT_EQ(readText(path("dst.shp")), ".shp");
-  EXPECT_FALSE(exists(path("dst.shx")));
-  EXPECT_FALSE(exists(path("src.hdr")));
-  writeText(path("bare"), "x");
-  moveFileSet(path("bare"), path("moved"), false);
-  EXPECT_EQ(readText(path("moved")), "x");
-  moveFileSet(path("absent"), path("moved2"), true);
-  EXPECT_FALSE(exists(path("moved2")));
-  EXPECT_NE(readText(path("Process.trace")).find("Not found : " + path("absent_hdr")),
-            std::string::npos);
 }

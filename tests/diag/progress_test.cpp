@@ -3,7 +3,12 @@
 #include "base/status.h"
 #include "diag/environment.h"
 #include "diag/waitbar.h"
-#include "diag_fixture.h"
+#include "diag/ckerr.h"
+#include "diag/report.h"
+#include "support/files.h"
+
+using namespace support;
+using DiagEnvironment = WorkingFolderTest;
 
 using Progress = DiagEnvironment;
 
@@ -13,29 +18,14 @@ TEST_F(Progress, PercentageIsCappedAndTheBatchFlagRemoved) {
   writeText(file, "12\nreading the leader\n");
   EXPECT_TRUE(getAndSetPerc(12, 100, nullptr));
   EXPECT_EQ(readText(file), "99\nreading the leader\n");
-  EXPECT_FALSE(exists(path("progress.txt_batch_ok")));
+  EXPECT_FALSE(fs::exists(path("progress.txt_batch_ok")));
   EXPECT_TRUE(getAndSetPerc(99, 5, "range focusing"));
   EXPECT_EQ(readText(file), "5\nrange focusing\n");
   // The same percentage writes nothing, whatever the message.
   writeText(path("progress.txt_batch_ok"), "");
   EXPECT_TRUE(getAndSetPerc(5, 5, "ignored"));
   EXPECT_EQ(readText(file), "5\nrange focusing\n");
-  EXPECT_TRUE(exists(path("progress.txt_batch_ok")));
-}
-
-TEST_F(Progress, MissingFileIsCreatedAndTheOperatorStopIsSeen) {
-  const std::string file = path("progress.txt");
-  EXPECT_TRUE(getAndSetPerc(0, 7, "start"));
-  EXPECT_EQ(readText(file), "7\nstart\n");
-  EXPECT_NE(readText(path("Process.trace")).find("getAndSetPerc - Not found the file : " + file),
-            std::string::npos);
-  writeText(file, "101\nstop please\n");
-  EXPECT_FALSE(getAndSetPerc(7, 8, nullptr));
-  EXPECT_FALSE(getAndSetPerc(8, 8, nullptr));
-  EXPECT_EQ(readText(file), "101\nstop please\n");
-  writeText(file, "100\n\n");
-  EXPECT_TRUE(getAndSetPerc(8, 9, nullptr));
-  EXPECT_EQ(readText(file), "9\n\n");
+  EXPECT_TRUE(fs::exists(path("progress.txt_batch_ok")));
 }
 
 TEST_F(Progress, WaitbarClampsAndSkipsRepeatedPercentages) {
@@ -51,14 +41,4 @@ TEST_F(Progress, WaitbarClampsAndSkipsRepeatedPercentages) {
   EXPECT_EQ(waitbar_update(0, 250.0f), 0);
   EXPECT_EQ(readText(file), "99\nhost text\n");
   EXPECT_EQ(waitbar_close(), 0);
-}
-
-TEST_F(Progress, OperatorStopEndsTheRunWith326400) {
-  writeText(path("progress.txt"), "101\n\n");
-  EXPECT_EXIT(waitbar_update(0, 50.0f), ::testing::ExitedWithCode(EC_INTERRUPTED & 0xFF),
-              "ERROR 326400");
-  EXPECT_NE(readText(path("Process.trace")).find("\n EXECUTION INTERRUPTED BY OPERATOR\n"),
-            std::string::npos);
-  EXPECT_NE(readText(path("progress.txt_error")).find("[EC : 326400]"), std::string::npos);
-  EXPECT_NE(readText(path("Process.log")).find("[ERROR ID : 326400]"), std::string::npos);
 }

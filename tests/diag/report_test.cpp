@@ -2,7 +2,12 @@
 
 #include "base/status.h"
 #include "diag/report.h"
-#include "diag_fixture.h"
+#include "diag/ckerr.h"
+#include "diag/report.h"
+#include "support/files.h"
+
+using namespace support;
+using DiagEnvironment = WorkingFolderTest;
 
 using Reports = DiagEnvironment;
 
@@ -49,7 +54,7 @@ TEST_F(Reports, FlagZeroLosesReportsAndFatalLevelsDoNotEnd) {
   orv_add_report("no XCA", REPORT_XCA_MISSING, 2, "fun", "f.cpp");
   EXPECT_EQ(report_count(), before);
   EXPECT_EQ(readText(path("Process.trace")).find("lost"), std::string::npos);
-  EXPECT_FALSE(exists(path("progress.txt_error")));
+  EXPECT_FALSE(fs::exists(path("progress.txt_error")));
   // A flag already set stays; an inactive layer switches reports off.
   set_flg_report(2);
   init_report(0, "x", 1);

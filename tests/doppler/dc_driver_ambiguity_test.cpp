@@ -9,10 +9,12 @@
 #include <vector>
 
 #include "doppler/dc_driver.h"
-#include "doppler/dc_scene.h"
+#include "support/files.h"
+#include "support/scenes.h"
 #include "product/profile.h"
 
-using namespace dc_scene;
+using namespace support::clutter;
+using support::scratchDir;
 
 namespace {
 
@@ -24,10 +26,10 @@ constexpr double kTrue = 1.3;
 class DcDriverAmbiguity : public ::testing::Test {
  protected:
   static void SetUpTestSuite() {
-    dir_ = new std::string(tempDir("amb"));
+    dir_ = new std::string(scratchDir("amb"));
     const Radar rd;
     ASSERT_TRUE(writeRaster(*dir_ + "/scene.rgfoc",
-                            makeChirpedClutter(rd, kTrue, kSamples, kLines, 10.0, 21, 60, 300.0)));
+                            makeClutter(rd, kTrue, kSamples, kLines, 10.0, 21, 60, 300.0)));
   }
   static void TearDownTestSuite() {
     std::filesystem::remove_all(*dir_);
@@ -177,7 +179,7 @@ TEST_F(DcDriverAmbiguity, GeometryOrNothingGivesTheAmbiguity) {
 // Several centroids and clutter draws with the full ERS block counts.
 TEST(HeavyDcDriverAmbiguity, MlbfOverCentroidsAndDraws) {
   const Radar rd;
-  const std::string dir = tempDir("amb_heavy");
+  const std::string dir = scratchDir("amb_heavy");
   struct Case {
     double dc;
     unsigned seed;
@@ -186,7 +188,7 @@ TEST(HeavyDcDriverAmbiguity, MlbfOverCentroidsAndDraws) {
   for (const Case c : {Case{1.3, 31, 1}, Case{-0.7, 32, -1}, Case{2.4, 33, 2}, Case{1.3, 34, 1}}) {
     SCOPED_TRACE(c.seed);
     const std::string path = dir + "/scene.rgfoc";
-    ASSERT_TRUE(writeRaster(path, makeChirpedClutter(rd, c.dc, kSamples, kLines, 10.0, c.seed, 60, 300.0)));
+    ASSERT_TRUE(writeRaster(path, makeClutter(rd, c.dc, kSamples, kLines, 10.0, c.seed, 60, 300.0)));
     DcEstState st = ersState(rd);
     st.blocks = 256;
     st.blockl = 2048;

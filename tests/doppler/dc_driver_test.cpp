@@ -8,10 +8,12 @@
 #include <vector>
 
 #include "doppler/dc_driver.h"
-#include "doppler/dc_scene.h"
+#include "support/files.h"
+#include "support/scenes.h"
 #include "product/profile.h"
 
-using namespace dc_scene;
+using namespace support::clutter;
+using support::scratchDir;
 
 namespace {
 
@@ -44,7 +46,7 @@ double worstFractionalError(const double poly[7], const Radar& rd, const Centroi
 TEST(DcDriver, FractionalCentroidVaryingInRangeAndAzimuth) {
   const Radar rd;
   const int ns = 512, nl = 4096;
-  const std::string dir = tempDir("frac");
+  const std::string dir = scratchDir("frac");
   // Second case crosses the wrap at 1/2 and comes from a big-endian file.
   const Centroid cases[] = {{0.18, 0.15 / ns, 0.10 / nl}, {0.62, -0.2 / ns, 0.08 / nl}};
   for (int c = 0; c < 2; ++c) {
@@ -105,67 +107,6 @@ TEST(DcDriver, FractionalCentroidVaryingInRangeAndAzimuth) {
   std::filesystem::remove_all(dir);
 }
 
-TEST(DcDriver, BinEstimatesMatchTheClutterStatistics) {
-  const Radar rd;
-  const int ns = 256, nl = 2048;
-  const Centroid dc{-0.27, 0.0, 0.0};
-  const std::vector<fcomplex> data = makeVaryingClutter(rd, dc, ns, nl, 10.0, 3);
-  DcEstState st = ersState(rd);
-  DcEstInput in = inputFor(rd, "", "", ns, nl);
-  st.inMemory = 1;
-  st.data = data.data();
-  ASSERT_EQ(setprocbuf(in, st), 0);
-  ASSERT_EQ(dcTheoreticAutocorrelation(in, st), 0);
-  EXPECT_DOUBLE_EQ(st.r0, 2.0 / 3.0);
-  const double x = 2.0 * 7100.0 / (10.0 * 1680.0);
-  EXPECT_NEAR(st.r1, 2.0 / 3.0 - x * x + x * x * x / 2.0, 1e-15);
-  ASSERT_EQ(getnadcbins(in, st), 0);
-  ASSERT_EQ(st.nBins, 4 * 8);
-  double power = 0.0, noise = 0.0;
-  for (const DcBin& b : st.bins) {
-    ASSERT_EQ(b.valid, 1);
-    EXPECT_NEAR(b.dcWrapped, -0.27, 0.01);
-    // Gaussian clutter: fourth moment twice the squared power.
-    EXPECT_NEAR(b.contrast, 2.0, 0.1);
-    power += b.power;
-    noise += b.noise;
-  }
-  // Power over noise is (S + N) / N = 11 at 10 dB, on average over the bins
-  // (one bin's noise is a small difference of large sums).
-  EXPECT_NEAR(power / noise, 11.0, 1.0);
-  // The contrast map holds the same statistic, cell by cell.
-  ASSERT_EQ(st.cmWidth, ns / 8);
-  ASSERT_EQ(st.cmHeight, nl / 32);
-  const float mid = st.contrastMap[size_t(st.cmHeight / 2) * st.cmWidth + st.cmWidth / 2];
-  EXPECT_NEAR(mid, 2.0, 0.15);
-
-  // The same raster from a file behind a 96-byte header gives the same bins,
-  // and lines past the last whole bin row are left out.
-  const std::string dir = tempDir("bins");
-  std::vector<fcomplex> longer(12, fcomplex(-7.0f, 7.0f));
-  longer.insert(longer.end(), data.begin(), data.end());
-  longer.resize(longer.size() + size_t(ns) * 100, fcomplex(100.0f, 0.0f));
-  ASSERT_TRUE(writeRaster(dir + "/r", longer));
-  DcEstState sf = ersState(rd);
-  sf.memory = int64_t(ns) * 256 * 8 * 3;  // three bin rows per read, the last read short
-  DcEstInput fin = inputFor(rd, dir + "/r", dir, ns, nl + 100);
-  fin.headerOffset = 12 * 8;
-  ASSERT_EQ(setprocbuf(fin, sf), 0);
-  EXPECT_EQ(fin.lines, nl);
-  EXPECT_EQ(sf.rowsPerRead, 3);
-  ASSERT_EQ(dcTheoreticAutocorrelation(fin, sf), 0);
-  ASSERT_EQ(getnadcbins(fin, sf), 0);
-  ASSERT_EQ(sf.bins.size(), st.bins.size());
-  for (size_t i = 0; i < st.bins.size(); ++i) {
-    EXPECT_EQ(sf.bins[i].range, st.bins[i].range);
-    EXPECT_EQ(sf.bins[i].line, st.bins[i].line);
-    EXPECT_EQ(sf.bins[i].dcWrapped, st.bins[i].dcWrapped);
-    EXPECT_EQ(sf.bins[i].power, st.bins[i].power);
-  }
-  EXPECT_EQ(sf.contrastMap, st.contrastMap);
-  std::filesystem::remove_all(dir);
-}
-
 TEST(DcDriver, BinRejectsUncorrelatedAndEmptyBlocks) {
   DcEstState st = ersState(Radar{});
   st.blocks = 4;
@@ -195,43 +136,9 @@ TEST(DcDriver, BinRejectsUncorrelatedAndEmptyBlocks) {
   EXPECT_EQ(b.valid, 0);
 }
 
-TEST(DcDriver, ContrastMapSmoothingAndMargins) {
-  DcEstState st;
-  st.blocks = 32;  // row window 32 / 4 / 4 + 1 = 3 cells
-  st.patchs = 4;
-  st.blockl = 16;  // column window 16 / 4 / 2 + 1 = 3 cells
-  st.patchl = 2;
-  st.dswst = 4;    // margin of one cell
-  st.cmWidth = 6;
-  st.cmHeight = 4;
-  st.contrastPow.assign(24, 1.0f);
-  st.contrastMap.assign(24, 2.0f);
-  ASSERT_EQ(getcontrast(st), 0);
-  auto at = [&](int y, int x) { return st.contrastMap[size_t(y) * 6 + x]; };
-  // Columns 0, 1 and 5 lie in the margin.
-  for (int y = 0; y < 4; ++y) {
-    EXPECT_EQ(at(y, 0), 0.0f);
-    EXPECT_EQ(at(y, 1), 0.0f);
-    EXPECT_EQ(at(y, 5), 0.0f);
-  }
-  // Interior rows: both maps keep their level, contrast 2 / 1.
-  EXPECT_FLOAT_EQ(at(1, 2), 2.0f);
-  EXPECT_FLOAT_EQ(at(2, 3), 2.0f);
-  // Edge rows: the cut window keeps the full divisor, so both maps fall to
-  // 2/3 of their level and the contrast rises to 2 (2/3) / (2/3)^2 = 3.
-  EXPECT_FLOAT_EQ(at(0, 3), 3.0f);
-  EXPECT_FLOAT_EQ(at(3, 4), 3.0f);
-  EXPECT_FLOAT_EQ(st.contrastPow[4], 2.0f / 3.0f);  // row 0, column 4
-  // A cell of zero power gives 0.
-  st.contrastPow.assign(24, 0.0f);
-  st.contrastMap.assign(24, 2.0f);
-  ASSERT_EQ(getcontrast(st), 0);
-  for (float v : st.contrastMap) EXPECT_EQ(v, 0.0f);
-}
-
 TEST(DcDriver, FailuresEndWithTheirStatuses) {
   const Radar rd;
-  const std::string dir = tempDir("fail");
+  const std::string dir = scratchDir("fail");
   double poly[7];
   auto run = [&](const std::vector<fcomplex>& data, int ns, int nl, DcEstState st) {
     const std::string path = dir + "/r";
@@ -275,53 +182,5 @@ TEST(DcDriver, FailuresEndWithTheirStatuses) {
     DcEstInput in = inputFor(rd, path, dir + "/no/such/dir", 512, 1024);
     EXPECT_EQ(getnadcpoly(in, st, poly), 9);
   }
-  std::filesystem::remove_all(dir);
-}
-
-TEST(DcDriver, VerboseRunFromMemoryPrintsStepsAndPolynomial) {
-  const Radar rd;
-  const int ns = 512, nl = 1024;
-  const std::vector<fcomplex> data =
-      makeVaryingClutter(rd, Centroid{0.1, 0.1 / ns, 0.0}, ns, nl, 10.0, 8);
-  const std::string dir = tempDir("verbose");
-  DcEstState st = ersState(rd);
-  st.verbose = 1;
-  st.inMemory = 1;
-  st.data = data.data();
-  // No file may be opened: the path does not exist.
-  DcEstInput in = inputFor(rd, dir + "/absent", dir, ns, nl);
-  double poly[7] = {};
-  testing::internal::CaptureStdout();
-  const int status = getnadcpoly(in, st, poly);
-  const std::string out = testing::internal::GetCapturedStdout();
-  ASSERT_EQ(status, 0) << out;
-  const size_t a = out.find("* Setting Processable Buffer\n");
-  const size_t b = out.find("* Calculating first two samples of theoretic autocorrelation\n");
-  const size_t c = out.find("* Getting bins for polynomial estimation\n");
-  const size_t d = out.find("* Polynomial estimation\n");
-  ASSERT_NE(a, std::string::npos);
-  EXPECT_LT(a, b);
-  EXPECT_LT(b, c);
-  EXPECT_LT(c, d);
-  ASSERT_NE(d, std::string::npos);
-  const char* formats[7] = {"Constant term [Hz]: ............. %e\n",
-                            "I range [Hz/s]: ................. %e\n",
-                            "I azimuth [Hz/s]: ............... %e\n",
-                            "I range * I azimuth [Hz/s^2]: ... %e\n",
-                            "II range [Hz/s^2]: .............. %e\n",
-                            "III range [Hz/s^3]: ............. %e\n",
-                            "IV range [Hz/s^4]: .............. %e\n"};
-  size_t last = d;
-  for (int i = 0; i < 7; ++i) {
-    char line[128];
-    std::snprintf(line, sizeof line, formats[i], poly[i]);
-    const size_t at = out.find(line);
-    ASSERT_NE(at, std::string::npos) << line;
-    EXPECT_GT(at, last);
-    last = at;
-  }
-  // The read buffer is never allocated for a raster in memory.
-  EXPECT_TRUE(st.readBuf.empty());
-  EXPECT_TRUE(std::filesystem::exists(dir + "/DCEST_resume.txt"));
   std::filesystem::remove_all(dir);
 }

@@ -8,9 +8,12 @@
 #include <random>
 #include <set>
 
-#include "doppler/dc_estimators_synthetic.h"
+#include "support/files.h"
+#include "support/scenes.h"
 
 namespace {
+
+using namespace support::clutter;
 
 double meanOf(const std::vector<double>& v) {
   return std::accumulate(v.begin(), v.end(), 0.0) / static_cast<double>(v.size());
@@ -38,47 +41,6 @@ TEST(DcHistogram, BinsRoundHalfAwayFromZero) {
   EXPECT_EQ(std::accumulate(hist.begin(), hist.end(), 0), 3);
 
   EXPECT_NE(make_hist(same, 0, &step, &min, hist.data(), 11), 0);
-}
-
-TEST(DcHistogram, QuickSortCarriesIndices) {
-  std::mt19937 rng(3);
-  std::uniform_int_distribution<int> d(0, 40);  // many duplicates
-  for (int n : {1, 2, 7, 500}) {
-    std::vector<float> keys(n), orig(n);
-    std::vector<int> idx(n);
-    for (int i = 0; i < n; ++i) {
-      keys[i] = orig[i] = static_cast<float>(d(rng));
-      idx[i] = i;
-    }
-    my_qsort(0, n - 1, keys.data(), idx.data());
-    EXPECT_TRUE(std::is_sorted(keys.begin(), keys.end()));
-    std::set<int> seen(idx.begin(), idx.end());
-    EXPECT_EQ(static_cast<int>(seen.size()), n);
-    for (int i = 0; i < n; ++i) EXPECT_EQ(keys[i], orig[idx[i]]);
-  }
-}
-
-TEST(DcBlockSelection, NoOverlapDropsBorderAndNeighbours) {
-  // 20 x 10 map, spacing 4 x 2: a box centred on (x, y) spans x - 2 .. x + 2.
-  int x[] = {10, 1, 2, 11, 14, 19, 16, 10};
-  int y[] = {5, 5, 0, 6, 5, 9, 5, 2};
-  const int kept = sel_no_overlap(x, y, 8, 20, 10, 4.0, 2.0);
-  // (10,5) kept; (1,5) left border; (2,0) top border; (11,6) overlaps the
-  // first; (14,5) is 4 apart in x: kept; (19,9) right border (19-2+4 > 20);
-  // (16,5) overlaps (14,5); (10,2) is 3 apart in y: kept.
-  EXPECT_EQ(kept, 3);
-  const int expectX[] = {10, -1, -1, -1, 14, -1, -1, 10};
-  for (int i = 0; i < 8; ++i) EXPECT_EQ(x[i], expectX[i]) << i;
-  // Boxes touching the far borders are inside: (18,9) spans up to 20 x 10.
-  int bx[] = {18, 2};
-  int by[] = {9, 1};
-  EXPECT_EQ(sel_no_overlap(bx, by, 2, 20, 10, 4.0, 2.0), 2);
-  // Odd spacing: the distance limit is ceil(3.5) = 4 cells.
-  int ox[] = {5, 8, 9};
-  int oy[] = {5, 5, 5};
-  EXPECT_EQ(sel_no_overlap(ox, oy, 3, 20, 10, 3.5, 2.0), 2);
-  EXPECT_EQ(ox[1], -1);
-  EXPECT_EQ(ox[2], 9);
 }
 
 TEST(DcBlockSelection, TopPointsAreHighestAndClearOfTheBorder) {
@@ -136,51 +98,13 @@ TEST(DcBlockSelection, TopPointsAreHighestAndClearOfTheBorder) {
   EXPECT_EQ(found, 0);
 }
 
-TEST(DcMlbf, SetUpChecksAndLookDistances) {
-  ClutterScene sc;
-  DcEstState st = ersLikeState(sc);
-  multimlbf_close();
-  wdar_close();
-  EXPECT_EQ(multimlbf(st, 0), 1);
-  EXPECT_EQ(wdar(st, std::array<double, 7>{}.data(), 0), -1);
-
-  st.fLength = 20;
-  testing::internal::CaptureStdout();
-  ASSERT_EQ(multimlbf_init(st), 0);
-  const std::string out = testing::internal::GetCapturedStdout();
-  EXPECT_EQ(st.fLength, 21);
-  EXPECT_NE(out.find("\nWARNING from mlbf_init(): Remez filter length must be odd. Filter length is set to : 21."),
-            std::string::npos);
-  ASSERT_EQ(st.lookDist.size(), 8u);
-  EXPECT_NEAR(st.lookDist.front(), 2 * 0.25 * 0.72, 1e-12);
-  EXPECT_NEAR(st.lookDist.back(), 0.75 * 0.72, 1e-12);
-  for (int i = 1; i < 8; ++i)
-    EXPECT_NEAR(st.lookDist[i] - st.lookDist[i - 1], (0.75 * 0.72 - 0.36) / 7, 1e-12);
-
-  // Empty search window.
-  st.maxAmb = st.minAmb;
-  EXPECT_EQ(chirpZ_init(st), 10);
-  EXPECT_FALSE(multimlbf_ready());
-  multimlbf_close();
-
-  st.nMlbf = 1;
-  ASSERT_EQ(multimlbf_init(st), 0);
-  ASSERT_EQ(st.lookDist.size(), 1u);
-  EXPECT_NEAR(st.lookDist[0], 2 * 0.25 * 0.72, 1e-12);
-  multimlbf_close();
-
-  st.nMlbf = 0;
-  EXPECT_EQ(multimlbf_init(st), 10);
-  EXPECT_FALSE(multimlbf_ready());
-}
-
 // Runs both estimators on one synthetic block of the given centroid.
 void runBlock(double dcPrf, std::vector<double>& mlbf, double& wdarValue) {
   ClutterScene sc;
   sc.dcPrf = dcPrf;
   sc.points = 20;
   sc.pointAmp = 300.0;
-  DcEstState st = ersLikeState(sc);
+  DcEstState st = ersState(sc, 256, 2048);
   st.blockBuf = makeClutter(sc, st.blocks, st.blockl);
   st.mlbfBlocks.assign(1, MlbfBlock{});
   st.wdarBlocks.assign(1, WdarBlock{});

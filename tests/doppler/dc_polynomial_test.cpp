@@ -12,10 +12,13 @@
 
 #include "doppler/dc_driver.h"
 #include "doppler/dc_estimators.h"
-#include "doppler/dc_estimators_synthetic.h"
+#include "support/files.h"
+#include "support/scenes.h"
 #include "product/byte_order.h"
 
 namespace {
+
+using namespace support::clutter;
 
 constexpr double kPrf = 1680.0;
 constexpr double kFs = 18.96e6;
@@ -178,92 +181,6 @@ TEST(DcPolynomial, TooFewValidBinsStopTheFit) {
   EXPECT_EQ(dcnapoly(none.input, none.st, poly), 1);
 }
 
-TEST(DcPolynomial, SnrMaskAndFilling) {
-  const double truth[7] = {0.25, 0, 0, 0, 0, 0, 0};
-  {
-    // Mean noise not positive: every bin is kept with the fixed ratios.
-    BinScene s(truth);
-    for (DcBin& b : s.st.bins) b.noise = -0.5;
-    s.st.bins[20].power = 0.1;  // would be masked with a positive noise
-    s.st.bins[20].dcWrapped = 0.4;
-    s.st.bins[21].valid = 0;
-    s.st.bins[21].dcWrapped = -0.3;
-    s.st.bins[21].contrast = 0.0;
-    double poly[7];
-    ASSERT_EQ(dcnapoly(s.input, s.st, poly), 0);
-    EXPECT_EQ(s.st.bins[0].snr, 1e10);
-    EXPECT_EQ(s.st.bins[20].snr, 1e10);
-    EXPECT_EQ(s.st.bins[20].dcWrapped, 0.4);
-    EXPECT_EQ(s.st.bins[21].snr, 0.001);
-    // The invalid bin takes phase and contrast of its nearest valid bin (the
-    // left neighbour, first of the two at equal distance).
-    EXPECT_EQ(s.st.bins[21].dcWrapped, 0.4);
-    EXPECT_EQ(s.st.bins[21].contrast, 2.0);
-  }
-  {
-    // Positive noise: a bin below the mean noise takes the means of its
-    // neighbours within two bins (the window grows past the adjacent ones).
-    BinScene s(truth);
-    std::mt19937 rng(5);
-    std::uniform_real_distribution<double> u(-0.1, 0.1);
-    for (DcBin& b : s.st.bins) {
-      b.dcWrapped = 0.25 + u(rng);
-      b.power = 2.0 + 10 * u(rng);
-    }
-    const int i = 3 * 16 + 5;  // interior bin
-    s.st.bins[i].power = 0.5;
-    // Expected means over the 8 neighbours, before the fit touches anything.
-    double mdc = 0.0, msnr = 0.0;
-    for (int dy = -1; dy <= 1; ++dy)
-      for (int dx = -1; dx <= 1; ++dx) {
-        if (!dx && !dy) continue;
-        const DcBin& o = s.st.bins[i + dy * 16 + dx];
-        mdc += o.dcWrapped;
-        msnr += (o.power - 1.0) / 1.0;
-      }
-    double poly[7];
-    ASSERT_EQ(dcnapoly(s.input, s.st, poly), 0);
-    EXPECT_NEAR(s.st.bins[i].dcWrapped, mdc / 8, 1e-12);
-    EXPECT_NEAR(s.st.bins[i].snr, msnr / 8, 1e-12);
-    EXPECT_NEAR(s.st.bins[0].snr, s.st.bins[0].power - 1.0, 1e-12);
-  }
-}
-
-TEST(DcPolynomial, PhaseVarianceOfTheBins) {
-  const double alpha = 2.0 * 7100.0 / (10.0 * kPrf);
-  const double v1 = dcPhaseVariance(10.0, 1000.0, alpha);
-  // Inverse of the number of looks.
-  EXPECT_NEAR(dcPhaseVariance(10.0, 4000.0, alpha), v1 / 4.0, 1e-12 * v1);
-  // Decreasing with SNR, towards a finite floor.
-  const double v01 = dcPhaseVariance(0.1, 1000.0, alpha);
-  const double v1e3 = dcPhaseVariance(1e3, 1000.0, alpha);
-  const double v1e10 = dcPhaseVariance(1e10, 1000.0, alpha);
-  EXPECT_GT(v01, v1);
-  EXPECT_GT(v1, v1e3);
-  EXPECT_GT(v1e3, v1e10);
-  EXPECT_GT(v1e10, 0.0);
-  EXPECT_NEAR(v1e3, v1e10, 0.01 * v1e10);
-  // Against a fine midpoint sum of 1 / (n 16 pi^2 integral((S'/S)^2 / 16 pi^2)).
-  const double r0 = dcBspline3(0.0), r1 = dcBspline3(alpha), r2 = dcBspline3(2 * alpha);
-  const int m = 200000;
-  double sum = 0.0;
-  for (int i = 0; i < m; ++i) {
-    const double v = (i + 0.5) / m, a = 2 * M_PI * v;
-    const double s = r0 * 1.1 + 2 * r1 * std::cos(a) + 2 * r2 * std::cos(2 * a);
-    const double d = 4 * M_PI * (r1 * std::sin(a) + 2 * r2 * std::sin(2 * a));
-    sum += (d / s) * (d / s) / m;
-  }
-  EXPECT_NEAR(v1, 1.0 / (1000.0 * sum), 1e-5 * v1);
-  // Low SNR, high SNR: the standard deviation of a 2048 x 256 bin at 10 dB
-  // is a small fraction of the PRF.
-  EXPECT_LT(std::sqrt(dcPhaseVariance(10.0, 2048.0 * 256 / 2, alpha)), 0.01);
-
-  testing::internal::CaptureStdout();
-  EXPECT_EQ(dcPhaseVariance(-1.0, 1000.0, alpha), 1e6);
-  EXPECT_NE(testing::internal::GetCapturedStdout().find("function getkrstd(): anomalous FAILURE (snr=-1.000000) <=="),
-            std::string::npos);
-}
-
 TEST(DcRobustMean, PercentilesAndTrimming) {
   std::vector<double> v(101);
   for (int i = 0; i <= 100; ++i) v[i] = i;
@@ -300,109 +217,8 @@ TEST(DcRobustMean, PercentilesAndTrimming) {
 
 class DcBlockFile : public testing::Test {
  protected:
-  void SetUp() override {
-    dir_ = std::filesystem::path(testing::TempDir()) /
-           ("dc_block_" + std::to_string(::getpid()) + "_" +
-            testing::UnitTest::GetInstance()->current_test_info()->name());
-    std::filesystem::create_directories(dir_);
-  }
-  void TearDown() override { std::filesystem::remove_all(dir_); }
-  std::filesystem::path dir_;
+  support::TempFolder dir_{"dc_block"};
 };
-
-TEST_F(DcBlockFile, ReadsBlocksFromFileAndMemory) {
-  const int ns = 40, nl = 30;
-  std::vector<fcomplex> raster(ns * nl);
-  for (int l = 0; l < nl; ++l)
-    for (int s = 0; s < ns; ++s) raster[l * ns + s] = fcomplex(s + 0.25f, -l - 0.5f);
-  // Big-endian file with a 16-byte header.
-  const std::string path = (dir_ / "raster.bin").string();
-  {
-    std::ofstream f(path, std::ios::binary);
-    const char header[16] = {};
-    f.write(header, 16);
-    for (const fcomplex& v : raster) {
-      float p[2] = {v.real(), v.imag()};
-      for (float x : p) {
-        unsigned char b[4];
-        std::memcpy(b, &x, 4);
-        if (get_endian() != kMsbFirst) std::swap(b[0], b[3]), std::swap(b[1], b[2]);
-        f.write(reinterpret_cast<char*>(b), 4);
-      }
-    }
-  }
-  DcEstInput in;
-  in.rasterFile = path;
-  in.samples = ns;
-  in.lines = nl;
-  in.byteOrder = 1;
-  in.headerOffset = 16;
-  DcEstState st;
-  st.blocks = 8;
-  st.blockl = 6;
-  ASSERT_EQ(read_block(st, in, 20, 30), 0);
-  for (int l = 0; l < 6; ++l)
-    for (int s = 0; s < 8; ++s) EXPECT_EQ(st.blockBuf[l * 8 + s], raster[(20 + l) * ns + 30 + s]);
-
-  DcEstState mem = st;
-  mem.inMemory = 1;
-  mem.data = raster.data();
-  mem.blockBuf.clear();
-  DcEstInput nofile = in;
-  nofile.rasterFile = "/nonexistent/raster.bin";
-  ASSERT_EQ(read_block(mem, nofile, 24, 32), 0);
-  EXPECT_EQ(mem.blockBuf[0], raster[24 * ns + 32]);
-  EXPECT_EQ(mem.blockBuf[47], raster[29 * ns + 39]);
-
-  // Outside the raster, missing file, truncated file.
-  EXPECT_EQ(read_block(st, in, 25, 0), 1);
-  EXPECT_EQ(read_block(st, in, 0, 33), 1);
-  EXPECT_EQ(read_block(st, in, -1, 0), 1);
-  EXPECT_EQ(read_block(st, nofile, 0, 0), 9);
-  std::filesystem::resize_file(path, 16 + 8 * ns * 10);
-  EXPECT_EQ(read_block(st, in, 8, 0), 4);
-  EXPECT_EQ(read_block(st, in, 0, 0), 0);
-}
-
-TEST(DcAmbiguityEstimate, FlagsWithoutBlockProcessing) {
-  DcEstInput in;
-  in.samples = 1024;
-  in.lines = 8192;
-  in.prf = kPrf;
-  in.rasterFile = "/nonexistent/raster";
-  DcEstState st;
-  st.nBest = 0;  // would stop mode 1; modes 0 and 2 never look at blocks
-  const double poly[7] = {0.3, 0, 0, 0, 0, 0, 0};
-
-  st.ambFlag = 0;
-  st.ambiguity = 5;
-  st.geomDoppler = 1.3 * kPrf;
-  EXPECT_EQ(estambiguity(st, in, poly), 0);
-  EXPECT_EQ(st.ambiguity, 0);
-  EXPECT_EQ(st.geomAmbiguity, 1);
-
-  st.ambFlag = 2;
-  EXPECT_EQ(estambiguity(st, in, poly), 0);
-  EXPECT_EQ(st.ambiguity, 1);
-  st.geomDoppler = -0.7 * kPrf;
-  EXPECT_EQ(estambiguity(st, in, poly), 0);
-  EXPECT_EQ(st.ambiguity, -1);
-  // Half away from zero.
-  st.geomDoppler = 1.8 * kPrf;
-  EXPECT_EQ(estambiguity(st, in, poly), 0);
-  EXPECT_EQ(st.ambiguity, 2);
-  st.geomDoppler = -1.2 * kPrf;
-  EXPECT_EQ(estambiguity(st, in, poly), 0);
-  EXPECT_EQ(st.ambiguity, -2);
-
-  st.ambFlag = 1;
-  EXPECT_EQ(estambiguity(st, in, poly), 10);
-  st.ambFlag = 3;
-  st.nBest = 4;
-  EXPECT_EQ(estambiguity(st, in, poly), 10);
-  st.ambFlag = -1;
-  EXPECT_EQ(estambiguity(st, in, poly), 10);
-}
 
 // Contrast map of the raster: cell mean of |x|^4 over the squared cell mean
 // of |x|^2.
@@ -424,57 +240,6 @@ void contrastMap(const std::vector<fcomplex>& r, int ns, int nl, DcEstState& st)
     }
 }
 
-// MLBF (with WDAR for the offset) on a raster of clutter with bright
-// scatterers whose absolute centroid is dc PRF.
-void resolveFromData(double dc) {
-  {
-    ClutterScene sc;
-    sc.dcPrf = dc;
-    sc.points = 60;
-    sc.pointAmp = 300.0;
-    const int ns = 512, nl = 4096;
-    std::vector<fcomplex> raster = makeClutter(sc, ns, nl);
-    DcEstState st = ersLikeState(sc);
-    st.ambFlag = 1;
-    st.nBest = 3;
-    st.nWdar = 2;
-    st.inMemory = 1;
-    st.data = raster.data();
-    contrastMap(raster, ns, nl, st);
-    DcEstInput in;
-    in.samples = ns;
-    in.lines = nl;
-    in.prf = sc.prf;
-    in.velocity = sc.velocity;
-    // Geometry deliberately wrong by two PRFs: the data decide.
-    st.geomDoppler = (dc + 2.0) * sc.prf;
-    const double wrapped = dc - std::round(dc);
-    const double poly[7] = {wrapped, 0, 0, 0, 0, 0, 0};
-    ASSERT_EQ(estambiguity(st, in, poly), 0) << dc;
-    EXPECT_EQ(st.ambiguity, std::lround(dc - wrapped)) << dc;
-    EXPECT_EQ(st.geomAmbiguity, std::lround(dc - wrapped) + 2);
-    // Blocks of 256 x 2048 in a 512 x 4096 raster: the best one takes most
-    // of the room.
-    EXPECT_GE(st.nBest, 1);
-    EXPECT_LE(st.nBest, 3);
-    EXPECT_EQ(st.mlbfBlocks.size(), static_cast<std::size_t>(st.nBest));
-    EXPECT_GE(st.nWdar, 1);
-    EXPECT_LE(st.nWdar, 2);
-    EXPECT_GT(st.mlbfGood, 0);
-    EXPECT_LT(st.mlbfStd, st.varTh);
-    EXPECT_EQ(st.wdarOffsetAvailable, 1);
-    EXPECT_NEAR(st.wdarMean, st.ambiguity, 0.5);
-    for (const MlbfBlock& b : st.mlbfBlocks) {
-      EXPECT_GE(b.range - st.blocks / 2, 0);
-      EXPECT_LE(b.range + st.blocks / 2, ns);
-      EXPECT_GE(b.line - st.blockl / 2, 0);
-      EXPECT_LE(b.line + st.blockl / 2, nl);
-    }
-  }
-  EXPECT_FALSE(multimlbf_ready());
-  EXPECT_FALSE(wdar_ready());
-}
-
 TEST(DcAmbiguityEstimate, DecisionBetweenMlbfAndWdar) {
   // A raster of exactly one block: the only admissible block is the whole.
   ClutterScene sc;
@@ -489,7 +254,7 @@ TEST(DcAmbiguityEstimate, DecisionBetweenMlbfAndWdar) {
   in.velocity = sc.velocity;
   const double poly[7] = {0.3, 0, 0, 0, 0, 0, 0};
   auto run = [&](double varTh, int nWdar, std::string& out) {
-    DcEstState st = ersLikeState(sc);
+    DcEstState st = ersState(sc, 256, 2048);
     st.ambFlag = 1;
     st.nBest = 2;
     st.nWdar = nWdar;
@@ -534,9 +299,5 @@ TEST(DcAmbiguityEstimate, DecisionBetweenMlbfAndWdar) {
   EXPECT_NEAR(st4.wdarMean, 1.0, 1e-12);
   EXPECT_NEAR(st4.wdarBlocks.at(0).value, 1.0, 1e-12);
 }
-
-TEST(DcAmbiguityEstimate, MlbfResolvesTheAmbiguityOfASquintedScene) { resolveFromData(1.3); }
-
-TEST(HeavyDcAmbiguityEstimate, MlbfResolvesANegativeAmbiguity) { resolveFromData(-0.7); }
 
 }  // namespace

@@ -13,9 +13,11 @@
 #include <vector>
 
 #include "doppler/dc_driver.h"
-#include "doppler/dc_scene.h"
+#include "support/files.h"
+#include "support/scenes.h"
 
-using namespace dc_scene;
+using namespace support::clutter;
+using support::scratchDir;
 
 namespace {
 
@@ -47,7 +49,7 @@ TEST(DcBinScan, ThreadsGiveTheSameBinsAndContrastAsOneThread) {
   const Radar rd;
   // 7 bins across (the last 40 samples belong to no bin), 5 bin rows.
   const int ns = 7 * 64 + 40, nl = 5 * 256 + 17;
-  const std::string dir = tempDir("scan_threads");
+  const std::string dir = scratchDir("scan_threads");
   const std::string path = dir + "/scene.rgfoc";
   ASSERT_TRUE(writeRaster(path, makeVaryingClutter(rd, {0.3, 0.1 / ns, 0.05 / nl}, ns, nl, 10.0, 5)));
   const DcEstState one = scan(rd, path, dir, ns, nl, 1);
@@ -82,54 +84,6 @@ TEST(DcBinScan, ThreadsGiveTheSameBinsAndContrastAsOneThread) {
   // Bin centres in scan order: range fastest, then line.
   EXPECT_EQ(one.bins[8].range, 64 + 32);
   EXPECT_EQ(one.bins[8].line, 256 + 128);
-}
-
-TEST(DcBinScan, OnePassScanEqualsTheBlockEstimateAndTheCellMeans) {
-  const Radar rd;
-  const int ns = 5 * 64 + 8, nl = 3 * 256;
-  const std::string dir = tempDir("scan_reference");
-  const std::string path = dir + "/scene.rgfoc";
-  const std::vector<fcomplex> data = makeVaryingClutter(rd, {0.7, -0.1 / ns, 0.0}, ns, nl, 3.0, 9);
-  ASSERT_TRUE(writeRaster(path, data));
-  const DcEstState st = scan(rd, path, dir, ns, nl, 2);
-
-  // Reference: every bin copied out and estimated alone, every contrast
-  // cell summed on its own, then the same smoothing of the maps.
-  DcEstState ref = ersState(rd);
-  DcEstInput in = inputFor(rd, path, dir, ns, nl);
-  ASSERT_EQ(setprocbuf(in, ref), 0);
-  ASSERT_EQ(dcTheoreticAutocorrelation(in, ref), 0);
-  std::vector<fcomplex> block(size_t(ref.blocks) * ref.blockl);
-  for (int by = 0; by < ref.nBinsY; ++by)
-    for (int bx = 0; bx < ref.nBinsX; ++bx) {
-      for (int l = 0; l < ref.blockl; ++l)
-        for (int s = 0; s < ref.blocks; ++s)
-          block[size_t(l) * ref.blocks + s] = data[size_t(by * ref.blockl + l) * ns + bx * ref.blocks + s];
-      DcBin expect;
-      dcBinEstimate(block.data(), ref, expect);
-      const DcBin& got = st.bins[size_t(by) * ref.nBinsX + bx];
-      EXPECT_EQ(got.valid, expect.valid);
-      EXPECT_TRUE(sameBits(got.dcWrapped, expect.dcWrapped)) << bx << " " << by;
-      EXPECT_TRUE(sameBits(got.contrast, expect.contrast)) << bx << " " << by;
-      EXPECT_TRUE(sameBits(got.noise, expect.noise)) << bx << " " << by;
-    }
-  const double norm = 1.0 / (double(ref.patchs) * ref.patchl);
-  for (int cy = 0; cy < ref.cmHeight; ++cy)
-    for (int cx = 0; cx < ref.cmWidth; ++cx) {
-      double p2 = 0.0, p4 = 0.0;
-      for (int l = cy * ref.patchl; l < (cy + 1) * ref.patchl; ++l)
-        for (int s = cx * ref.patchs; s < (cx + 1) * ref.patchs; ++s) {
-          const double a = std::norm(data[size_t(l) * ns + s]);
-          p2 += a;
-          p4 += a * a;
-        }
-      ref.contrastPow[size_t(cy) * ref.cmWidth + cx] = static_cast<float>(p2 * norm);
-      ref.contrastMap[size_t(cy) * ref.cmWidth + cx] = static_cast<float>(p4 * norm);
-    }
-  ASSERT_EQ(getcontrast(ref), 0);
-  ASSERT_EQ(ref.contrastMap.size(), st.contrastMap.size());
-  EXPECT_EQ(std::memcmp(ref.contrastMap.data(), st.contrastMap.data(), st.contrastMap.size() * sizeof(float)), 0);
-  EXPECT_EQ(std::memcmp(ref.contrastPow.data(), st.contrastPow.data(), st.contrastPow.size() * sizeof(float)), 0);
 }
 
 TEST(DcBinScan, ReadsInBoundedChunksWhateverTheMemory) {

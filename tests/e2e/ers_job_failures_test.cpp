@@ -3,12 +3,16 @@
 // orbit arc found by itself from the archive folder.
 #include <gtest/gtest.h>
 
-#include "e2e_support.h"
+#include <regex>
+
+#include "support/files.h"
+#include "support/host_run.h"
+#include "support/point_targets.h"
 #include "focus/level0_focusers.h"
 #include "focus/multiplatform_focuser.h"
 #include "job/focuser_handover.h"
 
-using namespace e2e;
+using namespace support;
 
 namespace {
 
@@ -34,45 +38,45 @@ void expectStageFailure(const FocuserRun& run, const std::string& call) {
 }  // namespace
 
 TEST(ErsOrbitLookup, ArcFoundFromTheArchiveFolderWhenNoOrbitIsGiven) {
-  Folder dir("orbit");
-  SceneFiles files;
+  TempFolder dir("orbit");
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(smallScene(), dir.str(), files, error)) << error;
 
   ATmultiplatformFocuser f;
   f.platform = "ERS";
-  f.level0Filename = files.image;
-  f.auxFile2 = files.leader;
-  f.auxDirectory1 = files.orbitArchive;
+  f.level0Filename = files["image"];
+  f.auxFile2 = files["leader"];
+  f.auxDirectory1 = files["orbit_archive"];
   f.processingConfFilename = std::string(resourcesDir()) + "parameters_ERS.hdr";
   f.outputFilename = dir / "out";
   ASSERT_EQ(f.InitProcessing(), 0);
   auto* ers = dynamic_cast<ersLevel0Focuser*>(f.sensorFocuser());
   ASSERT_NE(ers, nullptr);
-  EXPECT_EQ(ers->orbitFilename, files.orbit);
-  EXPECT_EQ(f.auxFile1, files.orbit);
-  EXPECT_EQ(ers->LEAFilename, files.leader);
+  EXPECT_EQ(ers->orbitFilename, files["orbit"]);
+  EXPECT_EQ(f.auxFile1, files["orbit"]);
+  EXPECT_EQ(ers->LEAFilename, files["leader"]);
   EXPECT_EQ(f.FinalizeProcessing("headerfile", 0), 0);
 
   // Through the job's hand-over the found arc comes back into the job.
   std::unique_ptr<JobFocuser> job = makeJobFocuser();
   job->job.platform = "ERS";
-  job->job.level0Filename = files.image;
-  job->job.auxFile2 = files.leader;
-  job->job.auxDirectory1 = files.orbitArchive;
+  job->job.level0Filename = files["image"];
+  job->job.auxFile2 = files["leader"];
+  job->job.auxDirectory1 = files["orbit_archive"];
   job->job.processingConfFilename = f.processingConfFilename;
   job->job.outputFilename = dir / "out";
   EXPECT_EQ(job->checkpar(), 0);
   EXPECT_EQ(job->InitProcessing(), 0);
-  EXPECT_EQ(job->job.auxFile1, files.orbit);
+  EXPECT_EQ(job->job.auxFile1, files["orbit"]);
   EXPECT_EQ(job->FinalizeProcessing("headerfile", 0), 0);
 }
 
 TEST(ErsJobFailures, MissingLeaderStopsBeforeExtraction) {
-  Folder dir("leader");
-  SceneFiles files;
+  TempFolder dir("leader");
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(smallScene(), dir.str(), files, error)) << error;
 
   // Not named in the job.
   std::vector<std::string> p = ersJob(files, dir / "out");
@@ -84,7 +88,7 @@ TEST(ErsJobFailures, MissingLeaderStopsBeforeExtraction) {
   EXPECT_FALSE(fs::exists(dir / "out.extracted"));
 
   // Named, but not there.
-  fs::remove(files.leader);
+  fs::remove(files["leader"]);
   writeJob(dir / "job.txt", ersJob(files, dir / "out"));
   run = runFocuser(dir.str(), dir / "job.txt");
   expectStageFailure(run, "run()");
@@ -93,12 +97,12 @@ TEST(ErsJobFailures, MissingLeaderStopsBeforeExtraction) {
 }
 
 TEST(ErsJobFailures, ArcListThatDoesNotCoverTheSceneIsReported) {
-  Folder dir("arc");
-  SceneFiles files;
+  TempFolder dir("arc");
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(smallScene(), dir.str(), files, error)) << error;
   // Move every arc of the list ten years back.
-  const std::string list = files.orbitArchive + "/ERS1/PRECISE/arclist";
+  const std::string list = files["orbit_archive"] + "/ERS1/PRECISE/arclist";
   std::string text = readText(list);
   ASSERT_TRUE(contains(text, " 10")) << text;
   const std::regex year(R"( 10(\d\d\d\d))");
@@ -106,23 +110,23 @@ TEST(ErsJobFailures, ArcListThatDoesNotCoverTheSceneIsReported) {
 
   std::vector<std::string> p = ersJob(files, dir / "out");
   p[6] = "NotOK";
-  p[11] = files.orbitArchive;
+  p[11] = files["orbit_archive"];
   writeJob(dir / "job.txt", p);
   const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   expectStageFailure(run, "InitProcessing()");
-  EXPECT_TRUE(contains(run.log, "No ERS orbit arc found for the scene in " + files.orbitArchive))
+  EXPECT_TRUE(contains(run.log, "No ERS orbit arc found for the scene in " + files["orbit_archive"]))
       << run.log;
   EXPECT_TRUE(contains(run.log, "INPUT FILE 1")) << run.log;
   EXPECT_FALSE(fs::exists(dir / "out.extracted"));
 }
 TEST(ErsJobFailures, TruncatedImageFileEndsTheExtraction) {
-  Folder dir("truncated");
-  SceneFiles files;
+  TempFolder dir("truncated");
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(smallScene(), dir.str(), files, error)) << error;
   // Cut in the middle of a line, about half-way through the scene.
-  const std::uintmax_t size = fs::file_size(files.image);
-  fs::resize_file(files.image, size / 2 + 7);
+  const std::uintmax_t size = fs::file_size(files["image"]);
+  fs::resize_file(files["image"], size / 2 + 7);
   writeJob(dir / "job.txt", ersJob(files, dir / "out"));
   const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   expectStageFailure(run, "run()");
@@ -131,39 +135,39 @@ TEST(ErsJobFailures, TruncatedImageFileEndsTheExtraction) {
 }
 
 TEST(ErsJobFailures, OrbitArcThatDoesNotCoverTheSceneEndsTheExtraction) {
-  Folder dir("short_arc");
-  SceneFiles files, later;
+  TempFolder dir("short_arc");
+  SensorScene files, later;
   std::string error;
-  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(smallScene(), dir.str(), files, error)) << error;
   // The arc of a pass ten days later.
   SceneDescription other = smallScene();
   other.lines = 64;
   other.startTime += 10 * 86400.0;
   other.orbit.epoch = other.startTime;
-  ASSERT_TRUE(simulate(other, dir / "later/", later, error)) << error;
+  ASSERT_TRUE(simulateErs(other, dir / "later/", later, error)) << error;
   std::vector<std::string> p = ersJob(files, dir / "out");
-  p[6] = later.orbit;
+  p[6] = later["orbit"];
   writeJob(dir / "job.txt", p);
   const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   expectStageFailure(run, "run()");
   EXPECT_TRUE(contains(run.log, "does not cover the image orbit")) << run.log;
-  EXPECT_TRUE(contains(run.log, later.orbit)) << run.log;
+  EXPECT_TRUE(contains(run.log, later["orbit"])) << run.log;
   EXPECT_FALSE(fs::exists(dir / "out.rgfoc"));
 }
 
 TEST(ErsJobFailures, OrbitLookUpNeedsTheLeaderBesideTheImage) {
-  Folder dir("moved");
-  SceneFiles files;
+  TempFolder dir("moved");
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(smallScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(smallScene(), dir.str(), files, error)) << error;
   // The image alone in another folder: the look-up reads the leader of the
   // image's folder for the acquisition time.
   fs::create_directories(dir / "alone");
-  fs::copy_file(files.image, dir / "alone/DAT_01.001");
+  fs::copy_file(files["image"], dir / "alone/DAT_01.001");
   std::vector<std::string> p = ersJob(files, dir / "out");
   p[1] = dir / "alone/DAT_01.001";
   p[6] = "NotOK";
-  p[11] = files.orbitArchive;
+  p[11] = files["orbit_archive"];
   writeJob(dir / "job.txt", p);
   const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   expectStageFailure(run, "InitProcessing()");

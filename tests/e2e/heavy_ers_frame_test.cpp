@@ -2,12 +2,15 @@
 // and targets at the seam of the blocks. Left out of the default run.
 #include <gtest/gtest.h>
 
-#include "e2e_support.h"
+#include "product/general_sar.h"
+#include "support/files.h"
+#include "support/host_run.h"
+#include "support/point_targets.h"
 
-using namespace e2e;
+using namespace support;
 
 TEST(HeavyErsFrame, TwoAzimuthBlocksWithANegativeCentroid) {
-  Folder dir("frame");
+  TempFolder dir("frame");
   SceneDescription scene = ersScene(10240, 5616, -450.0);
   scene.mission = "ERS1";
   scene.sceneDir = "ERS1_SIM";
@@ -17,14 +20,14 @@ TEST(HeavyErsFrame, TwoAzimuthBlocksWithANegativeCentroid) {
                         {6905.0, 2300.75, 80.0, 4.0},  {6918.75, 3400.0, 0.0, 4.0},
                         {6935.5, 4500.25, 0.0, 4.0},   {8000.0, 4700.5, 150.0, 4.0},
                         {8200.25, 2000.0, 0.0, 4.0}};
-  SceneFiles files;
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(scene, dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(scene, dir.str(), files, error)) << error;
   std::vector<std::string> p = ersJob(files, dir / "out");
   p[6] = "NotOK";
-  p[11] = files.orbitArchive;
+  p[11] = files["orbit_archive"];
   writeJob(dir / "job.txt", p);
-  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt", nullptr, 3000);
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt", {.timeoutSeconds = 3000});
   ASSERT_EQ(run.exitStatus, 0) << run.log;
   ASSERT_EQ(run.errorCode, 0) << run.errorFile;
   EXPECT_TRUE(contains(run.trace, "ERS1 orbit found")) << run.trace;
@@ -34,7 +37,7 @@ TEST(HeavyErsFrame, TwoAzimuthBlocksWithANegativeCentroid) {
   EXPECT_EQ(record.roi.roi.Lines, 10240 - 2560);
   const PtaReport pta = analyseProduct(dir.str(), dir / "out_slc", dir / "out_slc.TessivorParameterExtracted", files.truth);
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
-  expectTargetsAtTruth(pta);
+  expectTruthPositions(pta);
 
   const ROI_Obj& roi = record.roi.roi;
   const double prf = scene.prfHz;

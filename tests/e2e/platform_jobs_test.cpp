@@ -2,32 +2,20 @@
 // refuses, and how the refusal reaches the host.
 #include <gtest/gtest.h>
 
-#include "e2e_support.h"
+#include "support/files.h"
+#include "support/host_run.h"
+#include "support/point_targets.h"
 
-using namespace e2e;
-
-namespace {
-
-std::vector<std::string> jobOf(const std::string& platform, const std::string& scene,
-                               const std::string& out) {
-  std::vector<std::string> p(24, "NotOK");
-  p[0] = platform;
-  p[1] = scene;
-  p[5] = out;
-  for (int i : {16, 17, 20, 21, 23}) p[i] = "0";
-  return p;
-}
-
-}  // namespace
+using namespace support;
 
 TEST(PlatformJobs, PalsarSinglePolarisationWithASecondSceneIsRefusedBeforeExtraction) {
-  Folder dir("palsar");
+  TempFolder dir("palsar");
   std::string leader(2700, ' ');
   leader.replace(1108, 4, "   1");
   writeText(dir / "LED-ALPSRP", leader);
   writeText(dir / "IMG-HH-ALPSRP", std::string(800, '\0'));
   writeText(dir / "IMG-HV-ALPSRP", std::string(800, '\0'));
-  std::vector<std::string> p = jobOf("PALSAR", dir / "IMG-HH-ALPSRP", dir / "out");
+  Job p = basicJob("PALSAR", dir / "IMG-HH-ALPSRP", dir / "out");
   p[2] = dir / "IMG-HV-ALPSRP";
   p[6] = dir / "LED-ALPSRP";  // the PALSAR orbit is the leader's
   p[7] = dir / "LED-ALPSRP";
@@ -43,7 +31,7 @@ TEST(PlatformJobs, PalsarSinglePolarisationWithASecondSceneIsRefusedBeforeExtrac
 
   // One scene only: the orbit and the leader are required, then the
   // platform is refused by this build.
-  p = jobOf("PALSAR", dir / "IMG-HH-ALPSRP", dir / "out");
+  p = basicJob("PALSAR", dir / "IMG-HH-ALPSRP", dir / "out");
   writeJob(dir / "job.txt", p);
   FocuserRun refused = runFocuser(dir.str(), dir / "job.txt");
   EXPECT_EQ(refused.errorCode, 130560) << refused.errorFile;
@@ -56,16 +44,16 @@ TEST(PlatformJobs, PalsarSinglePolarisationWithASecondSceneIsRefusedBeforeExtrac
 }
 
 TEST(PlatformJobs, RadarsatWithoutOrbitIsRefusedAndEnvisatTellsWhichFileIsMissing) {
-  Folder dir("others");
+  TempFolder dir("others");
   writeText(dir / "dat_01.001", std::string(1000, '\0'));
-  writeJob(dir / "job.txt", jobOf("RADARSAT", dir / "dat_01.001", dir / "out"));
+  writeJob(dir / "job.txt", basicJob("RADARSAT", dir / "dat_01.001", dir / "out"));
   FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   EXPECT_EQ(run.errorCode, 130560) << run.errorFile;
   EXPECT_TRUE(contains(run.log, "Error in defining RADARSAT orbit file")) << run.log;
 
   // An image-mode ASAR product without orbit file or folder.
   writeText(dir / "ASA_IM__0P.N1", "PRODUCT=\"ASA_IM__0PNPDE20040101" + std::string(100, ' '));
-  writeJob(dir / "job.txt", jobOf("ENVISAT", dir / "ASA_IM__0P.N1", dir / "out"));
+  writeJob(dir / "job.txt", basicJob("ENVISAT", dir / "ASA_IM__0P.N1", dir / "out"));
   run = runFocuser(dir.str(), dir / "job.txt");
   EXPECT_EQ(run.errorCode, EC_DORVOR_MISSING) << run.errorFile;
   // The folders are "NotOK" as the job gives them: nothing is found there.

@@ -52,36 +52,6 @@ TEST_F(ChainConfiguration, ReadconfAppliesTheDefaultsOfAbsentKeys) {
   EXPECT_EQ(c.readconf(path("absent.hdr")), 9);
 }
 
-TEST_F(ChainConfiguration, ReadparClearsTheBlockFirst) {
-  writeText(path("p.hdr"),
-            "[sarfocuserConfiguration]\nMemory = 512\nReportFilename = chain.report\n"
-            "DeleteTempFiles = 1\nDCref = 12.5\n");
-  SARFocuser_conf c;
-  c.LinesInBlock = 77;
-  c.Flag_ortog = 0;
-  ASSERT_EQ(c.readpar(path("p.hdr")), 0);
-  EXPECT_EQ(c.Memory, 512);
-  EXPECT_EQ(c.ReportFilename, "chain.report");
-  EXPECT_EQ(c.DeleteTempFiles, 1);
-  EXPECT_DOUBLE_EQ(c.DCref, 12.5);
-  EXPECT_EQ(c.Incore, 0);
-  EXPECT_EQ(c.LinesInBlock, 0);
-  EXPECT_EQ(c.Flag_ortog, 1);
-  EXPECT_EQ(c.Azblk, 1024);
-
-  writeText(path("in.hdr"), "[sarfocuserInput]\nChirpFile = c\n[sarfocuserOutput]\n");
-  SARFocuser_input in;
-  EXPECT_EQ(in.readpar(path("in.hdr")), 10);
-  writeText(path("in2.hdr"), "[sarfocuserInput]\nRawDataFile = r\nChirpFile = c\n"
-                             "[sarfocuserOutput]\nOutputFilename = o\n");
-  ASSERT_EQ(in.readpar(path("in2.hdr")), 0);
-  EXPECT_EQ(in.RawDataFile, "r");
-  EXPECT_EQ(in.ChirpFile, "c");
-  SARFocuser_output out;
-  ASSERT_EQ(out.readpar(path("in2.hdr")), 0);
-  EXPECT_EQ(out.OutputFilename, "o");
-}
-
 TEST_F(ChainConfiguration, SensorChainsGetMemoryAndTheFixedValues) {
   writeText(path("p.hdr"), "[GeneralProcessingConf]\nAzblk = 2048\n[sarfocuserConfiguration]\n"
                            "Incore = 1\n");

@@ -97,7 +97,7 @@ TEST_F(StageTemplate, InitializeChecksNamesAndFilesInOrder) {
 TEST_F(StageTemplate, RunCallsStagesInOrderAndStopsAtTheFirstFailure) {
   // Every stage passes; the chain then finds no raw raster and gives 10.
   {
-    reports_ = false;
+    startReports_ = false;
     set_flg_report(0);  // the missing raw raster is fatal while reports are on
     RecordingFocuser f;
     fill(f);
@@ -126,53 +126,6 @@ TEST_F(StageTemplate, RunCallsStagesInOrderAndStopsAtTheFirstFailure) {
     EXPECT_EQ(f.run(), 4);
     EXPECT_EQ(f.stages, std::vector<std::string>{"initialize"});
   }
-}
-
-TEST_F(StageTemplate, NamedRunAndChainGuards) {
-  RecordingFocuser f;
-  fill(f);
-  // The names of the named run would collide with a selected output.
-  EXPECT_EQ(f.run("a.raw", "a.chirp", "", "a.out"), 1);
-  EXPECT_EQ(f.stages,
-            (std::vector<std::string>{"initialize", "ingestion:a.raw", "preprocessing"}));
-
-  // sarfocuser() needs the block marked as set by run().
-  RecordingFocuser g;
-  fill(g);
-  g.outputFilename.clear();
-  ASSERT_EQ(g.initialize(), 0);
-  EXPECT_EQ(g.sarfocuser(), 1);
-  // Without a selected output the names go into the chain; the antenna name
-  // stays when none is given.
-  g.focuser().AntennaFile = "keep";
-  set_flg_report(0);
-  EXPECT_EQ(g.sarfocuser(path("none.raw"), path("none.chirp"), "", path("o")), 10);
-  EXPECT_EQ(g.focuser().RawDataFile, path("none.raw"));
-  EXPECT_EQ(g.focuser().ChirpFile, path("none.chirp"));
-  EXPECT_EQ(g.focuser().OutputFilename, path("o"));
-  EXPECT_EQ(g.focuser().AntennaFile, "keep");
-  // The modular steps without names need a selected output.
-  EXPECT_EQ(g.rangefoc(), 1);
-  EXPECT_EQ(g.dcEst(), 1);
-  EXPECT_EQ(g.frEst(), 1);
-  EXPECT_EQ(g.azfoc(0.0), 1);
-}
-
-TEST_F(StageTemplate, FindDirGivesTheDirectoryPart) {
-  std::string d;
-  stripmapGeneralFocuserModular::findDir("/data/scene/out.rgfoc", d);
-  EXPECT_EQ(d, "/data/scene");
-  stripmapGeneralFocuserModular::findDir("rel/out", d);
-  EXPECT_EQ(d, "rel");
-  stripmapGeneralFocuserModular::findDir("out.rgfoc", d);
-  EXPECT_EQ(d, ".");
-  stripmapGeneralFocuserModular::findDir("/out", d);
-  EXPECT_EQ(d, "/");
-  stripmapGeneralFocuserModular::findDir("C:\\scenes\\out", d);
-  EXPECT_EQ(d, "C:\\scenes");
-  d = "/a/b/c";
-  stripmapGeneralFocuserModular::findDir(d, d);  // in place
-  EXPECT_EQ(d, "/a/b");
 }
 
 TEST_F(StageTemplate, DopplerShiftIsBeamCentreToZeroDoppler) {

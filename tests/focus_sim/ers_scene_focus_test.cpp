@@ -13,8 +13,6 @@
 #include <string>
 #include <vector>
 
-#include "diag/ckerr.h"
-#include "diag/environment.h"
 #include "diag/report.h"
 #include "focus/level0_focusers.h"
 #include "focus/sar_focuser.h"
@@ -22,36 +20,21 @@
 #include "product/general_sar.h"
 #include "product/general_sar_configuration.h"
 #include "sim/raw_scene.h"
+#include "support/files.h"
 
 namespace {
 
-class ErsSceneFocus : public ::testing::Test {
+// A working folder that is also the current folder: the Doppler log lands in ".".
+class ErsSceneFocus : public support::WorkingFolderTest {
  protected:
   void SetUp() override {
-    const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
-    dir_ = std::filesystem::path(::testing::TempDir()) /
-           ("tessivor_focus_sim_" + std::to_string(getpid()) + "_" + info->name());
-    std::filesystem::remove_all(dir_);
-    std::filesystem::create_directories(dir_);
-    working_ = dir_.string() + "/";
-    setenv("TESSIVOR_WORKING_DIR", working_.c_str(), 1);
-    setenv("TESSIVOR_WORKING_FILE", "progress.txt", 1);
-    setenv("TESSIVOR_CEOS_DES_FILES_DIR", TESSIVOR_SOURCE_DIR "/resources/", 1);
-    setenv("TESSIVOR_TRACING", "ACTIVE", 1);
-    resetEnvironment();
-    exit_ckerr();
-    initEnvironment();
-    init_ckerr_locking();
-    init_report(0, "TEST", 1);
+    WorkingFolderTest::SetUp();
     cwd_ = std::filesystem::current_path();
-    std::filesystem::current_path(dir_);  // the Doppler log lands in "."
+    std::filesystem::current_path(working_);
   }
   void TearDown() override {
     std::filesystem::current_path(cwd_);
-    resetEnvironment();
-    exit_ckerr();
-    set_flg_report(0);
-    std::filesystem::remove_all(dir_);
+    WorkingFolderTest::TearDown();
   }
 
   static SceneDescription scene() {
@@ -71,20 +54,14 @@ class ErsSceneFocus : public ::testing::Test {
   // root handed to the ERS focuser.
   void nameInputs(ersLevel0Focuser& f, const RawSceneSimulator& sim, const std::string& conf,
                   const std::string& out) const {
-    f.level0Filename = sim.imagePath(dir_.string());
-    f.LEAFilename = sim.leaderPath(dir_.string());
-    f.orbitFilename = sim.odrPath(dir_.string());
+    f.level0Filename = sim.imagePath(working_);
+    f.LEAFilename = sim.leaderPath(working_);
+    f.orbitFilename = sim.odrPath(working_);
     f.configurationFilename = conf;
     f.outputFilename = working_ + out;
   }
 
-  std::string trace() const {
-    std::ifstream in(working_ + "Process.trace");
-    return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
-  }
-
-  std::filesystem::path dir_, cwd_;
-  std::string working_;
+  std::filesystem::path cwd_;
 };
 
 // Peak of |x| in a window of the SLC around (line, sample).
@@ -109,85 +86,10 @@ void findPeak(const std::string& raster, int samples, int lines, double line, do
   }
 }
 
-TEST_F(ErsSceneFocus, SimulatedSceneBecomesAFocusedProduct) {
-  RawSceneSimulator sim(scene());
-  std::string error;
-  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
-
-  ersLevel0Focuser f;
-  nameInputs(f, sim, TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr", "out");
-  testing::internal::CaptureStdout();
-  const int status = f.run();
-  const std::string printed = testing::internal::GetCapturedStdout();
-  ASSERT_EQ(status, 0) << trace();
-  EXPECT_NE(printed.find("- finalize \n"), std::string::npos);
-  // The stages in their order.
-  const std::string t = trace();
-  size_t at = 0;
-  for (const char* stage :
-       {"Initialization completed", "Starting ingestion", "ERS image extracted",
-        "ERS focuser doesn't do anything in the preprocessor module",
-        "STRIPMAP RAW DATA DETECTED, FOCUSSING...", "Range Focusing", "DC Estimation",
-        "GEOMETRIC POLYNOMIALS COMPUTATION", "Azimuth Focusing", "Writing headers",
-        "sar focuser ended successfully", "ERS focuser doesn't do anything in the postprocessor"}) {
-    const size_t next = t.find(stage, at);
-    EXPECT_NE(next, std::string::npos) << stage;
-    if (next != std::string::npos) at = next;
-  }
-  for (const char* name : {"out", "out.hdr", "out.extracted", "out.extracted.hdr", "out.chirp",
-                           "out.rgfoc", "out.rgfoc.hdr"})
-    EXPECT_TRUE(std::filesystem::exists(working_ + name)) << name;
-
-  // Range-focused record.
-  GeneralSAR rg;
-  ASSERT_EQ(rg.GSread(working_ + "out.rgfoc.hdr"), 0);
-  EXPECT_TRUE(rg.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED));
-  EXPECT_EQ(rg.dataSetInfo.Description, "StripMap Range Focused Image File");
-  EXPECT_EQ(rg.dataFile.NrOfPixelsPerLine, 2048 - sim.replicaLength() + 1);
-  EXPECT_NEAR(rg.polynomials.EvaluateDC(rg.roi.roi.FastStartTime, rg.roi.roi.SlowStartTime),
-              180.0, 0.02 * sim.scene().prfHz);
-  // ERS Doppler rate: about -2000 to -2200 Hz/s.
-  const double fr = rg.polynomials.EvaluateFR(rg.roi.roi.FastStartTime, rg.roi.roi.SlowStartTime);
-  EXPECT_LT(fr, -1900.0);
-  EXPECT_GT(fr, -2300.0);
-
-  // Focused record.
-  GeneralSAR slc;
-  ASSERT_EQ(slc.GSread(working_ + "out.hdr"), 0);
-  const DataSetInfo_Obj& info = slc.dataSetInfo;
-  EXPECT_TRUE(info.IsImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED));
-  EXPECT_EQ(info.Description, "StripMap level 1 Image File");
-  EXPECT_EQ(info.ProcessingSoftware, "SARFocuser v1.0");
-  EXPECT_EQ(info.ProcessingCenter, "Orvane - Lumbrao");
-  EXPECT_EQ(slc.spectralWindows.AzMatchedFilterType, "HAMMING");
-  EXPECT_NEAR(slc.attitude.Mean_DC, 180.0, 0.02 * sim.scene().prfHz);
-  EXPECT_GT(slc.attitude.Eq_speed, 6800.0);
-  EXPECT_LT(slc.attitude.Eq_speed, 7300.0);
-  EXPECT_EQ(slc.swath.Rank, -1);
-  EXPECT_NE(slc.geoCoords.center.lat, -999.0);
-  const ROI_Obj& roi = slc.roi.roi;
-  const int samples = slc.dataFile.NrOfPixelsPerLine, lines = slc.dataFile.NrOfLinesPerImage;
-  ASSERT_GT(samples, 0);
-  ASSERT_GT(lines, 0);
-  EXPECT_EQ(std::filesystem::file_size(working_ + "out"),
-            static_cast<std::uintmax_t>(samples) * lines * 8);
-
-  // Every target is focused within a pixel of its zero-Doppler truth.
-  for (const TargetTruth& t : sim.truth()) {
-    const double line = (t.azimuthTime - roi.SlowStartTime) / roi.SlowTimeDelta;
-    const double sample =
-        (t.rangeTime - roi.FastStartTime) / roi.FastTimeDelta + sim.rangePeakOffset();
-    int pl = -1, ps = -1;
-    findPeak(working_ + "out", samples, lines, line, sample, &pl, &ps);
-    EXPECT_NEAR(pl, line, 1.0) << "target at raw line " << t.line;
-    EXPECT_NEAR(ps, sample, 1.0) << "target at raw line " << t.line;
-  }
-}
-
 TEST_F(ErsSceneFocus, ModularStepsFocusTheSceneFromAConfigurationDocument) {
   RawSceneSimulator sim(scene());
   std::string error;
-  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+  ASSERT_EQ(sim.writeErsScene(working_, error), 0) << error;
 
   // The processing configuration as a parameter document.
   GeneralSAR_configuration c;
@@ -263,31 +165,6 @@ TEST_F(ErsSceneFocus, ModularStepsFocusTheSceneFromAConfigurationDocument) {
   }
 }
 
-TEST_F(ErsSceneFocus, TruncatedImageFileEndsInTheExtractor) {
-  SceneDescription s = scene();
-  s.lines = 1024;
-  s.samples = 1024;
-  s.pixelTargets.clear();
-  s.truncateImageBytes = 11644 + 100 * (412 + 2 * 1024) + 50;
-  RawSceneSimulator sim(s);
-  std::string error;
-  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
-
-  ersLevel0Focuser f;
-  nameInputs(f, sim, TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr", "out");
-  testing::internal::CaptureStdout();
-  const int status = f.run();
-  const std::string printed = testing::internal::GetCapturedStdout();
-  EXPECT_EQ(status, 4);
-  const std::string t = trace();
-  EXPECT_NE(t.find("File reading failed!"), std::string::npos);
-  EXPECT_EQ(t.find("ERS image extracted"), std::string::npos);
-  EXPECT_EQ(t.find("Range Focusing"), std::string::npos);
-  EXPECT_EQ(printed.find("- finalize"), std::string::npos);
-  EXPECT_FALSE(std::filesystem::exists(working_ + "out.rgfoc"));
-  EXPECT_FALSE(std::filesystem::exists(working_ + "out.hdr"));
-}
-
 TEST_F(ErsSceneFocus, ChainErasesEachInputOnceItsStageHasUsedIt) {
   SceneDescription s = scene();
   s.lines = 3072;
@@ -295,7 +172,7 @@ TEST_F(ErsSceneFocus, ChainErasesEachInputOnceItsStageHasUsedIt) {
   s.pixelTargets = {{1536.0, 500.0, 0.0, 4.0}};
   RawSceneSimulator sim(s);
   std::string error;
-  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+  ASSERT_EQ(sim.writeErsScene(working_, error), 0) << error;
 
   // Extraction by the ERS focuser, then the chain on its own.
   ersLevel0Focuser f;
@@ -335,7 +212,7 @@ TEST_F(HeavyErsSceneFocus, TwoChannelsAreFocusedAndDescalloped) {
   s.samples = 1536;
   RawSceneSimulator sim(s);
   std::string error;
-  ASSERT_EQ(sim.writeErsScene(dir_.string(), error), 0) << error;
+  ASSERT_EQ(sim.writeErsScene(working_, error), 0) << error;
   ersLevel0Focuser f;
   nameInputs(f, sim, TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr", "ers");
   ASSERT_EQ(f.initialize(), 0);

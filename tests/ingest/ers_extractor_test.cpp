@@ -113,16 +113,6 @@ float swstOf(int code) { return static_cast<float>(code * 2.10943e-07 + 0.005357
 
 }  // namespace
 
-TEST(ERSExtractorTest, ElementTable) {
-  ATERSExtractor a;
-  ASSERT_EQ(a.getNumberOfElements(), 10);
-  const char* names[] = {"Memory", "ReportFilename", "ReportLevel", "Incore", "Verbose",
-                         "ImgFilename", "LeaFilename", "OrbitFilename", "OutputFile", "ChirpFile"};
-  for (int k = 0; k < 10; ++k) EXPECT_EQ(a.getElement(k).name, names[k]);
-  EXPECT_EQ(a.ReportFilename, "ATERSExtractor.report");
-  EXPECT_EQ(a.getSwstVector(), nullptr);
-}
-
 TEST(ERSExtractorTest, RealLeaderFields) {
   if (!ingest_test::realDataPresent()) GTEST_SKIP() << "real data folder absent";
   ATERSExtractor x;
@@ -205,63 +195,6 @@ TEST(ERSExtractorTest, RealLeaderBiasesAndTruncatedImageHead) {
   EXPECT_EQ(y.rawData.roi.Samples, 5616);
 }
 
-TEST(ERSExtractorTest, ImagePassFlagsRepairsAndCounts) {
-  TempFolder dir;
-  writeBytes(dir / "LEA_01.001", leader());
-  // Record 3 is missing from the file; record 2's window code is corrupt.
-  writeBytes(dir / "DAT_01.001", imageFile(3, {{1, 900, 0, 31},
-                                               {2, 1150, 1, 30},
-                                               {4, 905, 2, 29},
-                                               {5, 1000, 3, 28},
-                                               {6, 1000, 4, 27},
-                                               {7, 700, 5, 26}}));
-  ATERSExtractor x;
-  x.LeaFilename = dir / "LEA_01.001";
-  x.ImgFilename = dir / "DAT_01.001";
-  x.OutputFile = dir / "out.extracted";
-  ASSERT_EQ(x.readLeader(), 0);
-  const double start = x.rawData.roi.SlowStartTime;
-  ASSERT_EQ(x.readImage(), 0);
-  ASSERT_EQ(x.getVectorLength(), 6);
-  const std::vector<int> swst(x.getSwstVector(), x.getSwstVector() + 6);
-  const std::vector<int> missing(x.getMissingVector(), x.getMissingVector() + 6);
-  const std::vector<int> counter(x.getCounterVector(), x.getCounterVector() + 6);
-  EXPECT_EQ(swst, (std::vector<int>{900, 900, 905, 1000, 1000, 1000}));
-  EXPECT_EQ(missing, (std::vector<int>{0, 0, 1, 1, 1, 1}));
-  EXPECT_EQ(counter, (std::vector<int>{1, 2, 4, 5, 6, 7}));
-  EXPECT_EQ(x.getMissingLines(), 4);
-
-  const auto rows = readRaster(dir / "out.extracted", 3);
-  ASSERT_EQ(rows.size(), 6u);
-  for (int k = 0; k < 6; ++k) EXPECT_EQ(rows[std::size_t(k)].swst, swstOf(swst[std::size_t(k)])) << k;
-  // Absent biases are 0: samples are the bytes less 15.5.
-  EXPECT_EQ(rows[2].iq, (std::vector<float>{-13.5f, 13.5f, -12.5f, 15.5f, -11.5f, 17.5f}));
-
-  const GeneralRAWData& r = x.rawData;
-  EXPECT_EQ(r.roi.Lines, 6);
-  EXPECT_EQ(r.roi.Samples, 3);
-  EXPECT_DOUBLE_EQ(r.roi.SlowStartTime, start);
-  EXPECT_DOUBLE_EQ(r.roi.FastStartTime, double(swstOf(900)));
-  EXPECT_DOUBLE_EQ(r.dataSetInfo.SWST_MIN, double(swstOf(900)));
-  EXPECT_DOUBLE_EQ(r.dataSetInfo.SWST_MAX, double(swstOf(1000)));
-  EXPECT_DOUBLE_EQ(r.roi.FastTimeLength, 3.0 / 18.962468e6);
-  EXPECT_DOUBLE_EQ(r.swath.Rgate_bias, -6.627e-06);
-  EXPECT_EQ(r.dataSetInfo.MissingLines, 4);
-  EXPECT_TRUE(r.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA));
-  EXPECT_TRUE(r.dataSetInfo.IsAcqMode(DataSetInfo_Obj::AM_STRIPMAP));
-  EXPECT_TRUE(r.dataSetInfo.IsUnitType(DataSetInfo_Obj::UT_VOLT));
-  EXPECT_TRUE(r.dataSetInfo.IsProjection(DataSetInfo_Obj::PR_SLANT_RANGE));
-  EXPECT_TRUE(r.dataSetInfo.IsSensorType(DataSetInfo_Obj::ST_ERS2));
-  EXPECT_EQ(r.dataSetInfo.ProcessingDate.size(), 24u);
-  std::string sense;
-  sec852ascii(start, sense);
-  EXPECT_EQ(r.dataSetInfo.SenseDate, sense.substr(0, 27));
-  EXPECT_EQ(r.dataFile.RowPrefix, 4);
-  EXPECT_EQ(r.dataFile.CellType, 0);
-  EXPECT_EQ(r.dataFile.NrOfPixelsPerLine, 3);
-  EXPECT_EQ(r.dataFile.NrOfLinesPerImage, 6);
-}
-
 TEST(ERSExtractorTest, PartOfTheSceneAndFirstRecordOffset) {
   TempFolder dir;
   writeBytes(dir / "LEA_01.001", leader("       1.0000000", "      -1.0000000"));
@@ -302,60 +235,4 @@ TEST(ERSExtractorTest, PartOfTheSceneAndFirstRecordOffset) {
     EXPECT_EQ(x.getVectorLength(), 9);
     EXPECT_EQ(x.rawData.roi.Lines, 9);
   }
-}
-
-TEST(ERSExtractorTest, FailuresEndWithTheirStatus) {
-  TempFolder dir;
-  const std::string good = leader();
-  writeBytes(dir / "DAT_01.001", imageFile(2, {{1, 900, 0, 0}, {2, 900, 0, 0}}));
-  auto leaderStatus = [&](const std::string& bytes) {
-    writeBytes(dir / "LEA", bytes);
-    ATERSExtractor x;
-    x.LeaFilename = dir / "LEA";
-    return x.readLeader();
-  };
-  EXPECT_EQ(leaderStatus(good), 0);
-  EXPECT_EQ(leaderStatus(good.substr(0, 2000)), 4);
-  EXPECT_EQ(leaderStatus(good.substr(0, 2992 + 4 * 132)), 4);  // the last vector is cut
-  std::string bad = good;
-  bad.replace(1654, 16, "            0.00");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  bad = good;
-  bad.replace(1430, 16, "                ");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  bad = good;
-  bad.replace(2534, 24, "NOT A DATE AT ALL       ");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  bad = good;
-  bad.replace(2754, 4, "0013");
-  EXPECT_EQ(leaderStatus(bad), 10);
-  ATERSExtractor none;
-  none.LeaFilename = dir / "absent";
-  EXPECT_EQ(none.readLeader(), 9);
-  EXPECT_EQ(none.run(), 9);
-
-  ATERSExtractor x;
-  writeBytes(dir / "LEA", good);
-  x.LeaFilename = dir / "LEA";
-  x.OutputFile = dir / "out";
-  ASSERT_EQ(x.readLeader(), 0);
-  x.ImgFilename = dir / "absent";
-  EXPECT_EQ(x.readImage(), 9);
-  writeBytes(dir / "short", std::string(5000, ' '));
-  x.ImgFilename = dir / "short";
-  EXPECT_EQ(x.readImage(), 4);
-  writeBytes(dir / "empty", std::string(11644, ' '));
-  x.ImgFilename = dir / "empty";
-  EXPECT_EQ(x.readImage(), 10);
-  // Fewer records than the descriptor says.
-  writeBytes(dir / "cut", imageFile(2, {{1, 900, 0, 0}}, 3));
-  x.ImgFilename = dir / "cut";
-  EXPECT_EQ(x.readImage(), 4);
-  EXPECT_EQ(x.getSwstVector(), nullptr);
-  // An orbit file that does not exist stops the run before the image pass.
-  x.ImgFilename = dir / "DAT_01.001";
-  x.OrbitFilename = dir / "no_orbit";
-  x.OutputFile = dir / "run_out";
-  EXPECT_NE(x.run(), 0);
-  EXPECT_FALSE(std::filesystem::exists(dir / "run_out"));
 }

@@ -8,35 +8,12 @@
 #include <string>
 #include <vector>
 
+#include "support/files.h"
+
 namespace ingest_test {
 
-// A fresh folder unique to this process and test; removed by the destructor.
-class TempFolder {
- public:
-  TempFolder() {
-    const auto* info = testing::UnitTest::GetInstance()->current_test_info();
-    path_ = std::filesystem::path(testing::TempDir()) /
-            ("ingest_" + std::to_string(getpid()) + "_" + info->test_suite_name() + "_" + info->name());
-    std::filesystem::remove_all(path_);
-    std::filesystem::create_directories(path_);
-  }
-  ~TempFolder() {
-    std::error_code ec;
-    std::filesystem::remove_all(path_, ec);
-  }
-  TempFolder(const TempFolder&) = delete;
-  TempFolder& operator=(const TempFolder&) = delete;
-  std::string str() const { return path_.string(); }
-  std::string operator/(const std::string& name) const { return (path_ / name).string(); }
-
- private:
-  std::filesystem::path path_;
-};
-
-inline void writeBytes(const std::string& path, const std::string& bytes) {
-  std::filesystem::create_directories(std::filesystem::path(path).parent_path());
-  std::ofstream(path, std::ios::binary) << bytes;
-}
+using support::TempFolder;
+inline void writeBytes(const std::string& path, const std::string& bytes) { support::writeText(path, bytes); }
 
 // Bytes of size n, blank, with text put at offset.
 inline std::string blankWith(std::size_t n, std::initializer_list<std::pair<std::size_t, std::string>> fields) {
@@ -58,7 +35,7 @@ inline std::string mphHead(const std::string& name, const std::string& start = "
   return s;
 }
 
-inline const char* realData() { return TESSIVOR_REALDATA_DIR; }
-inline bool realDataPresent() { return std::filesystem::is_directory(TESSIVOR_REALDATA_DIR); }
+using support::realData;
+using support::realDataPresent;
 
 }  // namespace ingest_test

@@ -86,46 +86,6 @@ TEST(EnvisatTypesTest, RealProductHeads) {
   EXPECT_EQ(EnvisatTypes(im0).check_dorvor(dor), 0);
 }
 
-TEST(ErsTypesTest, ConstructedLeaders) {
-  TempFolder dir;
-  std::string leader = blankWith(2700, {{1116, "ERS2            "}, {1834, "RAW"}});
-  writeBytes(dir / "upper/LEA_01.001", leader);
-  const ErsTypes upper(dir / "upper");
-  EXPECT_EQ(upper.is_ers2(), 1);
-  EXPECT_EQ(upper.is_ers1(), 0);
-  EXPECT_EQ(upper.is_level0(), 1);
-  EXPECT_EQ(upper.find_type(), 2);
-  // Only the lower-case name is present.
-  writeBytes(dir / "lower/lea_01.001", blankWith(2700, {{1116, "ERS1"}, {1834, "SLC"}}));
-  const ErsTypes lower(dir / "lower/");
-  EXPECT_EQ(lower.leaderPath(), dir / "lower/lea_01.001");
-  EXPECT_EQ(lower.find_type(), 1);
-  EXPECT_EQ(lower.is_level0(), 0);
-  // A leader that ends before the mission field passes nothing.
-  writeBytes(dir / "short/LEA_01.001", blankWith(1120, {{1116, "ERS1"}}));
-  EXPECT_EQ(ErsTypes(dir / "short").is_ers1(), 0);
-  EXPECT_EQ(ErsTypes(dir / "none").find_type(), 0);
-  ROI_Obj roi;
-  EXPECT_EQ(ErsTypes(dir / "none").read_roi(&roi), 0);
-  EXPECT_EQ(ErsTypes(dir / "short").read_roi(&roi), 0);
-
-  // DEOS arc heads.
-  writeBytes(dir / "arc1", "xODRERS-1 and the rest");
-  writeBytes(dir / "arc2", "@ODRERS-2 and the rest");
-  writeBytes(dir / "arcE", "xODRENVIS and the rest");
-  writeBytes(dir / "notarc", "ODR.ERS-1");
-  EXPECT_EQ(upper.is_deos(dir / "arc1"), 1);
-  EXPECT_EQ(upper.is_deos(dir / "arc2"), 1);
-  EXPECT_EQ(upper.is_deos(dir / "notarc"), 0);
-  EXPECT_EQ(upper.is_deos_ers1(dir / "arc1"), 1);
-  EXPECT_EQ(upper.is_deos_ers2(dir / "arc2"), 1);
-  EXPECT_EQ(upper.is_deos_ers1(dir / "arcE") + upper.is_deos_ers2(dir / "arcE"), 0);
-  EXPECT_EQ(upper.check_deos(dir / "arc2"), 1);
-  EXPECT_EQ(upper.check_deos(dir / "arc1"), 0);
-  EXPECT_EQ(lower.check_deos(dir / "arc1"), 1);
-  EXPECT_EQ(ErsTypes(dir / "arc1").find_type(), 3);
-}
-
 TEST(ErsTypesTest, RealLeaders) {
   if (!ingest_test::realDataPresent()) GTEST_SKIP() << "real data folder absent";
   const std::string root = realData();

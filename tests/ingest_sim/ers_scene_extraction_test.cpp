@@ -15,6 +15,7 @@
 #include "product/product_aggregates.h"
 #include "product/time_base.h"
 #include "sim/raw_scene.h"
+#include "support/files.h"
 
 namespace {
 
@@ -26,11 +27,6 @@ constexpr int kSamples = 1024;
 class ErsSceneTest : public testing::Test {
  protected:
   void SetUp() override {
-    const auto* info = testing::UnitTest::GetInstance()->current_test_info();
-    dir_ = fs::path(testing::TempDir()) /
-           ("ingest_sim_" + std::to_string(getpid()) + "_" + info->name());
-    fs::remove_all(dir_);
-    fs::create_directories(dir_);
     std::string error;
     ASSERT_TRUE(SceneDescription::load(TESSIVOR_SOURCE_DIR "/tests/sim/data/ers2_small_scene.txt", scene_, error))
         << error;
@@ -39,28 +35,24 @@ class ErsSceneTest : public testing::Test {
     scene_.odrRecords = 120;
     scene_.pixelTargets = {{150.0, 600.0, 0.0, 4.0}};
   }
-  void TearDown() override {
-    std::error_code ec;
-    fs::remove_all(dir_, ec);
-  }
 
   // Writes the scene and returns its simulator.
   std::unique_ptr<RawSceneSimulator> write() {
     auto sim = std::make_unique<RawSceneSimulator>(scene_);
     std::string error;
-    EXPECT_EQ(sim->writeErsScene(dir_.string(), error), 0) << error;
+    EXPECT_EQ(sim->writeErsScene(dir_.str(), error), 0) << error;
     return sim;
   }
 
   void aim(ATERSExtractor& x, const RawSceneSimulator& sim) const {
-    x.LeaFilename = sim.leaderPath(dir_.string());
-    x.ImgFilename = sim.imagePath(dir_.string());
-    x.OrbitFilename = sim.odrPath(dir_.string());
+    x.LeaFilename = sim.leaderPath(dir_.str());
+    x.ImgFilename = sim.imagePath(dir_.str());
+    x.OrbitFilename = sim.odrPath(dir_.str());
     x.OutputFile = out();
     x.ChirpFile = out() + ".chirp";
   }
 
-  std::string out() const { return (dir_ / "scene.extracted").string(); }
+  std::string out() const { return (dir_ / "scene.extracted"); }
 
   // Quantised bytes of every simulated line.
   static std::vector<unsigned char> quantised(const RawSceneSimulator& sim) {
@@ -82,7 +74,7 @@ class ErsSceneTest : public testing::Test {
 
   static float prefixOf(int code) { return static_cast<float>(ersSwstSeconds(code)); }
 
-  fs::path dir_;
+  support::TempFolder dir_{"ingest_sim"};
   SceneDescription scene_;
 };
 
@@ -158,122 +150,4 @@ TEST_F(ErsSceneTest, CleanSceneRasterRecordAndVectors) {
 
   // The generated chirp: round(fs T) samples.
   EXPECT_EQ(fs::file_size(out() + ".chirp"), std::uintmax_t(sim->replicaLength()) * 8u);
-}
-
-TEST_F(ErsSceneTest, DroppedLineAndCorruptWindowCode) {
-  scene_.dropLines = {100};
-  scene_.corruptSwstLines = {50};
-  scene_.corruptSwstDelta = 1000;
-  const auto sim = write();
-  ATERSExtractor x;
-  aim(x, *sim);
-  x.ChirpFile.clear();
-  ASSERT_EQ(x.run(), 0);
-  EXPECT_FALSE(fs::exists(out() + ".chirp"));  // no chirp asked for
-  const int n = kLines - 1;
-  ASSERT_EQ(x.getVectorLength(), n);
-  // The corrupt code is replaced by the previous one.
-  EXPECT_EQ(x.getSwstVector()[50], sim->swstCodeOf(49));
-  const std::vector<float> raster = rasterRows(out());
-  const std::size_t row = 1 + 2 * std::size_t(kSamples);
-  EXPECT_EQ(raster[row * 50], prefixOf(sim->swstCodeOf(49)));
-  // From the gap on, every line is flagged (the test is not resynchronised).
-  for (int k = 0; k < n; ++k) EXPECT_EQ(x.getMissingVector()[k], k < 100 ? 0 : 1) << k;
-  EXPECT_EQ(x.getCounterVector()[99], 100);
-  EXPECT_EQ(x.getCounterVector()[100], 102);
-  EXPECT_EQ(x.getMissingLines(), n - 100);
-  GeneralRAWData r;
-  ASSERT_EQ(r.readhdr(out() + ".hdr"), 0);
-  EXPECT_EQ(r.dataSetInfo.MissingLines, n - 100);
-  EXPECT_EQ(r.roi.Lines, n);
-  // The window statistics do not see the corrupt code.
-  EXPECT_NEAR(r.dataSetInfo.SWST_MAX, double(prefixOf(sim->swstCode())), 1e-12);
-}
-
-TEST_F(ErsSceneTest, DamagedFilesEndWithStatus) {
-  {
-    // Image file cut inside a record.
-    scene_.truncateImageBytes = 11644 + (412 + 2 * kSamples) * 10 + 100;
-    const auto sim = write();
-    ATERSExtractor x;
-    aim(x, *sim);
-    EXPECT_EQ(x.run(), 4);
-    EXPECT_EQ(x.getSwstVector(), nullptr);
-    EXPECT_FALSE(fs::exists(out() + ".hdr"));
-  }
-  scene_.truncateImageBytes = 0;
-  {
-    // Leader missing.
-    const auto sim = write();
-    fs::remove(sim->leaderPath(dir_.string()));
-    ATERSExtractor x;
-    aim(x, *sim);
-    EXPECT_EQ(x.run(), 9);
-  }
-  {
-    // A PRF field that holds no number.
-    scene_.leaderPatches = {{1654, "     NOT A VALUE"}};
-    const auto sim = write();
-    fs::remove(out());
-    ATERSExtractor x;
-    aim(x, *sim);
-    EXPECT_EQ(x.run(), 10);
-    EXPECT_FALSE(fs::exists(out()));
-  }
-  scene_.leaderPatches.clear();
-  {
-    // An arc of another time does not cover the scene: the orbit reader fails.
-    const auto sim = write();
-    const std::string real = TESSIVOR_REALDATA_DIR "/orbits/ers2_ODR.015";
-    if (fs::exists(real)) {
-      ATERSExtractor x;
-      aim(x, *sim);
-      x.OrbitFilename = real;
-      EXPECT_NE(x.run(), 0);
-      EXPECT_FALSE(fs::exists(out() + ".hdr"));
-    }
-    // The image file missing.
-    fs::remove(sim->imagePath(dir_.string()));
-    ATERSExtractor y;
-    aim(y, *sim);
-    EXPECT_EQ(y.run(), 9);
-  }
-}
-
-TEST_F(ErsSceneTest, OrbitArcFoundFromTheArchive) {
-  const auto sim = write();
-  Ers_level0 product;
-  ASSERT_EQ(product.setfileName(fs::path(sim->leaderPath(dir_.string())).parent_path().string()), 0);
-  ASSERT_EQ(product.getAuxFiles(3, (dir_ / "orbits").string()), 0);
-  EXPECT_EQ(product.getOrbitFilename(), sim->odrPath(dir_.string()));
-  EXPECT_EQ(product.isAuxValid(3), 1);
-}
-
-TEST_F(ErsSceneTest, WholeRunFromAParameterDocument) {
-  const auto sim = write();
-  const std::string doc = (dir_ / "job.xml").string();
-  {
-    ATERSExtractor setup;
-    aim(setup, *sim);
-    setup.ReportFilename = (dir_ / "ers.report").string();
-    ASSERT_EQ(setup.writepar(doc, 1), 0);
-  }
-  ATERSExtractor x;
-  ASSERT_EQ(x.runall(doc, 1), 0);
-  EXPECT_EQ(x.LeaFilename, sim->leaderPath(dir_.string()));
-  EXPECT_EQ(x.getVectorLength(), kLines);
-  EXPECT_TRUE(fs::exists(out() + ".hdr"));
-  EXPECT_TRUE(fs::exists(out() + ".chirp"));
-
-  // A document that points to a configuration file is left to it: nothing runs.
-  const std::string conf = (dir_ / "conf.xml").string();
-  std::ofstream(conf) << "<OrvaneXmlDoc><NumberOfChannels>1</NumberOfChannels><Description>x</Description>"
-                         "<Channel Number=\"1\"><ATERSExtractor>"
-                         "<ConfigurationFile>other.xml</ConfigurationFile>"
-                         "</ATERSExtractor></Channel></OrvaneXmlDoc>";
-  fs::remove(out());
-  ATERSExtractor y;
-  EXPECT_EQ(y.runall(conf, 1), 1);
-  EXPECT_FALSE(fs::exists(out()));
-  EXPECT_EQ(y.getSwstVector(), nullptr);
 }

@@ -2,71 +2,33 @@
 // command string, then the exit status and the files left behind. The
 // operating system keeps only the low 8 bits of the exit status, so each
 // code is checked in full in the _error file and the process log.
-#include <fcntl.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
 #include <gtest/gtest.h>
 
-#include <map>
-
 #include "base/status.h"
-#include "job_test_support.h"
+#include "support/files.h"
+#include "support/host_run.h"
+
+using namespace support;
 
 namespace {
 
-const char* const kFocuser = TESSIVOR_BINARY_DIR "/bin/stripmap_focuser";
-
-struct FocuserRun {
-  int status = -1;  // exit status as the parent sees it
-  std::string stderrText;
-};
-
-// Runs the focuser in folder with the given variables (an empty value
-// leaves the variable unset).
-FocuserRun runFocuser(const std::string& folder, const std::string& command,
-               const std::map<std::string, std::string>& variables) {
-  const std::string errFile = folder + "stderr.txt";
-  pid_t pid = fork();
-  if (pid == 0) {
-    for (const char* name : {"TESSIVOR_WORKING_DIR", "TESSIVOR_WORKING_FILE",
-                             "TESSIVOR_CEOS_DES_FILES_DIR", "TESSIVOR_TRACING"})
-      unsetenv(name);
-    for (const auto& [name, value] : variables)
-      if (!value.empty()) setenv(name.c_str(), value.c_str(), 1);
-    if (chdir(folder.c_str()) != 0) _exit(126);
-    int fd = open(errFile.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
-    if (fd >= 0) dup2(fd, STDERR_FILENO);
-    execl(kFocuser, "stripmap_focuser", command.c_str(), static_cast<char*>(nullptr));
-    _exit(127);
-  }
-  FocuserRun run;
-  int status = 0;
-  if (pid > 0 && waitpid(pid, &status, 0) == pid && WIFEXITED(status)) run.status = WEXITSTATUS(status);
-  run.stderrText = readText(errFile);
-  return run;
-}
-
-std::map<std::string, std::string> hostVariables(const std::string& folder) {
-  return {{"TESSIVOR_WORKING_DIR", folder},
-          {"TESSIVOR_WORKING_FILE", folder + "progress.txt"},
-          {"TESSIVOR_CEOS_DES_FILES_DIR", TESSIVOR_SOURCE_DIR "/resources/"},
-          {"TESSIVOR_TRACING", "ACTIVE"}};
-}
-
-bool contains(const std::string& text, const std::string& part) {
-  return text.find(part) != std::string::npos;
+// Runs the focuser on a command string, with the host's variables or none.
+FocuserRun hostRun(const std::string& folder, const std::string& command, bool hostVariables = true) {
+  RunOptions options;
+  options.command = command;
+  options.hostVariables = hostVariables;
+  return runFocuser(folder, "", options);
 }
 
 }  // namespace
 
 TEST(FocuserExecutable, TooFewParametersEndWith456962) {
-  const std::string dir = freshFolder("exe");
-  std::vector<std::string> p = jobParameters("ERS", "/data/scene");
+  const std::string dir = scratchDir("exe");
+  std::vector<std::string> p = basicJob("ERS", "/data/scene", "/tmp/out");
   p.pop_back();  // 24 lines in all
   writeJob(dir + "job.txt", p);
-  const FocuserRun run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt", hostVariables(dir));
-  EXPECT_EQ(run.status, EC_TOO_FEW_PARAMETERS & 0xFF);
+  const FocuserRun result = hostRun(dir, "main_focussing_stripmap#" + dir + "job.txt");
+  EXPECT_EQ(result.exitStatus, EC_TOO_FEW_PARAMETERS & 0xFF);
   EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 456962]"));
   const std::string log = readText(dir + "Process.log");
   EXPECT_TRUE(contains(log, "\nSTART : Focussing stripmap  [  ]\n"));
@@ -74,18 +36,17 @@ TEST(FocuserExecutable, TooFewParametersEndWith456962) {
   EXPECT_TRUE(contains(log, " Parameter 22 (NotOK)\n"));
   EXPECT_TRUE(contains(log, "[ERROR ID : 456962]"));
   EXPECT_FALSE(contains(log, "INPUT SATELLITE"));
-  EXPECT_TRUE(contains(run.stderrText, "Starting initalization phase\n"));
-  EXPECT_TRUE(contains(run.stderrText, "End of initalization phase\n"));
+  EXPECT_TRUE(contains(result.stderrText, "Starting initalization phase\n"));
+  EXPECT_TRUE(contains(result.stderrText, "End of initalization phase\n"));
 }
 
 // Without an orbit file or an orbit folder the ERS focuser cannot be set up.
 TEST(FocuserExecutable, WellFormedErsJobWithoutOrbitStopsAtInitialisation) {
-  const std::string dir = freshFolder("exe");
-  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
-  const FocuserRun run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt###Tessivor###more",
-                             hostVariables(dir));
+  const std::string dir = scratchDir("exe");
+  writeJob(dir + "job.txt", basicJob("ERS", "/data/scene", "/tmp/out"));
+  const FocuserRun result = hostRun(dir, "main_focussing_stripmap#" + dir + "job.txt###Tessivor###more");
   // 130560 is 510 x 256: the parent sees 0, the files tell the code.
-  EXPECT_EQ(run.status, EC_STAGE_FAILED & 0xFF);
+  EXPECT_EQ(result.exitStatus, EC_STAGE_FAILED & 0xFF);
   EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 130560]"));
   const std::string log = readText(dir + "Process.log");
   EXPECT_TRUE(contains(log, "\nSTART : Focussing stripmap  [  ]\n"));
@@ -108,10 +69,10 @@ TEST(FocuserExecutable, WellFormedErsJobWithoutOrbitStopsAtInitialisation) {
 }
 
 TEST(FocuserExecutable, UnknownPlatformAndUnsupportedEnvisatProductEndWith1) {
-  const std::string dir = freshFolder("exe");
-  writeJob(dir + "job.txt", jobParameters("SEASAT", "/data/scene"));
-  FocuserRun run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt", hostVariables(dir));
-  EXPECT_EQ(run.status, 1);
+  const std::string dir = scratchDir("exe");
+  writeJob(dir + "job.txt", basicJob("SEASAT", "/data/scene", "/tmp/out"));
+  FocuserRun result = hostRun(dir, "main_focussing_stripmap#" + dir + "job.txt");
+  EXPECT_EQ(result.exitStatus, 1);
   EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 1]"));
   std::string log = readText(dir + "Process.log");
   EXPECT_TRUE(contains(log, "INPUT SATELLITE  : [ SEASAT ]"));
@@ -119,44 +80,44 @@ TEST(FocuserExecutable, UnknownPlatformAndUnsupportedEnvisatProductEndWith1) {
   EXPECT_TRUE(contains(log, "[ERROR ID : 1]"));
 
   writeText(dir + "scene.N1", std::string(200, 'x'));
-  writeJob(dir + "job.txt", jobParameters("ENVISAT", dir + "scene.N1"));
-  run = runFocuser(dir, "main_focussing_stripmap#" + dir + "job.txt", hostVariables(dir));
-  EXPECT_EQ(run.status, 1);
+  writeJob(dir + "job.txt", basicJob("ENVISAT", dir + "scene.N1", "/tmp/out"));
+  result = hostRun(dir, "main_focussing_stripmap#" + dir + "job.txt");
+  EXPECT_EQ(result.exitStatus, 1);
   log = readText(dir + "Process.log");
   EXPECT_TRUE(contains(log, "PROCESSING ERROR: File type not supported - line"));
 }
 
 TEST(FocuserExecutable, CommandStringNotUnderstoodEndsWith456963) {
-  const std::string dir = freshFolder("exe");
-  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
-  const FocuserRun run = runFocuser(dir, "main_focusing_stripmap#" + dir + "job.txt", hostVariables(dir));
-  EXPECT_EQ(run.status, EC_BAD_COMMAND & 0xFF);
+  const std::string dir = scratchDir("exe");
+  writeJob(dir + "job.txt", basicJob("ERS", "/data/scene", "/tmp/out"));
+  const FocuserRun result = hostRun(dir, "main_focusing_stripmap#" + dir + "job.txt");
+  EXPECT_EQ(result.exitStatus, EC_BAD_COMMAND & 0xFF);
   EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 456963]"));
   EXPECT_TRUE(contains(readText(dir + "Process.trace"), "main_focusing_stripmap#" + dir + "job.txt\n"));
   EXPECT_TRUE(contains(readText(dir + "Process.log"), "[ERROR ID : 456963]"));
-  EXPECT_TRUE(contains(run.stderrText, "ERROR 456963"));
+  EXPECT_TRUE(contains(result.stderrText, "ERROR 456963"));
 }
 
 TEST(FocuserExecutable, JobFileLookupInTheWorkingFolder) {
-  const std::string dir = freshFolder("exe");
+  const std::string dir = scratchDir("exe");
   // Found by its name in TESSIVOR_WORKING_DIR.
-  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
-  FocuserRun run = runFocuser(dir, "main_focussing_stripmap#/elsewhere/job.txt", hostVariables(dir));
-  EXPECT_EQ(run.status, EC_STAGE_FAILED & 0xFF);
+  writeJob(dir + "job.txt", basicJob("ERS", "/data/scene", "/tmp/out"));
+  FocuserRun result = hostRun(dir, "main_focussing_stripmap#/elsewhere/job.txt");
+  EXPECT_EQ(result.exitStatus, EC_STAGE_FAILED & 0xFF);
   EXPECT_TRUE(contains(readText(dir + "progress.txt_error"), "[EC : 130560]"));
   // Nowhere: file not found.
-  run = runFocuser(dir, "main_focussing_stripmap#/elsewhere/absent.txt", hostVariables(dir));
-  EXPECT_EQ(run.status, EC_FILE_NOT_FOUND & 0xFF);
+  result = hostRun(dir, "main_focussing_stripmap#/elsewhere/absent.txt");
+  EXPECT_EQ(result.exitStatus, EC_FILE_NOT_FOUND & 0xFF);
   const std::string error = readText(dir + "progress.txt_error");
   EXPECT_TRUE(contains(error, "/elsewhere/absent.txt"));
   EXPECT_TRUE(contains(error, "[EC : 261122]"));
 }
 
 TEST(FocuserExecutable, UnsetVariablesFallBackToTheResourcesAndTheCurrentFolder) {
-  const std::string dir = freshFolder("exe");
-  writeJob(dir + "job.txt", jobParameters("ERS", "/data/scene"));
-  const FocuserRun run = runFocuser(dir, "main_focussing_stripmap#job.txt", {});
-  EXPECT_EQ(run.status, EC_STAGE_FAILED & 0xFF);
+  const std::string dir = scratchDir("exe");
+  writeJob(dir + "job.txt", basicJob("ERS", "/data/scene", "/tmp/out"));
+  const FocuserRun result = hostRun(dir, "main_focussing_stripmap#job.txt", false);
+  EXPECT_EQ(result.exitStatus, EC_STAGE_FAILED & 0xFF);
   // Catalogue texts found in the installed resources; logs and the _error
   // file in the current folder.
   EXPECT_TRUE(contains(readText(dir + "Process.log"), "FOCUSSING STAGE FAILED"));

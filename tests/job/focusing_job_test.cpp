@@ -4,23 +4,13 @@
 
 #include "ingest/product_types.h"
 #include "job/focusing_job.h"
-#include "job_test_support.h"
+#include "support/files.h"
+#include "support/host_run.h"
 
-TEST(FocusingJob, LabelledLinesOfTheStartBanner) {
-  std::vector<std::string> p(24);
-  for (int i = 0; i < 24; ++i) p[i] = std::string(1, 'v').append(std::to_string(i));
-  EXPECT_EQ(jobLabelText(p),
-            "\nINPUT SATELLITE  : [ v0 ]\nINPUT SCENE      : [ v1 ]\nINPUT SCENE_2    : [ v2 ]\n"
-            "INPUT SCENE_3    : [ v3 ]\nINPUT SCENE_4    : [ v4 ]\nOUTPUT ROOT NAME : [ v5 ]\n"
-            "INPUT FILE 1     : [ v6 ]\nINPUT FILE 2     : [ v7 ]\nINPUT FILE 3     : [ v8 ]\n"
-            "INPUT FILE 4     : [ v9 ]\nINPUT FILE 5     : [ v10 ]\nINPUT DIR 1      : [ v11 ]\n"
-            "INPUT DIR 2      : [ v12 ]\nINPUT DIR 3      : [ v13 ]\nINPUT DIR 4      : [ v14 ]\n"
-            "INPUT DIR 5      : [ v15 ]\nSKIP LINES       : [ v16 ]\nEXTRACT LINES    : [ v17 ]\n"
-            "ERASE TEMPORARY  : [ v18 ]\n");
-}
+using namespace support;
 
 TEST(FocusingJob, FieldsFromTheParameters) {
-  std::vector<std::string> p = jobParameters("ERS", "/data/scene");
+  std::vector<std::string> p = basicJob("ERS", "/data/scene", "/tmp/out");
   p[2] = "/data/second";
   p[6] = "/orbits/ODR.007";
   p[11] = "/orbits";
@@ -51,7 +41,7 @@ TEST(FocusingJob, FieldsFromTheParameters) {
 
   // ENVISAT: directories 2 to 4 with neither file nor folder given become
   // the description-file folder; 1 and 5 never do.
-  p = jobParameters("ENVISAT", "/data/asar.N1");
+  p = basicJob("ENVISAT", "/data/asar.N1", "/tmp/out");
   p[8] = "/aux/xca";   // file 3 given
   p[14] = "/aux/xch";  // folder 4 given
   fillFocuserFields(f, p, "/des/");
@@ -95,7 +85,7 @@ static void writeEnvisatHead(const std::string& file, const std::string& product
 }
 
 TEST(FocusingJob, EnvisatProfileByProductType) {
-  const std::string dir = freshFolder("envisat");
+  const std::string dir = scratchDir("envisat");
   const struct {
     const char* product;
     const char* profile;
@@ -127,23 +117,4 @@ TEST(FocusingJob, EnvisatProfileByProductType) {
   EnvisatTypes shortFile(dir + "short.N1");
   EXPECT_EQ(shortFile.is_im0(), 0);
   EXPECT_EQ(EnvisatTypes(dir + "absent.N1").is_im0(), 0);
-}
-
-TEST(ProductTypes, RealEnvisatAndErsFiles) {
-  const std::string real = TESSIVOR_REALDATA_DIR;
-  if (!std::filesystem::exists(real)) GTEST_SKIP() << "real data folder absent";
-  const EnvisatTypes im0(real + "/envisat/ASA_IM__0CNPDE20120329_071134_000000163113_00121_52721_6279.N1");
-  EXPECT_EQ(im0.is_im0(), 1);
-  EXPECT_EQ(im0.is_aph() + im0.is_apv() + im0.is_apc(), 0);
-  const EnvisatTypes xca(real + "/envisat/ASA_XCA_AXVIEC20070517_153558_20070204_165113_20071231_000000");
-  EXPECT_EQ(xca.is_im0() + xca.is_aph() + xca.is_apv() + xca.is_apc(), 0);
-
-  // ERS-1 with a lower-case leader, ERS-2 with an upper-case one.
-  const ErsTypes ers1(real + "/ers1_2000_orbit44928");
-  EXPECT_EQ(ers1.leaderPath(), real + "/ers1_2000_orbit44928/lea_01.001");
-  EXPECT_EQ(ers1.is_ers1(), 1);
-  const ErsTypes ers2(real + "/ers2_2010_orbit77106/");
-  EXPECT_EQ(ers2.leaderPath(), real + "/ers2_2010_orbit77106/LEA_01.001");
-  EXPECT_EQ(ers2.is_ers1(), 0);
-  EXPECT_EQ(ErsTypes(real + "/envisat").is_ers1(), 0);
 }

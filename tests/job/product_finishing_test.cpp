@@ -7,13 +7,14 @@
 #include <vector>
 
 #include "job/focuser_handover.h"
-#include "job_test_support.h"
+#include "support/files.h"
+#include "support/host_run.h"
 #include "output/description_xml.h"
 #include "output/general_sar_kelmir.h"
 #include "output/raster_to_geotiff.h"
 #include "product/general_sar.h"
 
-namespace fs = std::filesystem;
+using namespace support;
 
 namespace {
 
@@ -73,13 +74,13 @@ void palsarImage(const std::string& name, char transmit, char receive) {
 }  // namespace
 
 TEST(ProductFinishing, SingleFileProduct) {
-  const std::string dir = freshFolder("finish");
+  const std::string dir = scratchDir("finish");
   const std::string out = dir + "out";
   makeProduct(out, 16);
   const std::string originalRecord = readText(out + ".hdr");
   FinishedFocuser focuser;
   focuser.job.outputFilename = out;
-  auto p = jobParameters("ERS", dir + "scene");
+  auto p = basicJob("ERS", dir + "scene", "/tmp/out");
   p[5] = out;
   p[20] = "3";
   p[21] = "4";
@@ -121,14 +122,14 @@ TEST(ProductFinishing, SingleFileProduct) {
 }
 
 TEST(ProductFinishing, AlternatingPolarisationChannels) {
-  const std::string dir = freshFolder("finish");
+  const std::string dir = scratchDir("finish");
   const std::string out = dir + "ap";
   makeProduct(out + "1", 4);
   makeProduct(out + "1_descallop", 12, "V/V");
   makeProduct(out + "2_descallop", 20, "H/V");  // the undescalloped channel 2 is missing
   FinishedFocuser focuser;
   focuser.job.outputFilename = out;
-  auto p = jobParameters("ENVISAT", dir + "scene");
+  auto p = basicJob("ENVISAT", dir + "scene", "/tmp/out");
   p[5] = out;
   p[22] = "OK";
   tesv_clear_geotiff_requests();
@@ -159,7 +160,7 @@ TEST(ProductFinishing, AlternatingPolarisationChannels) {
 }
 
 TEST(ProductFinishing, MultiFilePalsarProducts) {
-  const std::string dir = freshFolder("finish");
+  const std::string dir = scratchDir("finish");
   const std::string out = dir + "pal";
   std::string leader(3000, ' ');
   leader.replace(1108, 4, "   4");  // quad polarisation
@@ -176,7 +177,7 @@ TEST(ProductFinishing, MultiFilePalsarProducts) {
   FinishedFocuser focuser;
   focuser.job.outputFilename = out;
   focuser.job.auxFile2 = dir + "LED";
-  auto p = jobParameters("PALSAR", dir + "IMG-HH");
+  auto p = basicJob("PALSAR", dir + "IMG-HH", "/tmp/out");
   p[2] = dir + "IMG-VV";
   p[3] = dir + "IMG-X";
   p[5] = out;

@@ -52,34 +52,6 @@ TEST(Remez, LowPassMeetsTheRippleAndAttenuationItWasDesignedFor) {
   EXPECT_NEAR(response(h, 0.123).imag(), 0.0, 1e-12);
 }
 
-TEST(Remez, EquirippleAlternationOfAnEvenLengthDesign) {
-  // Even length (type II): r = n/2 cosine terms, so the weighted error must
-  // reach its peak with alternating sign at least r + 1 times.
-  const int n = 24;
-  const double bands[4] = {0.0, 0.1, 0.2, 0.5}, des[2] = {1.0, 0.0}, wt[2] = {1.0, 1.0};
-  std::vector<double> h(n);
-  ASSERT_EQ(remez_(h.data(), n, 2, bands, des, wt, REMEZ_BANDPASS), 0);
-  for (int k = 0; k < n; ++k) EXPECT_NEAR(h[k], h[n - 1 - k], 1e-15);
-  std::vector<double> f, err;
-  for (int i = 0; i <= 40000; ++i) {
-    const double x = 0.5 * i / 40000;
-    if (x > 0.1 && x < 0.2) continue;
-    f.push_back(x);
-    err.push_back((x <= 0.1 ? 1.0 : 0.0) - response(h, x).real());
-  }
-  double peak = 0;
-  for (double v : err) peak = std::max(peak, std::fabs(v));
-  int alternations = 0;
-  double lastSign = 0;
-  for (std::size_t i = 0; i < err.size(); ++i)
-    if (std::fabs(err[i]) > peak * (1 - 1e-3) && err[i] * lastSign <= 0) {
-      ++alternations;
-      lastSign = err[i] > 0 ? 1 : -1;
-    }
-  EXPECT_GE(alternations, n / 2 + 1);
-  EXPECT_LT(peak, 0.05);
-}
-
 TEST(Remez, ComplexFormHasZeroImaginaryPartsAndBadBandsFail) {
   const int n = 31;
   const double bands[4] = {0.0, 0.1, 0.16, 0.5}, des[2] = {1.0, 0.0}, wt[2] = {1.0, 5.0};
@@ -95,30 +67,6 @@ TEST(Remez, ComplexFormHasZeroImaginaryPartsAndBadBandsFail) {
   EXPECT_NE(remez(h.data(), n, 2, bad, des, wt), 0);
   const double beyond[4] = {0.0, 0.2, 0.3, 0.6};
   EXPECT_NE(remez(h.data(), n, 2, beyond, des, wt), 0);
-}
-
-TEST(Remez, HilbertTransformerIsAntisymmetricWithUnitGain) {
-  const int n = 31;
-  const double bands[2] = {0.05, 0.45}, des[1] = {1.0}, wt[1] = {1.0};
-  std::vector<double> h(n);
-  ASSERT_EQ(remez_(h.data(), n, 1, bands, des, wt, REMEZ_HILBERT), 0);
-  for (int k = 0; k < n; ++k) EXPECT_NEAR(h[k], -h[n - 1 - k], 1e-15);
-  for (double f = 0.05; f <= 0.45; f += 0.01) EXPECT_NEAR(std::abs(response(h, f)), 1.0, 0.02);
-}
-
-TEST(Remez, DifferentiatorHasAResponseProportionalToFrequency) {
-  // Desired slope 1: H(f) = j f within the band, for odd and even lengths.
-  for (int n : {31, 32}) {
-    const double bands[2] = {0.0, 0.45}, des[1] = {1.0}, wt[1] = {1.0};
-    std::vector<double> h(n);
-    ASSERT_EQ(remez_(h.data(), n, 1, bands, des, wt, REMEZ_DIFFERENTIATOR), 0);
-    for (int k = 0; k < n; ++k) EXPECT_NEAR(h[k], -h[n - 1 - k], 1e-15);
-    for (double f = 0.05; f <= 0.4; f += 0.05) {
-      const std::complex<double> r = response(h, f);
-      EXPECT_NEAR(r.real(), 0.0, 1e-12);
-      EXPECT_NEAR(r.imag() / f, 1.0, 0.02) << n << " " << f;
-    }
-  }
 }
 
 // Spectrum (along the wavenumber axis) of a signal occupying the first 80 %
@@ -166,38 +114,6 @@ TEST(MakeGLS, KernelTableInterpolatesSpectraOfLeadingSignals) {
   }
   EXPECT_LT(std::sqrt(err2 / sig2), 0.02);
   EXPECT_LT(err2, truncErr2);  // least squares beats truncation
-}
-
-TEST(MakeGLS, LowPassKernelsAreRealMirroredAndInterpolateInBandSignals) {
-  const int n = 8, nfrac = 21;
-  const double B = 0.7;
-  std::vector<fcomplex> table(static_cast<std::size_t>(n) * nfrac);
-  ASSERT_EQ(MakeGLSlowpass(table.data(), n, nfrac, B), 0);
-  for (int row = 0; row < nfrac; ++row)
-    for (int m = 0; m < n; ++m) {
-      EXPECT_EQ(table[row * n + m].imag(), 0.0f);
-      EXPECT_NEAR(table[row * n + m].real(), table[(nfrac - 1 - row) * n + (n - 1 - m)].real(),
-                  1e-5f);
-    }
-  // glsF on a tone inside the band.
-  std::vector<float> sig(64);
-  for (int i = 0; i < 64; ++i) sig[i] = static_cast<float>(std::cos(2 * kPi * 0.2 * i + 0.4));
-  std::vector<double> where = {20.25, 30.5, 31.0, 40.9};
-  std::vector<float> out(where.size());
-  glsF(sig.data(), 64, where.data(), out.data(), static_cast<int>(where.size()), table.data(), n,
-       nfrac);
-  for (std::size_t i = 0; i < where.size(); ++i)
-    EXPECT_NEAR(out[i], std::cos(2 * kPi * 0.2 * where[i] + 0.4), 0.02) << where[i];
-  std::vector<fcomplex> csig(64), cout(where.size());
-  for (int i = 0; i < 64; ++i) csig[i] = fcomplex(sig[i], 2.0f * sig[i]);
-  glsFcomplex(csig.data(), 64, where.data(), cout.data(), static_cast<int>(where.size()),
-              table.data(), n, nfrac);
-  for (std::size_t i = 0; i < where.size(); ++i) {
-    EXPECT_FLOAT_EQ(cout[i].real(), out[i]);
-    EXPECT_NEAR(cout[i].imag(), 2.0f * out[i], 1e-5f);
-  }
-  EXPECT_NE(MakeGLSlowpass(table.data(), n, nfrac, 0.0), 0);
-  EXPECT_NE(MakeGLS(table.data(), 0, nfrac, 0.5), 0);
 }
 
 }  // namespace

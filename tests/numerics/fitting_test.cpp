@@ -58,96 +58,6 @@ TEST(PolynomialFits, OrbffitInterpolatesOrbitTimesExactly) {
     }
 }
 
-TEST(LinearFits, LfitdFitsOnlyMaskedTermsAndSpreadsCovariance) {
-  // y = 1 + 2 u + 3 v + 0.5 u v over a 10 x 4 grid numbered n = 10 v + u.
-  auto basis = [](double n, NrVector<double>& af, int ma) {
-    const double u = std::fmod(n, 10.0), v = std::floor(n / 10.0);
-    const double b[4] = {1.0, u, v, u * v};
-    for (int j = 1; j <= ma; ++j) af[j] = b[j - 1];
-  };
-  const int nd = 40;
-  NrVector<double> x(1, nd), y(1, nd), sig(1, nd, 1.0);
-  for (int i = 1; i <= nd; ++i) {
-    x[i] = i - 1;
-    const double u = std::fmod(x[i], 10.0), v = std::floor(x[i] / 10.0);
-    y[i] = 1.0 + 2.0 * u + 3.0 * v + 0.5 * u * v;
-  }
-  NrVector<double> a(1, 4, 0.0);
-  NrVector<int> ia(1, 4, 1);
-  NrMatrix<double> covar(1, 4, 1, 4);
-  double chisq = -1;
-  ASSERT_EQ(lfitd(x, y, sig, nd, a, ia, 4, covar, &chisq, basis), 0);
-  EXPECT_NEAR(a[1], 1.0, 1e-12);
-  EXPECT_NEAR(a[2], 2.0, 1e-12);
-  EXPECT_NEAR(a[3], 3.0, 1e-12);
-  EXPECT_NEAR(a[4], 0.5, 1e-12);
-  EXPECT_LT(chisq, 1e-18);
-
-  // Hold term 3 at a wrong fixed value: it keeps that value, the fixed
-  // term's row and column of the covariance are zero, and the others absorb
-  // what they can.
-  NrVector<double> b(1, 4, 0.0);
-  b[3] = 2.0;
-  NrVector<int> mask(1, 4, 1);
-  mask[3] = 0;
-  ASSERT_EQ(lfitd(x, y, sig, nd, b, mask, 4, covar, &chisq, basis), 0);
-  EXPECT_EQ(b[3], 2.0);
-  for (int j = 1; j <= 4; ++j) {
-    EXPECT_EQ(covar[3][j], 0.0);
-    EXPECT_EQ(covar[j][3], 0.0);
-  }
-  EXPECT_GT(covar[1][1], 0.0);
-  EXPECT_GT(chisq, 1.0);
-  // With the correct fixed value, the fit of the others is exact again.
-  b[3] = 3.0;
-  ASSERT_EQ(lfitd(x, y, sig, nd, b, mask, 4, covar, &chisq, basis), 0);
-  EXPECT_NEAR(b[1], 1.0, 1e-12);
-  EXPECT_NEAR(b[2], 2.0, 1e-12);
-  EXPECT_NEAR(b[4], 0.5, 1e-12);
-
-  NrVector<int> none(1, 4, 0);
-  EXPECT_EQ(lfitd(x, y, sig, nd, b, none, 4, covar, &chisq, basis), 1);
-}
-
-TEST(LinearFits, LfitModAndSvdfitAgreeOnANoisyLine) {
-  const int nd = 9;
-  const double noise[nd] = {0.3, -0.1, 0.2, -0.4, 0.1, 0.0, -0.2, 0.3, -0.2};
-  NrVector<double> x(1, nd), y(1, nd), sig(1, nd);
-  for (int i = 1; i <= nd; ++i) {
-    x[i] = 0.5 * i;
-    y[i] = 4.0 - 1.5 * x[i] + noise[i - 1];
-    sig[i] = 0.5 + 0.1 * i;
-  }
-  auto basis = [](double xv, NrVector<double>& af, int) {
-    af[1] = 1.0;
-    af[2] = xv;
-  };
-  NrVector<double> a1(1, 2, 0.0), a2(1, 2, 0.0), w(1, 2);
-  NrVector<int> ia(1, 2, 1);
-  NrMatrix<double> covar(1, 2, 1, 2), u(1, nd, 1, 2), v(1, 2, 1, 2);
-  double chi1, chi2;
-  ASSERT_EQ(lfit_mod(y, sig, nd, a1, ia, 2, covar, &chi1,
-                     [&](int i, NrVector<double>& af, int ma) { basis(x[i], af, ma); }),
-            0);
-  ASSERT_EQ(svdfit(x, y, sig, nd, a2, 2, u, v, w, &chi2, basis), 0);
-  EXPECT_NEAR(a1[1], a2[1], 1e-12);
-  EXPECT_NEAR(a1[2], a2[2], 1e-12);
-  EXPECT_NEAR(chi1, chi2, 1e-12);
-  // Weighted normal equations: the weighted residuals are orthogonal to the basis.
-  double s0 = 0, s1 = 0;
-  for (int i = 1; i <= nd; ++i) {
-    const double e = (y[i] - a1[1] - a1[2] * x[i]) / (sig[i] * sig[i]);
-    s0 += e;
-    s1 += e * x[i];
-  }
-  EXPECT_NEAR(s0, 0.0, 1e-12);
-  EXPECT_NEAR(s1, 0.0, 1e-12);
-  NrVector<int> none(1, 2, 0);
-  EXPECT_EQ(lfit_mod(y, sig, nd, a1, none, 2, covar, &chi1,
-                     [&](int i, NrVector<double>& af, int ma) { basis(x[i], af, ma); }),
-            1);
-}
-
 TEST(LinearFits, SvdfitDropsADegenerateBasisTerm) {
   // Basis 1, x, 2x: the third term duplicates the second. The SVD fit zeroes
   // the null direction and still reproduces the line exactly.
@@ -189,19 +99,6 @@ TEST(RootFinding, RtbisFindsBracketedRootsAndRefusesOthers) {
   const double r3 = rtbis([](double x) { return x - 0.3; }, 0.0, 1e6, 1e-12, &status);
   EXPECT_EQ(status, 1);
   EXPECT_NEAR(r3, 0.3, 1e-5);
-}
-
-TEST(RootFinding, BrentAndOptimBrFindMinima) {
-  double xmin = 0;
-  int status = -1;
-  const double fmin = brent(0.0, 1.0, 4.0, [](double x) { return (x - 2.5) * (x - 2.5) + 1.0; },
-                            1e-10, &xmin, &status);
-  EXPECT_EQ(status, 0);
-  EXPECT_NEAR(xmin, 2.5, 3e-8);  // a flat minimum: sqrt of the precision
-  EXPECT_NEAR(fmin, 1.0, 1e-15);
-  optim_br([](double x) { return -std::sin(x); }, 0.0, 3.0, 1e-10, &xmin, &status);
-  EXPECT_EQ(status, 0);
-  EXPECT_NEAR(xmin, M_PI / 2, 1e-7);
 }
 
 }  // namespace

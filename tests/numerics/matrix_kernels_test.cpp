@@ -25,26 +25,6 @@ NrVector<double> rhsOf(const NrMatrix<double>& a) {
   return b;
 }
 
-TEST(NrArrays, BoundsAreInclusiveAndOffset) {
-  NrVector<double> v(-2, 3);
-  EXPECT_EQ(v.size(), 6u);
-  for (long i = -2; i <= 3; ++i) v[i] = static_cast<double>(i);
-  EXPECT_EQ(v.data()[0], -2.0);
-  EXPECT_EQ(v.data()[5], 3.0);
-  NrMatrix<int> m(1, 2, 0, 2);
-  m[2][0] = 7;
-  m[1][2] = 5;
-  EXPECT_EQ(m.data()[3], 7);
-  EXPECT_EQ(m.data()[2], 5);
-  EXPECT_EQ(m.rows(), 2);
-  EXPECT_EQ(m.cols(), 3);
-  NrMatrix<int> s = submatrix(m, 1, 2, 1, 2, 1, 1);
-  EXPECT_EQ(s[1][2], 5);
-  NrTensor3<float> t = f3tensor(1, 2, 1, 3, 1, 4);
-  t(2, 3, 4) = 1.5f;
-  EXPECT_EQ(t.data()[23], 1.5f);
-}
-
 TEST(LinearSolvers, LuGaussJordanSvdQrSolveTheSameSystem) {
   {
     NrMatrix<double> a = testMatrix();
@@ -126,48 +106,6 @@ TEST(LinearSolvers, LuGaussJordanSvdQrSolveTheSameSystem) {
   }
 }
 
-TEST(LinearSolvers, SvdOfTallMatrixAndKnownSingularValues) {
-  // Columns orthogonal with norms 3, 2 and 0.5: singular values known exactly.
-  NrMatrix<double> a(1, 5, 1, 3), v(1, 3, 1, 3);
-  a.fill(0.0);
-  a[1][1] = 3.0;
-  a[2][2] = 2.0;
-  a[3][3] = 0.3;
-  a[4][3] = 0.4;
-  NrVector<double> w(1, 3);
-  ASSERT_EQ(svdcmp(a, 5, 3, w, v), 0);
-  std::vector<double> s = {w[1], w[2], w[3]};
-  std::sort(s.begin(), s.end());
-  EXPECT_NEAR(s[0], 0.5, 1e-15);
-  EXPECT_NEAR(s[1], 2.0, 1e-15);
-  EXPECT_NEAR(s[2], 3.0, 1e-15);
-  NrMatrix<double> wide(1, 2, 1, 3), v3(1, 3, 1, 3);
-  EXPECT_NE(svdcmp(wide, 2, 3, w, v3), 0);
-}
-
-TEST(LinearSolvers, QrLeastSquaresMatchesNormalEquations) {
-  // Line through noisy points: y = 2 + 0.5 x with residuals summing to zero.
-  const double xs[6] = {0, 1, 2, 3, 4, 5};
-  const double r[6] = {0.1, -0.2, 0.1, 0.1, -0.2, 0.1};
-  NrMatrix<double> a(1, 6, 1, 2);
-  NrVector<double> b(1, 6), x(1, 2);
-  for (int i = 1; i <= 6; ++i) {
-    a[i][1] = 1.0;
-    a[i][2] = xs[i - 1];
-    b[i] = 2.0 + 0.5 * xs[i - 1] + r[i - 1];
-  }
-  ASSERT_EQ(qr_solve(a, 6, 2, b, x), 0);
-  // The residuals are orthogonal to both columns only for the exact least-squares line.
-  double s0 = 0, s1 = 0;
-  for (int i = 1; i <= 6; ++i) {
-    const double e = b[i] - x[1] - x[2] * xs[i - 1];
-    s0 += e;
-    s1 += e * xs[i - 1];
-  }
-  EXPECT_NEAR(s0, 0.0, 1e-13);
-  EXPECT_NEAR(s1, 0.0, 1e-13);
-}
-
 TEST(LinearSolvers, SingularSystemsReportAndFail) {
   NrMatrix<double> a(1, 3, 1, 3);
   const double v[9] = {1, 2, 3, 2, 4, 6, 1, 0, 1};  // rows 1 and 2 dependent
@@ -187,28 +125,6 @@ TEST(LinearSolvers, SingularSystemsReportAndFail) {
   bool sing = false;
   EXPECT_NE(qrdcmp(s4, 3, c, dd, &sing), 0);
   EXPECT_TRUE(sing);
-}
-
-TEST(MatrixProducts, MmoltTransposeAndMatInv) {
-  const double a[6] = {1, 2, 3, 4, 5, 6};        // 2 x 3
-  const double b[6] = {7, 8, 9, 10, 11, 12};     // 3 x 2
-  double c[4];
-  ASSERT_EQ(Mmolt(a, 2, 3, b, 3, 2, c), 0);
-  EXPECT_DOUBLE_EQ(c[0], 58);
-  EXPECT_DOUBLE_EQ(c[1], 64);
-  EXPECT_DOUBLE_EQ(c[2], 139);
-  EXPECT_DOUBLE_EQ(c[3], 154);
-  EXPECT_EQ(Mmolt(a, 2, 3, b, 2, 3, c), 1);
-  double t[6];
-  Transpose_Matrix(a, 2, 3, t);
-  const double expect[6] = {1, 4, 2, 5, 3, 6};
-  for (int i = 0; i < 6; ++i) EXPECT_EQ(t[i], expect[i]);
-  const double m[9] = {2, 0, 1, 1, 3, 0, 0, 1, 4};
-  double mi[9], prod[9];
-  ASSERT_EQ(MatInv(m, mi, 3), 0);
-  ASSERT_EQ(Mmolt(m, 3, 3, mi, 3, 3, prod), 0);
-  for (int i = 0; i < 3; ++i)
-    for (int j = 0; j < 3; ++j) EXPECT_NEAR(prod[i * 3 + j], i == j ? 1.0 : 0.0, 1e-15);
 }
 
 }  // namespace

@@ -2,6 +2,8 @@
 // written here in the products' own layouts.
 #include <gtest/gtest.h>
 
+#include "support/files.h"
+
 #include <cmath>
 #include <cstdio>
 #include <cstring>
@@ -21,13 +23,8 @@ const std::string kOrbits = std::string(TESSIVOR_REALDATA_DIR) + "/orbits/";
 const std::string kDorVor =
     kOrbits + "DOR_VOR_AXVF-P20080331_075200_20080301_215527_20080303_002327";
 
-bool realDataPresent() { return fs::exists(kDorVor); }
 
-std::string tempDir(const std::string& name) {
-  fs::path p = fs::path(testing::TempDir()) / ("orbit_files_" + name);
-  fs::create_directories(p);
-  return p.string();
-}
+std::string tempDir(const std::string& name) { return support::scratchDir("orbit_files_" + name); }
 
 double norm3(const double* v) { return std::sqrt(v[0] * v[0] + v[1] * v[1] + v[2] * v[2]); }
 
@@ -105,23 +102,6 @@ std::string dorisFile(const std::string& product, double tFirst, int count) {
 
 }  // namespace
 
-TEST(OrbitTableSize, ShortAndLongScenes) {
-  double t0;
-  int n;
-  orbitTableSize(1000.0, 14.999, 5.0, &t0, &n);
-  EXPECT_EQ(n, 5);
-  EXPECT_DOUBLE_EQ(t0, 1000.0 + 14.999 / 2 - 10.0);
-  orbitTableSize(1000.0, 15.0, 5.0, &t0, &n);
-  // x = (1.4 * 15 / 5 + 1) / 2 = 2.6 -> 3, 7 vectors from t - 3.
-  EXPECT_EQ(n, 7);
-  EXPECT_DOUBLE_EQ(t0, 997.0);
-  orbitTableSize(0.0, 16.07, 5.0, &t0, &n);  // x = 2.7496 -> 3
-  EXPECT_EQ(n, 7);
-  orbitTableSize(0.0, 100.0, 5.0, &t0, &n);  // x = 14.5 -> 15 (half away from zero)
-  EXPECT_EQ(n, 31);
-  EXPECT_DOUBLE_EQ(t0, -20.0);
-}
-
 TEST(InterpOrbLagrange, ExactOnNodesAndPolynomialsOfDegreeEight) {
   double times[9], pts[27];
   auto f = [](double t, int a) { return 1.0 + a + 0.5 * t - 0.01 * t * t + 1e-9 * std::pow(t, 8); };
@@ -137,77 +117,6 @@ TEST(InterpOrbLagrange, ExactOnNodesAndPolynomialsOfDegreeEight) {
     EXPECT_NEAR(out[3 + a], f(95.0, a), 1e-9 * std::fabs(f(95.0, a)));
     EXPECT_NEAR(out[6 + a], f(500.0, a), 1e-8 * std::fabs(f(500.0, a)));
   }
-}
-
-TEST(DorisReader, RealDorVorFile) {
-  if (!realDataPresent()) GTEST_SKIP() << "real data folder absent";
-  const double start = ascii2sec85("01-MAR-2008 21:55:27.000000");
-  const double stop = ascii2sec85("03-MAR-2008 00:23:27.000000");
-  double pos[3 * 5], vel[3 * 5];
-  int orbit = 0;
-
-  // At the sensing start the first record comes back exactly.
-  ASSERT_EQ(interp_orb_l(kDorVor, start, 1, 5.0, pos, vel, &orbit), 0);
-  EXPECT_DOUBLE_EQ(pos[0], 6494931.106);
-  EXPECT_DOUBLE_EQ(pos[1], 578715.148);
-  EXPECT_DOUBLE_EQ(pos[2], -2977719.455);
-  EXPECT_DOUBLE_EQ(vel[2], 6692.698996);
-  EXPECT_EQ(orbit, 31388);
-
-  // At the stop time (accepted) the last record.
-  ASSERT_EQ(interp_orb_l(kDorVor, stop, 1, 5.0, pos, vel, &orbit), 0);
-  EXPECT_DOUBLE_EQ(pos[0], -587898.991);
-  EXPECT_DOUBLE_EQ(pos[2], -6938059.613);
-  EXPECT_EQ(orbit, 31404);
-
-  // Outside the sensing interval.
-  EXPECT_EQ(interp_orb_l(kDorVor, stop + 0.001, 1, 5.0, pos, vel), 13);
-  EXPECT_EQ(interp_orb_l(kDorVor, start - 1.0, 1, 5.0, pos, vel), 13);
-
-  // Five vectors 5 s apart between records: the interpolated velocity
-  // matches the derivative of the interpolated positions, and the radius is
-  // that of a low orbit.
-  const double tc = start + 3600.0 + 17.3;
-  ASSERT_EQ(interp_orb_l(kDorVor, tc, 5, 5.0, pos, vel), 0);
-  for (int a = 0; a < 3; ++a) {
-    double deriv = (pos[9 + a] - pos[3 + a]) / 10.0;
-    // Central difference of a 7.5 km/s orbit over 10 s: error ~ v w^2 h^2 / 6.
-    EXPECT_NEAR(deriv, vel[6 + a], 0.2);
-  }
-  EXPECT_NEAR(norm3(pos + 6), 7.16e6, 0.03e6);
-  EXPECT_NEAR(norm3(vel + 6), 7.4e3, 0.4e3);
-
-  // Ascending node: the first crossing lies between 22:01:27 and 22:02:27,
-  // where the orbit number turns from 31388 to 31389.
-  double node = 0.0;
-  ASSERT_EQ(interp_orb_l(kDorVor, start + 4000.0, 1, 5.0, pos, nullptr, nullptr, 1, &node), 0);
-  EXPECT_GT(node, ascii2sec85("01-MAR-2008 22:01:27.000000"));
-  EXPECT_LT(node, ascii2sec85("01-MAR-2008 22:02:27.000000"));
-  ASSERT_EQ(interp_orb_l(kDorVor, node, 1, 5.0, pos, nullptr), 0);
-  EXPECT_NEAR(pos[2], 0.0, 0.2);  // 1e-5 s of a 7 km/s z velocity is 0.07 m
-
-  // Before the first crossing there is no node.
-  EXPECT_EQ(interp_orb_l(kDorVor, start + 30.0, 1, 5.0, pos, nullptr, nullptr, 1, &node), 1);
-
-  // The records as they stand.
-  OrbitRecords rec;
-  ASSERT_EQ(get_state_vectors(kDorVor, start, stop, rec), 0);
-  ASSERT_EQ(rec.size(), 1589);
-  EXPECT_DOUBLE_EQ(rec.times[1] - rec.times[0], 60.0);
-  EXPECT_EQ(rec.orbit[7], 31389);
-  EXPECT_DOUBLE_EQ(rec.vel[3 * 1588 + 1], -4038.633991);
-
-  // Lagrange on every second record reproduces the record in between to
-  // well below a metre.
-  const int k = 700;
-  double nodesT[9], nodesP[27];
-  for (int j = 0; j < 9; ++j) {
-    nodesT[j] = rec.times[k + 2 * j];
-    for (int a = 0; a < 3; ++a) nodesP[3 * j + a] = rec.pos[3 * (k + 2 * j) + a];
-  }
-  double mid[3];
-  ASSERT_EQ(interp_orb_Lagrange(nodesP, nodesT, mid, &rec.times[k + 9], 1), 0);
-  for (int a = 0; a < 3; ++a) EXPECT_NEAR(mid[a], rec.pos[3 * (k + 9) + a], 0.05);
 }
 
 TEST(DorisReader, WrittenFilesAndFailures) {
@@ -296,85 +205,6 @@ std::vector<unsigned char> odrFile(const char* id, const char* sat, int first, i
 }
 
 }  // namespace
-
-TEST(DeosReader, ConversionOfARecord) {
-  double x[3];
-  deos_to_cartesian(0.0, 0.0, 0.0, x);
-  EXPECT_NEAR(x[0], 6378137.0, 1e-3);
-  deos_to_cartesian(90.0, 0.0, 1000.0, x);
-  EXPECT_NEAR(x[2], 6356752.314147896 + 1000.0, 1e-3);
-  EXPECT_NEAR(x[0], 0.0, 1e-6);
-}
-
-TEST(DeosReader, RealArcs) {
-  if (!realDataPresent()) GTEST_SKIP() << "real data folder absent";
-  const std::string ers1 = kOrbits + "ers1_ODR.079", ers2 = kOrbits + "ers2_ODR.015",
-                    envi = kOrbits + "envisat_ODR.051";
-  OrbitRecords rec;
-  std::string sat;
-  ASSERT_EQ(read_deos_odr(ers1, rec, &sat), 0);
-  EXPECT_EQ(sat, "ERS-1   ");
-  ASSERT_EQ(rec.size(), 7921);
-  EXPECT_DOUBLE_EQ(rec.times[0], ascii2sec85("10-APR-1992 12:00:00.000000"));
-  EXPECT_DOUBLE_EQ(rec.times[7920] - rec.times[0], 7920 * 60.0);
-  double x[3];
-  deos_to_cartesian(51.336660, 146.667523, 791674.515, x);
-  for (int a = 0; a < 3; ++a) EXPECT_NEAR(rec.pos[a], x[a], 1e-6);
-  EXPECT_NEAR(std::atan2(rec.pos[1], rec.pos[0]) * 180 / M_PI, 146.667523, 1e-9);
-  for (int i = 0; i < 7921; i += 500) EXPECT_NEAR(norm3(&rec.pos[3 * i]), 7.16e6, 0.04e6);
-  // Last record: 16-APR-1992 00:00:00, -45.439368, 346.199288, 802643.740 m.
-  EXPECT_DOUBLE_EQ(rec.times[7920], ascii2sec85("16-APR-1992 00:00:00.000000"));
-  deos_to_cartesian(-45.439368, 346.199288, 802643.740, x);
-  for (int a = 0; a < 3; ++a) EXPECT_NEAR(rec.pos[3 * 7920 + a], x[a], 1e-6);
-
-  // Positions at 5 s from nine records: the node record exactly, and a
-  // smooth velocity of a low orbit between.
-  const double header = 229609757.0;  // coverage starts at the header time
-  const double t = rec.times[2000];
-  ASSERT_GT(t, header);
-  double pos[3 * 13];
-  ASSERT_EQ(interp_orb_deos(ers1, t, "ERS1", t - 30.0, 5.0, 13, pos), 0);
-  for (int a = 0; a < 3; ++a) EXPECT_EQ(pos[3 * 6 + a], rec.pos[3 * 2000 + a]);
-  double v[3], acc[3];
-  for (int a = 0; a < 3; ++a) {
-    v[a] = (pos[3 * 7 + a] - pos[3 * 5 + a]) / 10.0;
-    acc[a] = (pos[3 * 7 + a] - 2 * pos[3 * 6 + a] + pos[3 * 5 + a]) / 25.0;
-  }
-  EXPECT_NEAR(norm3(v), 7.4e3, 0.4e3);
-  EXPECT_NEAR(norm3(acc), 7.8, 0.3);  // gravity at 785 km
-
-  // Interpolating every second record reproduces the one between to well
-  // under a metre (ODR positions are rounded to 1e-6 degree, ~0.1 m).
-  double nodesT[9], nodesP[27], mid[3];
-  for (int j = 0; j < 9; ++j) {
-    nodesT[j] = rec.times[3000 + 2 * j];
-    for (int a = 0; a < 3; ++a) nodesP[3 * j + a] = rec.pos[3 * (3000 + 2 * j) + a];
-  }
-  interp_orb_Lagrange(nodesP, nodesT, mid, &rec.times[3009], 1);
-  for (int a = 0; a < 3; ++a) EXPECT_NEAR(mid[a], rec.pos[3 * 3009 + a], 0.5);
-
-  // Coverage: before the header time, and past the arc.
-  EXPECT_EQ(interp_orb_deos(ers1, header - 1.0, "ERS1", header, 5.0, 5, pos), 1);
-  EXPECT_EQ(interp_orb_deos(ers1, rec.times.back() + 61.0, "ERS1", header, 5.0, 5, pos), 1);
-  EXPECT_EQ(interp_orb_deos(ers1, rec.times.back(), "ERS1", rec.times.back(), 5.0, 5, pos), 0);
-
-  // Satellite checks: xODR ERS-2 arc, and the ENVISAT arc refused.
-  ASSERT_EQ(read_deos_odr(ers2, rec, &sat), 0);
-  EXPECT_EQ(sat.substr(0, 5), "ERS-2");
-  EXPECT_NEAR(std::atan2(rec.pos[1], rec.pos[0]) * 180 / M_PI, -28.4788267, 1e-9);
-  ASSERT_EQ(rec.size(), 7921);
-  EXPECT_DOUBLE_EQ(rec.times[0], ascii2sec85("09-JUN-1995 12:00:00.000000"));
-  EXPECT_DOUBLE_EQ(rec.times[7920], 329788800.0);
-  deos_to_cartesian(61.3329987, 173.4338634, 793587.824, x);
-  for (int a = 0; a < 3; ++a) EXPECT_NEAR(rec.pos[3 * 7920 + a], x[a], 1e-6);
-  const double t2 = rec.times[3000];
-  EXPECT_EQ(interp_orb_deos(ers2, t2, "ERS2", t2, 5.0, 5, pos), 0);
-  EXPECT_EQ(interp_orb_deos(ers2, t2, "ERS1", t2, 5.0, 5, pos), 1);
-  EXPECT_EQ(interp_orb_deos(ers1, t, "ERS2", t, 5.0, 5, pos), 1);
-  EXPECT_EQ(interp_orb_deos(envi, 545012632.0 + 600, "ERS2", 545012632.0 + 600, 5.0, 5, pos), 1);
-  EXPECT_EQ(interp_orb_deos(envi, 545012632.0 + 600, "ERS1", 545012632.0 + 600, 5.0, 5, pos), 1);
-  EXPECT_EQ(interp_orb_deos(kDorVor, t, "ERS1", t, 5.0, 5, pos), 1);  // not a DEOS file
-}
 
 TEST(DeosReader, WrittenArcsAndFailures) {
   const std::string dir = tempDir("deos");

@@ -2,6 +2,8 @@
 // their layouts from a known orbit, read back through the loaders.
 #include <gtest/gtest.h>
 
+#include "support/files.h"
+
 #include <cmath>
 #include <cstdio>
 #include <cstring>
@@ -51,16 +53,9 @@ void toInertial(double g, const double p[3], const double v[3], double pi[3], do
   vi[2] = vr[2];
 }
 
-std::string tempDir() {
-  fs::path p = fs::path(testing::TempDir()) / "palsar_radarsat_orbit";
-  fs::create_directories(p);
-  return p.string();
-}
+std::string tempDir() { return support::scratchDir("palsar_radarsat_orbit"); }
 
-void writeText(const std::string& path, const std::string& s) {
-  std::ofstream f(path, std::ios::binary);
-  f << s;
-}
+using support::writeText;
 
 void put(std::string& b, std::size_t off, const std::string& text) { b.replace(off, text.size(), text); }
 

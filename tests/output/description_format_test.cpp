@@ -53,51 +53,9 @@ tesv_description_section sampleTree() {
 
 }  // namespace
 
-TEST(DescriptionSection, TextsDumpAndAddressing) {
-  EXPECT_STREQ(descriptionShapeText(FS_SCALAR), "SCALAR");
-  EXPECT_STREQ(descriptionShapeText(FS_VECTOR), "VECTOR");
-  EXPECT_STREQ(descriptionShapeText(FS_MATRIX), "MARTIX");
-  EXPECT_STREQ(descriptionShapeText(FS_MULTIPLE), "MULTIPLE");
-  EXPECT_STREQ(descriptionShapeText(FS_NOT_SET), "Not initialised");
-  EXPECT_STREQ(descriptionShapeText(17), "WRONG");
-  EXPECT_STREQ(descriptionTypeText(FT_FIELD_OF_SECTION), "Field Of Section pointer");
-  EXPECT_STREQ(descriptionTypeText(FT_NOT_SET), "Not initialised");
-  EXPECT_STREQ(descriptionTypeText(-3), "WRONG");
-
-  tesv_description_section root = sampleTree();
-  ASSERT_EQ(descriptionSectionNames().size(), 20u);
-  EXPECT_EQ(root.sections[0].name, "GCPRasterInfo");
-  EXPECT_EQ(root.sections[19].name, "EnvisatDescriptionRecord");
-  EXPECT_EQ(root.sections[7].name, "RasterInfo");
-
-  ASSERT_NE(root.getField("RasterInfo.NrOfPixelsPerLine"), nullptr);
-  EXPECT_EQ(root.getField("RasterInfo.NrOfPixelsPerLine")->dump(),
-            "[NrOfPixelsPerLine]  [SCALAR]  [Integer]  [Number of elements : 1]");
-  EXPECT_EQ(root.getField("Sensor.Matrix")->dump(), "[Matrix]  [MARTIX]  [Double]  [Row Nbr : 2]  [Col Nbr : 3]");
-  EXPECT_EQ(root.getField("Sensor.Pair")->dump(),
-            "[Pair]  [MULTIPLE]  [Not initialised]  [Number of sub fiels : 2]");
-  EXPECT_EQ(root.getField("NrOfPixelsPerLine"), nullptr);
-  EXPECT_EQ(root.getField("Nowhere.Field"), nullptr);
-  EXPECT_EQ(root.setMandatory("RasterInfo.Absent", true), 1);
-
-  // Conversions between types.
-  double d = 0;
-  long long i = 0;
-  std::string s;
-  EXPECT_EQ(root.getField("RasterInfo.NrOfPixelsPerLine")->getDouble(d), 0);
-  EXPECT_EQ(d, 4900.0);
-  EXPECT_EQ(root.getField("Sensor.Matrix")->getInt(i, 5), 1);  // 6.5 is no integer
-  EXPECT_EQ(root.getField("Sensor.Matrix")->getInt(i, 4), 0);
-  EXPECT_EQ(i, 5);
-  EXPECT_EQ(root.getField("RasterInfo.Text")->getDouble(d), 1);
-  EXPECT_EQ(root.getField("Sensor.Vector")->getString(s, 3), 0);
-  EXPECT_EQ(s, "3e+20");
-  EXPECT_EQ(root.getField("Sensor.Vector")->getDouble(d, 4), 1);
-}
-
 TEST(DescriptionXml, WrittenLayoutAndRoundTrip) {
-  DirGuard guard{freshDir()};
-  const std::string file = guard.dir + "tree.sml";
+  const std::string dir = support::scratchDir("output");
+  const std::string file = dir + "tree.sml";
   tesv_description_section tree = sampleTree();
   ASSERT_EQ(tesv_write_description_xml(tree, file), 0);
   const std::string text = readText(file);
@@ -171,36 +129,12 @@ TEST(DescriptionXml, WrittenLayoutAndRoundTrip) {
   EXPECT_EQ(validateAgainstSchema(file), 0);
   std::string broken = text;
   broken.replace(broken.find("MANDATORY = \"1\""), 15, "MANDATORY = \"2\"");
-  writeText(guard.dir + "broken.sml", broken);
-  EXPECT_GT(validateAgainstSchema(guard.dir + "broken.sml"), 0);
+  writeText(dir + "broken.sml", broken);
+  EXPECT_GT(validateAgainstSchema(dir + "broken.sml"), 0);
   broken = text;
   broken.replace(broken.find("<Value>4900</Value>"), 19, "<Value>4.5</Value>");
-  writeText(guard.dir + "broken.sml", broken);
-  EXPECT_GT(validateAgainstSchema(guard.dir + "broken.sml"), 0);
-}
-
-TEST(DescriptionXml, TemporaryEscapesAndOtherRoots) {
-  EXPECT_EQ(tesv_decode_temporary_escapes("##quot##apos##amp##lt##gt####BIGend"), "\"'&<>end");
-  EXPECT_EQ(tesv_decode_temporary_escapes("#plain## text#"), "#plain## text#");
-  EXPECT_EQ(tesv_xml_escape("&<>\"'x"), "&amp;&lt;&gt;&quot;&apos;x");
-
-  // Values holding the temporary escapes come back as their characters.
-  tesv_description_section root;
-  const std::string doc =
-      "<?xml version=\"1.0\" ?>\n<PARAMETERS_INFO_FOCUS>\n<NumberOfElements>1</NumberOfElements>\n"
-      "<SECTION><NAME>P</NAME><NumberOfElements>1</NumberOfElements>"
-      "<FIELD NAME = \"F\" MANDATORY = \"0\"><String><Value>x##amp####BIGy</Value></String></FIELD>"
-      "</SECTION>\n</PARAMETERS_INFO_FOCUS>\n";
-  ASSERT_EQ(tesv_parse_description_xml(doc, root, "PARAMETERS_INFO_"), 0);
-  EXPECT_EQ(root.name, "PARAMETERS_INFO_FOCUS");
-  EXPECT_EQ(root.getField("P.F")->strings.at(0), "x&y");
-
-  // A root without HEADER_INFO keeps its bare tag.
-  tesv_description_section plain("PARAMETERS_INFO_X");
-  plain.openSection("S").setField("v").setInt(1);
-  std::string text = tesv_description_xml_text(plain);
-  EXPECT_NE(text.find("\n<PARAMETERS_INFO_X>\n"), std::string::npos);
-  EXPECT_EQ(text.find("xmlns"), std::string::npos);
+  writeText(dir + "broken.sml", broken);
+  EXPECT_GT(validateAgainstSchema(dir + "broken.sml"), 0);
 }
 
 TEST(DescriptionXml, MalformedDocumentsGiveParserErrors) {
@@ -255,8 +189,8 @@ TEST(DescriptionXml, MalformedDocumentsGiveParserErrors) {
 }
 
 TEST(DescriptionText, LayoutRoundTripAndKeptSections) {
-  DirGuard guard{freshDir()};
-  const std::string file = guard.dir + "tree_hdr";
+  const std::string dir = support::scratchDir("output");
+  const std::string file = dir + "tree_hdr";
   tesv_description_section tree = sampleTree();
   ASSERT_EQ(tesv_write_description_text(tree, file), 0);
   const std::string text = readText(file);
@@ -312,39 +246,10 @@ TEST(DescriptionText, LayoutRoundTripAndKeptSections) {
     EXPECT_EQ(tesv_read_description_text(file, back, &error), STATUS_READ_FAILED) << b;
     EXPECT_NE(error.find(file + " line 2"), std::string::npos) << error;
   }
-  EXPECT_EQ(tesv_read_description_text(guard.dir + "absent_hdr", back), STATUS_NOT_OPENED);
+  EXPECT_EQ(tesv_read_description_text(dir + "absent_hdr", back), STATUS_NOT_OPENED);
   // A line that does not fit a pool buffer is refused, not cut.
   writeText(file, "[A]\nx = \"" + std::string(kWorkPoolBufferSize, 'y') + "\"\n");
   EXPECT_EQ(tesv_read_description_text(file, back, &error), STATUS_READ_FAILED);
   EXPECT_NE(error.find("longer than a pool buffer"), std::string::npos) << error;
-  EXPECT_EQ(tesv_work_pool_busy(), 0);
-}
-
-TEST(WorkPool, FirstFitAndExhaustion) {
-  std::vector<int> taken;
-  char* buffer = nullptr;
-  std::size_t size = 0;
-  for (int i = 0; i < kWorkPoolRecords; ++i) {
-    taken.push_back(tesv_work_pool_take(&buffer, &size));
-    EXPECT_EQ(taken.back(), i);
-    EXPECT_EQ(size, kWorkPoolBufferSize);
-  }
-  bool thrown = false;
-  try {
-    tesv_work_pool_take(&buffer, &size);
-  } catch (const orvaneException& e) {
-    thrown = true;
-    EXPECT_EQ(e.getMessage(), "All pools are busy");
-  }
-  EXPECT_TRUE(thrown);
-  tesv_work_pool_release(3);
-  EXPECT_EQ(tesv_work_pool_take(&buffer, &size), 3);  // first free record
-  for (int index : taken) tesv_work_pool_release(index);
-  EXPECT_EQ(tesv_work_pool_busy(), 0);
-  {
-    tesv_pool_buffer a, b;
-    EXPECT_EQ(tesv_work_pool_busy(), 2);
-    EXPECT_NE(a.data(), b.data());
-  }
   EXPECT_EQ(tesv_work_pool_busy(), 0);
 }

@@ -163,8 +163,8 @@ void expectSameExport(GeneralSAR_kelmir& a, GeneralSAR_kelmir& b) {
 }  // namespace
 
 TEST(GeneralSARKelmir, ExportReadsBackFromBothSpellings) {
-  DirGuard guard{freshDir()};
-  const std::string product = guard.dir + "scene_slc";
+  const std::string dir = support::scratchDir("output");
+  const std::string product = dir + "scene_slc";
   GeneralSAR_kelmir record;
   fillRecord(record, true);
   ASSERT_EQ(record.writehdr_kelmir(product, "", 6900.0f, KT_ERS2), 0);
@@ -241,12 +241,12 @@ TEST(GeneralSARKelmir, ExportReadsBackFromBothSpellings) {
 }
 
 TEST(GeneralSARKelmir, FallbacksWithoutOrbitOrSpeed) {
-  DirGuard guard{freshDir()};
+  const std::string dir = support::scratchDir("output");
   GeneralSAR_kelmir record;
   fillRecord(record, false);
   record.attitude.Eq_speed = -999.0;
   record.roi.roi.SetSlowAxe(kT0, -1.0 / kPrf, kLines);
-  ASSERT_EQ(record.writehdr_kelmir(guard.dir + "p", "", 6900.0f, KT_RADARSAT), 0);
+  ASSERT_EQ(record.writehdr_kelmir(dir + "p", "", 6900.0f, KT_RADARSAT), 0);
   const auto& h = record.header();
   EXPECT_EQ(h.getField("sar_processing.ProcessingVelocity")->doubles.at(0), 6900.0);
   EXPECT_EQ(h.getField("RasterInfo.Description")->strings.at(0), "RS1_IM");
@@ -265,8 +265,8 @@ TEST(GeneralSARKelmir, FallbacksWithoutOrbitOrSpeed) {
 }
 
 TEST(GeneralSARKelmir, RewriteKeepsWhatItDoesNotWrite) {
-  DirGuard guard{freshDir()};
-  const std::string product = guard.dir + "p";
+  const std::string dir = support::scratchDir("output");
+  const std::string product = dir + "p";
   GeneralSAR_kelmir record;
   fillRecord(record, false);
   ASSERT_EQ(record.writehdr_kelmir(product, "", 6900.0f, KT_ERS1), 0);
@@ -296,21 +296,21 @@ TEST(GeneralSARKelmir, RewriteKeepsWhatItDoesNotWrite) {
 }
 
 TEST(GeneralSARKelmir, RefusalsMandatoryFieldsAndTypeReports) {
-  DirGuard guard{freshDir()};
-  const std::string product = guard.dir + "p";
+  const std::string dir = support::scratchDir("output");
+  const std::string product = dir + "p";
   GeneralSAR_kelmir record;
   fillRecord(record, false);
   EXPECT_EQ(record.writehdr_kelmir(product, "", 6900.0f, KT_PALSAR_ERSDAC), STATUS_BAD_CONDITION);
-  EXPECT_EQ(record.writehdr_ersdac_kelmir(product, guard.dir + "leader", 6900.0f, KT_ERS2),
+  EXPECT_EQ(record.writehdr_ersdac_kelmir(product, dir + "leader", 6900.0f, KT_ERS2),
             STATUS_BAD_CONDITION);
-  EXPECT_EQ(record.writehdr_ersdac_kelmir(product, guard.dir + "leader", 6900.0f, KT_PALSAR_ERSDAC),
+  EXPECT_EQ(record.writehdr_ersdac_kelmir(product, dir + "leader", 6900.0f, KT_PALSAR_ERSDAC),
             STATUS_NOT_OPENED);
   EXPECT_FALSE(std::filesystem::exists(product + ".sml"));
   // An ENVISAT export whose calibration file cannot be read stops there.
-  EXPECT_EQ(record.writehdr_kelmir(product, guard.dir + "no_xca", 6900.0f, KT_ENVISAT_IM), STATUS_NOT_OPENED);
+  EXPECT_EQ(record.writehdr_kelmir(product, dir + "no_xca", 6900.0f, KT_ENVISAT_IM), STATUS_NOT_OPENED);
   EXPECT_FALSE(std::filesystem::exists(product + ".sml"));
-  writeText(guard.dir + "leader", std::string(4900, ' '));
-  EXPECT_EQ(record.writehdr_ersdac_kelmir(product, guard.dir + "leader", 6900.0f, KT_PALSAR_ERSDAC),
+  writeText(dir + "leader", std::string(4900, ' '));
+  EXPECT_EQ(record.writehdr_ersdac_kelmir(product, dir + "leader", 6900.0f, KT_PALSAR_ERSDAC),
             STATUS_READ_FAILED);
 
   // State-vector start and step from the leader's position record.
@@ -320,10 +320,10 @@ TEST(GeneralSARKelmir, RefusalsMandatoryFieldsAndTypeReports) {
   leader.replace(4816 + 152, 4, "  15");
   leader.replace(4816 + 160, 22, "      36000.5000000000");
   leader.replace(4816 + 182, 22, "         60.0000000000");
-  writeText(guard.dir + "leader", leader);
+  writeText(dir + "leader", leader);
   record.GSenable(GeneralSAR::GS_ORBIT);
   fillOrbit(record.orbit());
-  ASSERT_EQ(record.writehdr_ersdac_kelmir(product, guard.dir + "leader", 6900.0f, KT_PALSAR_ERSDAC), 0);
+  ASSERT_EQ(record.writehdr_ersdac_kelmir(product, dir + "leader", 6900.0f, KT_PALSAR_ERSDAC), 0);
   EXPECT_EQ(record.header().getField("StateVectorData.TimeDelta")->doubles.at(0), 60.0);
   EXPECT_EQ(record.header().getField("StateVectorData.TimeFirst")->strings.at(0),
             "15-MAR-2007 10:00:00.500000");
@@ -341,7 +341,7 @@ TEST(GeneralSARKelmir, RefusalsMandatoryFieldsAndTypeReports) {
   ASSERT_EQ(tesv_write_description_xml(tree, product + ".sml"), 0);
   GeneralSAR_kelmir back;
   EXPECT_EQ(back.readhdr_kelmir(product), STATUS_BAD_PARAMETER);
-  EXPECT_EQ(back.readhdr_kelmir(guard.dir + "absent"), STATUS_NOT_OPENED);
+  EXPECT_EQ(back.readhdr_kelmir(dir + "absent"), STATUS_NOT_OPENED);
 
   // A field of the wrong type is reported with its type number.
   tesv_description_section header = makeProductHeader();

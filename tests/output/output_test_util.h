@@ -10,37 +10,12 @@
 #include <sstream>
 #include <string>
 
+#include "support/files.h"
+
 namespace output_test {
 
-// A fresh folder for the running test, removed by the caller's scope guard.
-inline std::string freshDir() {
-  const auto* info = testing::UnitTest::GetInstance()->current_test_info();
-  std::filesystem::path dir = std::filesystem::path(testing::TempDir()) /
-                              ("tessivor_output_" + std::to_string(getpid()) + "_" +
-                               info->test_suite_name() + "_" + info->name());
-  std::filesystem::remove_all(dir);
-  std::filesystem::create_directories(dir);
-  return dir.string() + "/";
-}
-
-struct DirGuard {
-  std::string dir;
-  ~DirGuard() {
-    std::error_code ec;
-    std::filesystem::remove_all(dir, ec);
-  }
-};
-
-inline std::string readText(const std::string& file) {
-  std::ifstream in(file, std::ios::binary);
-  std::stringstream s;
-  s << in.rdbuf();
-  return s.str();
-}
-
-inline void writeText(const std::string& file, const std::string& text) {
-  std::ofstream(file, std::ios::binary) << text;
-}
+using support::readText;
+using support::writeText;
 
 inline std::string schemaPath() {
   return std::string(TESSIVOR_SOURCE_DIR) + "/resources/TessivorHeaderSchema_version_1.0.xsd";

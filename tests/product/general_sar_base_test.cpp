@@ -3,6 +3,8 @@
 #include "product/general_sar_base.h"
 
 #include <gtest/gtest.h>
+
+#include "support/files.h"
 #include <unistd.h>
 
 #include <algorithm>
@@ -85,79 +87,21 @@ class ATOther : public GeneralSAR_Base {
   int Level = 2;
 };
 
-// A table of no rows: every registration is refused.
-class ATEmpty : public GeneralSAR_Base {
- public:
-  ATEmpty() { createElementsVector(0); }
-  void refreshParameters() override { lastAdd = addElementInt("x", &x, 1, 0, 1, false); }
-  int x = 0;
-  int lastAdd = -1;
-};
-
 class GeneralSarBaseTest : public ::testing::Test {
  protected:
-  void SetUp() override {
-    const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
-    dir = fs::path(::testing::TempDir()) /
-          ("params_base_" + std::string(info->name()) + "_" + std::to_string(getpid()));
-    fs::remove_all(dir);
-    fs::create_directories(dir);
-  }
-  void TearDown() override { fs::remove_all(dir); }
-  std::string path(const std::string& name) const { return (dir / name).string(); }
+  std::string path(const std::string& name) const { return dir / name; }
   std::string make(const std::string& name, const std::string& text) const {
-    std::string p = path(name);
-    std::ofstream(p, std::ios::binary) << text;
-    return p;
+    support::writeText(path(name), text);
+    return path(name);
   }
-  static std::string slurp(const std::string& p) {
-    std::ifstream in(p, std::ios::binary);
-    std::ostringstream ss;
-    ss << in.rdbuf();
-    return ss.str();
-  }
-  fs::path dir;
+  static std::string slurp(const std::string& p) { return support::readText(p); }
+  support::TempFolder dir{"params"};
 };
 
 bool xmllintAccepts(const std::string& file) {
   if (std::system("command -v xmllint >/dev/null 2>&1") != 0) return true;  // not installed
   const std::string cmd = "xmllint --noout '" + file + "' >/dev/null 2>&1";
   return std::system(cmd.c_str()) == 0;
-}
-
-TEST_F(GeneralSarBaseTest, ElementTableRegistration) {
-  ATSample t;
-  ASSERT_EQ(t.getNumberOfElements(), 8);
-  EXPECT_EQ(t.getElement(0).getName(), "Memory");
-  EXPECT_EQ(t.getElement(0).getType(), parElement::PT_INT);
-  EXPECT_TRUE(t.getElement(0).isMandatory());
-  EXPECT_TRUE(t.getElement(0).isScalar());
-  EXPECT_EQ(t.getElement(1).getType(), parElement::PT_STRING);
-  EXPECT_EQ(t.getElement(3).getSize(), 3);
-  EXPECT_FALSE(t.getElement(3).isScalar());
-  EXPECT_EQ(t.getElement(3).getMax(), 1e9);
-  EXPECT_FALSE(t.getElement(4).isScalar());
-  // Samples was registered with size 0: it stays non-scalar at size 1.
-  t.nSamples = 1;
-  t.createBuffers();
-  EXPECT_EQ(t.getElement(6).getSize(), 1);
-  EXPECT_FALSE(t.getElement(6).isScalar());
-  EXPECT_EQ(t.getElement(6).getPointer(), t.Samples.data());
-  EXPECT_TRUE(t.getElement(6).isRegistered());
-  EXPECT_EQ(t.getElement(7).getSize(), 0);
-
-  ATEmpty e;
-  EXPECT_EQ(e.getNumberOfElements(), 0);
-  EXPECT_EQ(e.lastAdd, 1);
-
-  GeneralSAR_Base base;
-  EXPECT_EQ(base.writehdr(), 0);
-  EXPECT_EQ(base.writehdr(path("x.hdr")), 0);
-  EXPECT_EQ(base.readhdr(path("x.hdr")), 0);
-  EXPECT_EQ(base.createBuffers(), 0);
-  EXPECT_EQ(base.destroyBuffers(), 0);
-  EXPECT_TRUE(base.checkAuxiliaryFile());
-  EXPECT_FALSE(fs::exists(path("x.hdr")));
 }
 
 TEST_F(GeneralSarBaseTest, WriteparReplacesItsBlockAndKeepsTheOthers) {
@@ -295,46 +239,6 @@ TEST_F(GeneralSarBaseTest, ReadFailuresAndDefaults) {
   EXPECT_FALSE(a.getConfigurationFile(f, 2, "ATSample", conf));
   EXPECT_FALSE(a.getConfigurationFile(path("absent.xml"), 1, "ATSample", conf));
   EXPECT_EQ(conf, "conf.xml");
-}
-
-TEST_F(GeneralSarBaseTest, NotAllocatedWritesNothing) {
-  class Unready : public GeneralSAR_Base {
-   public:
-    Unready() { createElementsVector(1); }
-    void refreshParameters() override { addElementInt("v", &v, 1, 0, 1, false); }
-    int v = 1;
-  } u;
-  EXPECT_FALSE(u.isBufferAllocated());
-  EXPECT_EQ(u.writeAuxiliaryFile(path("u.xml"), 1, "Unready"), 1);
-  EXPECT_FALSE(fs::exists(path("u.xml")));
-  EXPECT_FALSE(u.readAuxiliaryFile(path("u.xml"), 1, "Unready"));
-}
-
-TEST_F(GeneralSarBaseTest, BaseConfigurationGroup) {
-  const std::string f = path("conf.xml");
-  GeneralSAR_BaseConfiguration w;
-  w.Memory = 64;
-  w.Incore = 1;
-  w.Verbose = 0;
-  w.ReportLevel = 3;
-  w.ReportFilename = "conf.report";
-  ASSERT_EQ(w.writeConf(f, 1, "generalProcessingConf"), 0);
-  EXPECT_TRUE(xmllintAccepts(f));
-  GeneralSAR_BaseConfiguration r;
-  EXPECT_EQ(r.readConf(f, 1, "generalProcessingConf"), 0);
-  EXPECT_EQ(r.Memory, 64);
-  EXPECT_EQ(r.Incore, 1);
-  EXPECT_EQ(r.Verbose, 0);
-  EXPECT_EQ(r.ReportLevel, 3);
-  EXPECT_EQ(r.ReportFilename, "conf.report");
-  GeneralSAR_BaseConfiguration d;
-  EXPECT_EQ(d.readConf(f, 2, "generalProcessingConf"), 0);  // absent group keeps defaults
-  EXPECT_EQ(d.Memory, 256);
-  EXPECT_EQ(d.readConf(make("bad.xml", "nope"), 1, "generalProcessingConf"), 1);
-  GeneralSAR_BaseConfiguration c;
-  r.cloneConf(c);
-  EXPECT_EQ(c.ReportFilename, "conf.report");
-  EXPECT_EQ(c.ReportLevel, 3);
 }
 
 }  // namespace

@@ -245,45 +245,6 @@ TEST(GeneralSAR, FullRecordThroughTheElementDocument) {
   EXPECT_FALSE(back.GSexists(GeneralSAR::GS_SWATH));
 }
 
-TEST(GeneralSAR, PartialHeaderGivesExactlyItsFlags) {
-  const std::string dir = record_test::freshDir();
-  GeneralSAR gs(kSlots);
-  fillRecord(gs, dir + "/part");
-  const GeneralSAR::GSObject present[] = {GeneralSAR::GS_SAMPLING, GeneralSAR::GS_PULSE,
-                                          GeneralSAR::GS_DATASETINFO, GeneralSAR::GS_ORBIT,
-                                          GeneralSAR::GS_POLYNOMIALS};
-  for (auto o : present) gs.GSenable(o);
-  ASSERT_EQ(gs.GSwrite(dir + "/part.hdr"), 0);
-  GeneralSAR back(kSlots);
-  testing::internal::CaptureStderr();
-  ASSERT_EQ(back.GSread(dir + "/part.hdr"), 0);
-  testing::internal::GetCapturedStderr();
-  for (int i = 0; i < GeneralSAR::kObjects; ++i) {
-    bool expected = false;
-    for (auto o : present) expected = expected || o == i;
-    EXPECT_EQ(back.GSexists(static_cast<GeneralSAR::GSObject>(i)), expected) << i;
-  }
-  EXPECT_EQ(back.pulse.PulseLength, gs.pulse.PulseLength);
-  EXPECT_EQ(back.polynomials.ndc, 2);
-  // Without a sampling block the orbit keeps its wavelength.
-  GeneralSAR noSampling(kSlots);
-  noSampling.GSenable(GeneralSAR::GS_ORBIT);
-  fake(noSampling, GeneralSAR::GS_ORBIT).nSV = 5;
-  noSampling.GSwrite(dir + "/orbit.hdr");
-  GeneralSAR readOrbit(kSlots);
-  readOrbit.GSread(dir + "/orbit.hdr");
-  EXPECT_TRUE(readOrbit.GSexists(GeneralSAR::GS_ORBIT));
-  EXPECT_FALSE(readOrbit.GSexists(GeneralSAR::GS_SAMPLING));
-  EXPECT_EQ(fake(readOrbit, GeneralSAR::GS_ORBIT).lambda, 0.0);
-
-  // A file that does not exist leaves the flags as they were.
-  testing::internal::CaptureStderr();
-  EXPECT_EQ(back.GSread(dir + "/missing.hdr"), 9);
-  testing::internal::GetCapturedStderr();
-  EXPECT_TRUE(back.GSexists(GeneralSAR::GS_PULSE));
-  EXPECT_EQ(back.polynomials.ndc, 2);
-}
-
 TEST(GeneralSAR, OldProfileFormHeader) {
   const std::string dir = record_test::freshDir();
   const std::string file = dir + "/old.hdr";

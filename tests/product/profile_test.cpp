@@ -3,6 +3,8 @@
 #include "product/profile.h"
 
 #include <gtest/gtest.h>
+
+#include "support/files.h"
 #include <unistd.h>
 
 #include <cstdint>
@@ -18,35 +20,19 @@ namespace fs = std::filesystem;
 
 class ProfileTest : public ::testing::Test {
  protected:
-  void SetUp() override {
-    FreeProfile();
-    const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
-    dir = fs::path(::testing::TempDir()) /
-          ("params_profile_" + std::string(info->name()) + "_" + std::to_string(getpid()));
-    fs::remove_all(dir);
-    fs::create_directories(dir);
-  }
-  void TearDown() override {
-    FreeProfile();
-    fs::remove_all(dir);
-  }
-  std::string path(const std::string& name) const { return (dir / name).string(); }
+  void SetUp() override { FreeProfile(); }
+  void TearDown() override { FreeProfile(); }
+  std::string path(const std::string& name) const { return dir / name; }
   std::string make(const std::string& name, const std::string& text) const {
-    std::string p = path(name);
-    std::ofstream(p, std::ios::binary) << text;
-    return p;
+    support::writeText(path(name), text);
+    return path(name);
   }
-  static std::string slurp(const std::string& p) {
-    std::ifstream in(p, std::ios::binary);
-    std::ostringstream ss;
-    ss << in.rdbuf();
-    return ss.str();
-  }
+  static std::string slurp(const std::string& p) { return support::readText(p); }
   static std::string get(const std::string& s, const std::string& k, const std::string& f) {
     std::string v;
     return GetMyProfileString(s, k, v, f) == 0 ? v : std::string("<absent>");
   }
-  fs::path dir;
+  support::TempFolder dir{"params"};
 };
 
 TEST_F(ProfileTest, ParserConsequences) {
@@ -127,24 +113,6 @@ TEST_F(ProfileTest, ParserConsequences) {
   EXPECT_EQ(get("Fresh", "k", f), "v");
 }
 
-TEST_F(ProfileTest, GetSetProfileCharModes) {
-  const std::string f = make("g.hdr", "[S]\nk = 1\n");
-  const std::string* v = GetSetProfileChar(0, "S", "k", "ignored", f);
-  ASSERT_NE(v, nullptr);
-  EXPECT_EQ(*v, "1");
-  EXPECT_EQ(GetSetProfileChar(0, "S", "absent", "", f), nullptr);
-  EXPECT_EQ(GetSetProfileChar(0, "T", "k", "", f), nullptr);
-  const std::string* w = GetSetProfileChar(1, "S", "k", "2", f);
-  ASSERT_NE(w, nullptr);
-  EXPECT_EQ(*w, "2");
-  EXPECT_EQ(v, w);  // the stored value is updated in place
-  ASSERT_NE(GetSetProfileChar(1, "T", "n", "3", f), nullptr);
-  EXPECT_EQ(*GetSetProfileChar(0, "T", "n", "", f), "3");
-  EXPECT_EQ(*v, "2");  // still valid after other keys were added
-  EXPECT_EQ(SyncProfile(f), 0);
-  EXPECT_EQ(slurp(f), "\n[S]\nk = 2\n\n[T]\nn = 3\n");
-}
-
 TEST_F(ProfileTest, KeyFormsAndUnterminatedSection) {
   const std::string f = make("forms.hdr",
                              "[S]\nk1=v\nk2 = v\n  k3   =    v  \n= v\n[Cut");
@@ -155,7 +123,7 @@ TEST_F(ProfileTest, KeyFormsAndUnterminatedSection) {
   EXPECT_EQ(get("Cut", "x", f), "<absent>");
   // Paths are compared byte for byte: the same file under another spelling
   // is a second cache entry.
-  const std::string other = (dir / "." / "forms.hdr").string();
+  const std::string other = dir / "./forms.hdr";
   ASSERT_EQ(WriteMyProfileString("S", "k1", "changed", f), 0);
   EXPECT_EQ(get("S", "k1", other), "v");
 }
@@ -319,58 +287,6 @@ TEST_F(ProfileTest, StringReaders) {
   EXPECT_EQ(GetMyProfileString("S", "missing", buf, 3, f), 10);
 }
 
-TEST_F(ProfileTest, MissingFileSyncAndCache) {
-  const std::string f = path("new.hdr");
-  std::string v;
-  EXPECT_EQ(GetMyProfileString("S", "k", v, f), 10);
-  EXPECT_FALSE(fs::exists(f));
-  EXPECT_EQ(WriteMyProfileString("S", "k", "v", f), 0);
-  EXPECT_FALSE(fs::exists(f));  // nothing reaches the disk before the sync
-  EXPECT_EQ(SyncProfile(f), 0);
-  EXPECT_EQ(slurp(f), "\n[S]\nk = v\n");
-  EXPECT_EQ(SyncProfile(path("not_cached.hdr")), 0);
-  EXPECT_FALSE(fs::exists(path("not_cached.hdr")));
-
-  // FreeProfile loses unsaved changes; a later access re-reads the disk.
-  EXPECT_EQ(WriteMyProfileString("S", "k", "unsaved", f), 0);
-  FreeProfile(f);
-  EXPECT_EQ(get("S", "k", f), "v");
-
-  // Sync of all files: -1 when all went well.
-  const std::string g = path("second.hdr");
-  EXPECT_EQ(WriteMyProfileInt("T", "n", 1, g), 0);
-  EXPECT_EQ(SyncProfile(), -1);
-  EXPECT_EQ(slurp(g), "\n[T]\nn = 1\n");
-
-  // A file that cannot be opened: 1 alone; 0 from the whole walk when it is
-  // the newest, -1 again when an older one failed.
-  const std::string bad = path("no_such_dir/x.hdr");
-  EXPECT_EQ(WriteMyProfileInt("T", "n", 1, bad), 0);
-  EXPECT_EQ(SyncProfile(bad), 1);
-  EXPECT_EQ(SyncProfile(nullptr), 0);
-  EXPECT_EQ(WriteMyProfileInt("T", "n", 2, path("third.hdr")), 0);
-  EXPECT_EQ(SyncProfile(nullptr), -1);
-  EXPECT_EQ(slurp(path("third.hdr")), "\n[T]\nn = 2\n");
-}
-
-TEST_F(ProfileTest, DeleteKeysAndSections) {
-  const std::string f = make("d.hdr", "[S]\nk = old\nonly = 1\n[S]\nk = new\n[T]\nx = 1\n");
-  // Not loaded yet: a warning and nothing done.
-  EXPECT_EQ(DelProfileKey("S", "k", f), 10);
-  EXPECT_EQ(DelProfileSection("S", f), 10);
-  EXPECT_EQ(get("S", "k", f), "new");
-  EXPECT_EQ(DelProfileKey("S", "k", f), 0);  // from the newest block only
-  EXPECT_EQ(get("S", "k", f), "old");
-  EXPECT_EQ(DelProfileKey("S", "only", f), 10);  // the newest block does not hold it
-  EXPECT_EQ(DelProfileSection("S", f), 0);
-  EXPECT_EQ(get("S", "k", f), "old");
-  EXPECT_EQ(DelProfileSection("S", f), 0);
-  EXPECT_EQ(get("S", "k", f), "<absent>");
-  EXPECT_EQ(DelProfileSection("S", f), 10);
-  EXPECT_EQ(SyncProfile(f), 0);
-  EXPECT_EQ(slurp(f), "\n[T]\nx = 1\n");
-}
-
 TEST_F(ProfileTest, LargeValuesAndFiles) {
   const std::string f = path("big.hdr");
   std::vector<double> many(20000);
@@ -389,43 +305,6 @@ TEST_F(ProfileTest, LargeValuesAndFiles) {
   int k = 0;
   EXPECT_EQ(GetMyProfileIntArray("Sec299", "k", &k, 1, f), 0);
   EXPECT_EQ(k, 299);
-}
-
-TEST_F(ProfileTest, CheckedTwins) {
-  const std::string f = make("c.hdr", "[S]\nk = 3\ns = {\"a\"}\n");
-  std::string v;
-  EXPECT_EQ(GetCheckMyProfileString("S", "k", v, f), 0);
-  EXPECT_EQ(v, "3");
-  int i = 0;
-  EXPECT_EQ(GetCheckMyProfileIntArray("S", "k", &i, 1, f), 0);
-  EXPECT_EQ(WriteCheckMyProfileInt("S", "w", 4, f), 0);
-  EXPECT_EQ(WriteCheckMyProfileDouble("S", "d", 0.5, f), 0);
-  std::vector<std::string> sv;
-  EXPECT_EQ(GetCheckMyProfileStringArray("S", "s", sv, 1, 64, f), 0);
-
-  const std::string tail = "section S, key nope, file " + f;
-  EXPECT_EXIT(GetCheckMyProfileString("S", "nope", v, f), ::testing::ExitedWithCode(1),
-              "Error in GetMyProfileString: " + tail);
-  EXPECT_EXIT(GetCheckMyProfileIntArray("S", "nope", &i, 1, f), ::testing::ExitedWithCode(1),
-              "Error in GetMyProfileIntArray: " + tail);
-  long l = 0;
-  EXPECT_EXIT(GetCheckMyProfileLongArray("S", "nope", &l, 1, f), ::testing::ExitedWithCode(1),
-              "Error in GetMyProfileIntArray: " + tail);
-  int64_t ll = 0;
-  EXPECT_EXIT(GetCheckMyProfileInt64Array("S", "nope", &ll, 1, f), ::testing::ExitedWithCode(1),
-              "Error in GetMyProfileInt64Array: " + tail);
-  float fl = 0;
-  EXPECT_EXIT(GetCheckMyProfileFloatArray("S", "nope", &fl, 1, f), ::testing::ExitedWithCode(1),
-              "Error in GetMyProfileFloatArray: " + tail);
-  double d = 0;
-  EXPECT_EXIT(GetCheckMyProfileDoubleArray("S", "nope", &d, 1, f), ::testing::ExitedWithCode(1),
-              "Error in WriteMyProfileDouble: " + tail);
-  EXPECT_EXIT(GetCheckMyProfileStringArray("S", "nope", sv, 1, 64, f),
-              ::testing::ExitedWithCode(1), "Error in GetMyProfileStringArray: " + tail);
-  // Too few values is a failure too.
-  int two[2];
-  EXPECT_EXIT(GetCheckMyProfileIntArray("S", "k", two, 2, f), ::testing::ExitedWithCode(1),
-              "Error in GetMyProfileIntArray: section S, key k, file ");
 }
 
 }  // namespace

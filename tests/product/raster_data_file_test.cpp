@@ -82,48 +82,6 @@ TEST(RasterDataFile, EveryTypeAndByteOrderReadsBackThroughWindows) {
   }
 }
 
-TEST(RasterDataFile, ManyRowsBehindSmallPrefixesAndATruncatedFile) {
-  // Long windows whose rows lie behind small gaps (prefix and a few columns)
-  // are gathered into few transfers; the values and the short-read status
-  // must be those of the row by row reading.
-  const std::string dir = tempDir();
-  for (int type : {FLOAT_COMPLEX, INT16}) {
-    SCOPED_TRACE("type " + std::to_string(type));
-    const Layout l{type, false, 1200, 20, 4, 3};
-    std::vector<unsigned char> ref = referenceRaster(l);
-    const std::string name = dir + "/many" + std::to_string(type);
-    spit(name, ref);
-    const TypeInfo ti = typeInfo(type);
-    const size_t ms = size_t(ti.bytes * ti.parts);
-    const int stride = 19;
-    std::vector<unsigned char> dst(ms * stride * 1199, 0xAB);
-    DataFile f;
-    describe(f, name, l);
-    BufferIO io{&f, 1, 18, 1, 1199, type};
-    ASSERT_EQ(io.readbuffer(dst.data(), stride), STATUS_OK);
-    EXPECT_EQ(f.tell(), f.rowstart(1200));
-    for (int r = 0; r < io.rows; ++r)
-      for (int c = 0; c < stride; ++c) {
-        const size_t i = size_t(r * stride + c);
-        if (c == 18) {
-          ASSERT_EQ(dst[i * ms], 0xAB);
-          continue;
-        }
-        for (int k = 0; k < ti.parts; ++k)
-          ASSERT_EQ(component(dst.data(), type, i, k), pixelValue(1 + r, 1 + c, k)) << r << " " << c;
-      }
-    f.close();
-    // Cut inside row 1100: a short read, rows before it delivered.
-    ref.resize(size_t(f.rowstart(1100) + 17));
-    spit(name, ref);
-    std::fill(dst.begin(), dst.end(), 0xAB);
-    EXPECT_EQ(io.readbuffer(dst.data(), stride), STATUS_READ_FAILED);
-    for (int r : {0, 600, 1098})
-      EXPECT_EQ(component(dst.data(), type, size_t(r * stride + 5), 0), pixelValue(1 + r, 6, 0));
-    f.close();
-  }
-}
-
 TEST(RasterDataFile, WriteBufferAndPrefixesGiveTheReferenceBytes) {
   const std::string dir = tempDir();
   for (int type = 0; type <= 9; ++type) {
@@ -220,38 +178,6 @@ TEST(RasterDataFile, ReadConversionTableIsPinned) {
         EXPECT_EQ(component(dst.data(), mt, size_t(c), 0), pixelValue(1, 1 + c, 0));
         if (mc) {
           EXPECT_EQ(component(dst.data(), mt, size_t(c), 1), fc ? pixelValue(1, 1 + c, 1) : 0.0);
-        }
-      }
-    }
-  }
-}
-
-TEST(RasterDataFile, WriteConversionTableMirrorsTheReadTable) {
-  const std::string dir = tempDir();
-  for (int mt = 0; mt < 8; ++mt) {
-    const Layout src{mt, false, 1, 5, 0, 0};
-    const std::vector<unsigned char> mem = referenceRaster(src);
-    for (int ft = 0; ft < 8; ++ft) {
-      SCOPED_TRACE("memory " + std::to_string(mt) + " file " + std::to_string(ft));
-      DataFile f;
-      f.filename = dir + "/m" + std::to_string(mt) + "f" + std::to_string(ft);
-      f.CellType = ft;
-      f.NrOfPixelsPerLine = 5;
-      f.NrOfLinesPerImage = 1;
-      BufferIO io{&f, 0, 5, 0, 1, mt};
-      ASSERT_EQ(io.writebuffer(mem.data()), STATUS_OK);
-      ASSERT_EQ(f.close(), STATUS_OK);
-      const std::vector<unsigned char> bytes = slurp(f.filename);
-      const TypeInfo fi = typeInfo(ft);
-      ASSERT_EQ(bytes.size(), size_t(5 * fi.bytes * fi.parts));
-      const bool served = kReadPairs[ft][mt] == 1;
-      const bool mc = typeInfo(mt).parts == 2;
-      for (int c = 0; c < 5; ++c) {
-        // Complex to real keeps the real part; real to complex has im 0; an
-        // unserved pair leaves the row as allocated (zeros).
-        EXPECT_EQ(component(bytes.data(), ft, size_t(c), 0), served ? pixelValue(0, c, 0) : 0.0);
-        if (fi.parts == 2) {
-          EXPECT_EQ(component(bytes.data(), ft, size_t(c), 1), served && mc ? pixelValue(0, c, 1) : 0.0);
         }
       }
     }
@@ -438,85 +364,4 @@ TEST(RasterDataFile, BufferedReadsMatchTheFileAtRandomSeeks) {
     EXPECT_EQ(0, std::memcmp(got.data(), data.data() + data.size() - 100, 100));
     f.close();
   }
-}
-
-TEST(RasterDataFile, BufferedWritingKeepsItsSeekRule) {
-  const std::string dir = tempDir();
-  DataFile f(dir + "/bw");
-  f.buffersize = 16;
-  ASSERT_EQ(f.open(1), STATUS_OK);
-  ASSERT_EQ(f.write("AAAAAAAAAA", 10), STATUS_OK);
-  EXPECT_EQ(f.tell(), 10);
-  // Flushes, then counts the offset from the buffer's first byte (0).
-  ASSERT_EQ(f.seek(5, 1), STATUS_OK);
-  ASSERT_EQ(f.write("BB", 2), STATUS_OK);
-  // A write that does not fit flushes and goes straight to the file.
-  ASSERT_EQ(f.write("CCCCCCCCCCCCCCCCCCCC", 20), STATUS_OK);
-  ASSERT_EQ(f.write("DD", 2), STATUS_OK);
-  ASSERT_EQ(f.close(), STATUS_OK);
-  const std::vector<unsigned char> bytes = slurp(dir + "/bw");
-  EXPECT_EQ(std::string(bytes.begin(), bytes.end()), "AAAAABBCCCCCCCCCCCCCCCCCCCCDD");
-  // Sequential buffered writing of rows equals the unbuffered result.
-  const Layout l{FLOAT_COMPLEX, false, 40, 33, 0, 0};
-  const std::vector<unsigned char> ref = referenceRaster(l);
-  DataFile g;
-  describe(g, dir + "/rows", l);
-  g.buffersize = 1000;
-  ASSERT_EQ(g.open(1), STATUS_OK);
-  BufferIO io{&g, 0, l.pixels, 0, l.lines, FLOAT_COMPLEX};
-  ASSERT_EQ(io.writebuffer(ref.data()), STATUS_OK);
-  ASSERT_EQ(g.close(), STATUS_OK);
-  EXPECT_EQ(slurp(dir + "/rows"), ref);
-}
-
-TEST(RasterDataFile, BufferedUpdateWritesInPlace) {
-  const std::string dir = tempDir();
-  spit(dir + "/u", std::vector<unsigned char>(40, '.'));
-  DataFile f(dir + "/u");
-  f.buffersize = 16;
-  ASSERT_EQ(f.open(3), STATUS_OK);
-  char buf[8];
-  ASSERT_EQ(f.read(buf, 5), STATUS_OK);
-  ASSERT_EQ(f.write("XY", 2), STATUS_OK);  // at 5, the buffer is dropped
-  EXPECT_EQ(f.tell(), 7);
-  ASSERT_EQ(f.seek(20, 0), STATUS_OK);
-  ASSERT_EQ(f.write("Z", 1), STATUS_OK);
-  ASSERT_EQ(f.seek(4, 0), STATUS_OK);
-  ASSERT_EQ(f.read(buf, 4), STATUS_OK);  // reads what was written
-  EXPECT_EQ(std::string(buf, 4), ".XY.");
-  ASSERT_EQ(f.close(), STATUS_OK);
-  const std::vector<unsigned char> bytes = slurp(dir + "/u");
-  std::string want(40, '.');
-  want.replace(5, 2, "XY");
-  want[20] = 'Z';
-  EXPECT_EQ(std::string(bytes.begin(), bytes.end()), want);
-}
-
-TEST(RasterDataFile, CopyAndClone) {
-  const std::string dir = tempDir();
-  const Layout l{SHORT_COMPLEX, true, 7, 5, 3, 11};
-  std::vector<unsigned char> ref = referenceRaster(l);
-  ref.resize(ref.size() + 50, 0x77);  // bytes past the raster are not copied
-  spit(dir + "/src", ref);
-  DataFile f;
-  describe(f, dir + "/src", l);
-  DataFile g;
-  ASSERT_EQ(f.open(0), STATUS_OK);
-  g.filename = "other";
-  ASSERT_EQ(f.clone(&g), STATUS_OK);
-  EXPECT_EQ(g.filename, f.filename);
-  EXPECT_EQ(g.NrOfLinesPerImage, 7);
-  EXPECT_EQ(g.NrOfPixelsPerLine, 5);
-  EXPECT_EQ(g.RowPrefix, 3);
-  EXPECT_EQ(g.HeaderOffset, 11);
-  EXPECT_EQ(g.CellType, SHORT_COMPLEX);
-  EXPECT_EQ(g.ByteOrder, 1);
-  EXPECT_FALSE(g.is_open());
-  for (int chunk : {1, 7, 64, 10000}) {
-    const std::string out = dir + "/copy" + std::to_string(chunk);
-    f.copy(out, chunk);  // the side file needs the parameter documents
-    std::vector<unsigned char> want(ref.begin(), ref.end() - 50);
-    EXPECT_EQ(slurp(out), want) << chunk;
-  }
-  EXPECT_EQ(f.copy(dir + "/bad", 0), STATUS_BAD_CONDITION);
 }

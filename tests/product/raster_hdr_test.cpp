@@ -14,13 +14,6 @@ using namespace rastertest;
 
 namespace {
 
-std::string readText(const std::string& path) {
-  std::ifstream in(path);
-  std::stringstream s;
-  s << in.rdbuf();
-  return s.str();
-}
-
 void writeText(const std::string& path, const std::string& text) {
   std::ofstream out(path);
   out << text;
@@ -38,72 +31,6 @@ std::string profileHeader(const std::string& cellType, const std::string& order,
 }
 
 }  // namespace
-
-TEST(RasterHdr, ElementDocumentRoundTripsThroughBothClasses) {
-  const std::string dir = tempDir();
-  DataFile f(dir + "/image.raw");
-  f.NrOfLinesPerImage = 1234;
-  f.NrOfPixelsPerLine = 5678;
-  f.HeaderOffset = 720;
-  f.RowPrefix = 4;
-  f.ByteOrder = 1;
-  f.CellType = SHORT_COMPLEX;
-  ASSERT_EQ(f.write_hdr(), STATUS_OK);
-  EXPECT_EQ(f.hdrname, dir + "/image.raw.hdr");
-  const std::string text = readText(dir + "/image.raw.hdr");
-  ASSERT_NE(text.find("<OrvaneXmlDoc"), std::string::npos);
-  ASSERT_NE(text.find("<RasterInfo>"), std::string::npos);
-  // Elements in their fixed order.
-  size_t at = 0;
-  for (const char* e : {"<NrOfLinesPerImage>1234<", "<NrOfPixelsPerLine>5678<", "<HeaderOffset>720<",
-                        "<RowPrefix>4<", "<ByteOrder>1<", "<CellType>6<"}) {
-    const size_t p = text.find(e);
-    ASSERT_NE(p, std::string::npos) << e;
-    EXPECT_GT(p, at) << e;
-    at = p;
-  }
-  DataFile g;
-  ASSERT_EQ(g.read_hdr(dir + "/image.raw"), STATUS_OK);
-  EXPECT_EQ(g.filename, dir + "/image.raw");
-  EXPECT_EQ(g.hdrname, dir + "/image.raw.hdr");
-  EXPECT_EQ(g.NrOfLinesPerImage, 1234);
-  EXPECT_EQ(g.NrOfPixelsPerLine, 5678);
-  EXPECT_EQ(g.HeaderOffset, 720);
-  EXPECT_EQ(g.RowPrefix, 4);
-  EXPECT_EQ(g.ByteOrder, 1);
-  EXPECT_EQ(g.CellType, SHORT_COMPLEX);
-  EXPECT_FALSE(g.is_buffered());
-
-  BufferFile b(dir + "/image.raw");
-  ASSERT_EQ(b.readhdr(), 0);
-  EXPECT_EQ(b.getLines(), 1234);
-  EXPECT_EQ(b.getSamples(), 5678);
-  EXPECT_EQ(b.getOffsetSize(), 720);
-  EXPECT_EQ(b.getRowPrefix(), 4);
-  EXPECT_EQ(b.getFileEndian(), 1);
-  EXPECT_EQ(b.getType(), BufferFile::SHORT_COMPLEX);
-  // BufferFile writes the same document; DataFile reads it.
-  b.setType(BufferFile::INT16);
-  b.setLines(7);
-  ASSERT_EQ(b.writehdr(dir + "/other.hdr"), 0);
-  DataFile h;
-  ASSERT_EQ(h.read_hdr(dir + "/other"), STATUS_OK);
-  EXPECT_EQ(h.CellType, INT16);
-  EXPECT_EQ(h.NrOfLinesPerImage, 7);
-  EXPECT_EQ(h.HeaderOffset, 720);
-  // copy gives the new raster a side file.
-  const Layout l{FLOAT32, false, 3, 4, 0, 0};
-  spit(dir + "/small", referenceRaster(l));
-  DataFile s(dir + "/small");
-  s.CellType = FLOAT32;
-  s.NrOfLinesPerImage = 3;
-  s.NrOfPixelsPerLine = 4;
-  ASSERT_EQ(s.copy(dir + "/small2", 5), STATUS_OK);
-  DataFile t;
-  ASSERT_EQ(t.read_hdr(dir + "/small2"), STATUS_OK);
-  EXPECT_EQ(t.NrOfPixelsPerLine, 4);
-  EXPECT_EQ(t.CellType, FLOAT32);
-}
 
 TEST(RasterHdr, ProfileFormWithCellTypeTextsAndByteOrder) {
   const std::string dir = tempDir();

@@ -13,16 +13,11 @@
 #include <string>
 #include <vector>
 
+#include "support/files.h"
+
 namespace rastertest {
 
-inline std::string tempDir() {
-  const auto* info = testing::UnitTest::GetInstance()->current_test_info();
-  std::string dir = testing::TempDir() + "rasters_" + std::to_string(::getpid()) + "_" +
-                    info->test_suite_name() + "_" + info->name();
-  std::filesystem::remove_all(dir);
-  std::filesystem::create_directories(dir);
-  return dir;
-}
+inline std::string tempDir() { return support::scratchDir("rasters"); }
 
 inline std::vector<unsigned char> slurp(const std::string& path) {
   std::ifstream in(path, std::ios::binary);

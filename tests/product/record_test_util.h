@@ -8,18 +8,12 @@
 #include <string>
 
 #include "product/profile.h"
+#include "support/files.h"
 
 namespace record_test {
 
 // A fresh folder under the test temporary directory, named after the test.
-inline std::string freshDir() {
-  const auto* info = testing::UnitTest::GetInstance()->current_test_info();
-  std::filesystem::path dir = std::filesystem::path(testing::TempDir()) /
-                              (std::string("record_") + info->test_suite_name() + "_" + info->name());
-  std::filesystem::remove_all(dir);
-  std::filesystem::create_directories(dir);
-  return dir.string();
-}
+inline std::string freshDir() { return support::scratchDir("record"); }
 
 // Text of a value as parameter documents store it (15 significant digits):
 // two values are equal through a document when these texts are.

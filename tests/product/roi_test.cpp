@@ -68,40 +68,6 @@ TEST(RoiObj, Intersection) {
   EXPECT_TRUE(out.isNULL());
 }
 
-TEST(RoiObj, ElementDocumentAndProfileForms) {
-  const std::string dir = record_test::freshDir();
-  ROI_Obj r;
-  r.SetFastAxe(5.5e-3, 5.2735e-8, 5616);
-  r.SetSlowAxe(476789846.417, 1.0 / 1679.902, 28000);
-  ASSERT_EQ(r.write_roi(dir + "/x.hdr", "ROI"), 0);
-  ROI_Obj back;
-  ASSERT_EQ(back.read_roi(dir + "/x.hdr", "ROI"), 0);
-  EXPECT_EQ(record_test::g15(back.FastStartTime), record_test::g15(r.FastStartTime));
-  EXPECT_EQ(record_test::g15(back.SlowStartTime), record_test::g15(r.SlowStartTime));
-  EXPECT_EQ(record_test::g15(back.FastTimeDelta), record_test::g15(r.FastTimeDelta));
-  EXPECT_EQ(record_test::g15(back.SlowTimeDelta), record_test::g15(r.SlowTimeDelta));
-  EXPECT_EQ(record_test::g15(back.FastTimeLength), record_test::g15(r.FastTimeLength));
-  EXPECT_EQ(record_test::g15(back.SlowTimeLength), record_test::g15(r.SlowTimeLength));
-  EXPECT_EQ(back.Samples, 5616);
-  EXPECT_EQ(back.Lines, 28000);
-
-  // Profile form without Lines still reads; without Samples it fails.
-  record_test::writeText(dir + "/old.hdr",
-                         "\n[ROI]\nSlowStartTime = 12.5\nFastStartTime = 0.005\n"
-                         "SlowTimeDelta = 0.1\nFastTimeDelta = 1e-07\nSlowTimeLength = 10\n"
-                         "FastTimeLength = 0.0001\nSamples = 1000\n");
-  ROI_Obj old;
-  EXPECT_EQ(old.read_roi(dir + "/old.hdr", "ROI"), 0);
-  EXPECT_DOUBLE_EQ(old.SlowStartTime, 12.5);
-  EXPECT_DOUBLE_EQ(old.FastTimeDelta, 1e-7);
-  EXPECT_EQ(old.Samples, 1000);
-  EXPECT_EQ(old.Lines, 0);
-  record_test::writeText(dir + "/nosamples.hdr", "\n[ROI]\nSlowStartTime = 12.5\nLines = 3\n");
-  ROI_Obj bad;
-  EXPECT_EQ(bad.read_roi(dir + "/nosamples.hdr", "ROI"), 1);
-  EXPECT_EQ(bad.Lines, 3);
-}
-
 TEST(RoiObj, FileRegion) {
   const std::string dir = record_test::freshDir();
   DataFile raster(dir + "/img");
@@ -121,28 +87,6 @@ TEST(RoiObj, FileRegion) {
   EXPECT_EQ(f.datafile.CellType, FLOAT32);
   FileROI_Obj missing(dir + "/nothing");
   EXPECT_EQ(missing.read_roi(), 1);
-}
-
-TEST(RoiObj, CoordinatesProfileForm) {
-  const std::string dir = record_test::freshDir();
-  record_test::writeText(dir + "/c.hdr",
-                         "\n[Coordinates]\nUpLeft = {45.5 10.25}\nUpRight = {46.5 11.0}\n"
-                         "DownRight = {44.0 12.25}\nLatitude_SamplingStep = 0.25\n"
-                         "Longitude_SamplingStep = 0.5\n");
-  ROI_Coords c;
-  ASSERT_EQ(c.readhdr(dir + "/c.hdr"), 0);
-  EXPECT_DOUBLE_EQ(c.SlowStartTime, 45.5);
-  EXPECT_DOUBLE_EQ(c.FastStartTime, 10.25);
-  EXPECT_DOUBLE_EQ(c.SlowTimeLength, 1.0);
-  EXPECT_DOUBLE_EQ(c.FastTimeLength, 2.0);
-  EXPECT_EQ(c.Lines, 4);
-  EXPECT_EQ(c.Samples, 4);
-  // Element form round trip.
-  ASSERT_EQ(c.writehdr(dir + "/c.xml"), 0);
-  ROI_Coords d;
-  ASSERT_EQ(d.readhdr(dir + "/c.xml"), 0);
-  EXPECT_DOUBLE_EQ(d.FastTimeLength, 2.0);
-  EXPECT_EQ(d.Samples, 4);
 }
 
 }  // namespace

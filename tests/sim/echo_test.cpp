@@ -133,90 +133,6 @@ TEST(SimEcho, TimeDomainFocuserPeaksAtTheTruthPosition) {
   EXPECT_NEAR(peakSample, t.sample, 0.05);
 }
 
-TEST(SimEcho, RangeCompressedPeakLiesAtTheDocumentedOffset) {
-  // One line at the beam centre: the correlation peaks (fs T - (n - 1)) / 2
-  // samples after the two-way delay of that line.
-  SceneDescription s = smallScene();
-  s.dopplerCentroidHz = 0.0;
-  s.pixelTargets.push_back({1600.0, 250.3, 0.0, 1.0});
-  const RawSceneSimulator sim(s);
-  const TargetTruth t = sim.truth()[0];
-  EXPECT_NEAR(sim.rangePeakOffset(), (s.samplingRateHz * s.pulseLength - (sim.replicaLength() - 1)) / 2.0, 1e-3);
-  EXPECT_EQ(sim.replicaLength(), 704);
-  std::vector<fcomplex> raw;
-  sim.renderLines(1600, 1, raw);
-  const std::vector<cdouble> rc = rangeCompress(raw.data(), s.samples, sim);
-  int m = 0;
-  for (int k = 0; k < static_cast<int>(rc.size()); ++k)
-    if (std::abs(rc[k]) > std::abs(rc[m])) m = k;
-  // Sub-sample peak by a fine search of the interpolated correlation.
-  double best = m, bestV = 0.0;
-  for (double x = m - 1.0; x <= m + 1.0; x += 0.001) {
-    const double v = std::abs(interpolate(rc, x));
-    if (v > bestV) {
-      bestV = v;
-      best = x;
-    }
-  }
-  const StateVector sv = sim.orbit().at(s.startTime + 1600.0 / s.prfHz);
-  const double tau = 2.0 * norm(sv.pos - t.position) / kC;
-  EXPECT_NEAR(best, (tau - sim.swst()) * s.samplingRateHz + sim.rangePeakOffset(), 0.02);
-  // Carrier phase at the peak: -4 pi R / lambda.
-  const double lambda = kC / s.carrierHz;
-  EXPECT_NEAR(std::remainder(std::arg(interpolate(rc, best)) + 4.0 * M_PI * norm(sv.pos - t.position) / lambda, 2 * M_PI),
-              0.0, 0.02);
-}
-
-TEST(SimEcho, SpectraSitAtTheDopplerCentroidAndClutterHasItsPower) {
-  for (double fdc : {-420.0, 0.0, 560.0}) {
-    SceneDescription s = smallScene();
-    s.lines = 1024;
-    s.samples = 800;
-    s.dopplerCentroidHz = fdc;
-    s.clutterSigma = 3.0;
-    const RawSceneSimulator clutter(s);
-    std::vector<fcomplex> x;
-    clutter.renderLines(0, s.lines, x);
-    std::complex<double> acc = 0.0;
-    double power = 0.0;
-    for (int k = 0; k + 1 < s.lines; ++k)
-      for (int j = 0; j < s.samples; ++j) {
-        const std::size_t i = static_cast<std::size_t>(k) * s.samples + j;
-        acc += std::complex<double>(x[i + s.samples]) * std::conj(std::complex<double>(x[i]));
-        power += std::norm(std::complex<double>(x[i]));
-      }
-    power /= static_cast<double>(s.lines - 1) * s.samples;
-    EXPECT_NEAR(std::arg(acc) / (2.0 * M_PI) * s.prfHz, fdc, 10.0) << "clutter";
-    EXPECT_NEAR(power, 2.0 * 9.0, 0.9);
-
-    SceneDescription p = smallScene();
-    p.dopplerCentroidHz = fdc;
-    p.pixelTargets.push_back({1600.0, 100.0, 0.0, 1.0});
-    const RawSceneSimulator point(p);
-    point.renderLines(0, p.lines, x);
-    acc = 0.0;
-    for (int k = 0; k + 1 < p.lines; ++k)
-      for (int j = 0; j < p.samples; ++j) {
-        const std::size_t i = static_cast<std::size_t>(k) * p.samples + j;
-        acc += std::complex<double>(x[i + p.samples]) * std::conj(std::complex<double>(x[i]));
-      }
-    EXPECT_NEAR(std::arg(acc) / (2.0 * M_PI) * p.prfHz, fdc, 10.0) << "point target";
-    // The echo is strongest where the Doppler equals the centroid.
-    const TargetTruth t = point.truth()[0];
-    int best = 0;
-    double bestE = 0.0;
-    for (int k = 0; k < p.lines; ++k) {
-      double e = 0.0;
-      for (int j = 0; j < p.samples; ++j) e += std::norm(x[static_cast<std::size_t>(k) * p.samples + j]);
-      if (e > bestE) {
-        bestE = e;
-        best = k;
-      }
-    }
-    EXPECT_NEAR(best, (t.beamCentreTime - p.startTime) * p.prfHz, 3.0);
-  }
-}
-
 TEST(SimEcho, RenderingIsIndependentOfBlocksAndThreads) {
   SceneDescription s = smallScene();
   s.lines = 3000;
@@ -242,26 +158,6 @@ TEST(SimEcho, RenderingIsIndependentOfBlocksAndThreads) {
   EXPECT_EQ(0, std::memcmp(whole.data(), serial.data(), whole.size() * sizeof(fcomplex)));
   omp_set_num_threads(threads);
 #endif
-}
-
-TEST(SimEcho, QuantisesToFiveBitOffsetBytes) {
-  SceneDescription s = smallScene();
-  s.biasI = -0.258;
-  s.biasQ = -9999999.9999999;  // absent: no bias
-  const RawSceneSimulator sim(s);
-  std::vector<fcomplex> line(s.samples, fcomplex(0.0f, 0.0f));
-  line[0] = {0.0f, -0.01f};
-  line[1] = {100.0f, -100.0f};
-  line[2] = {3.2f, -3.7f};
-  std::vector<unsigned char> iq(2 * s.samples);
-  sim.quantiseLine(line.data(), iq.data());
-  EXPECT_EQ(iq[0], 15);  // 0 - 0.258 lies nearest to level 15 - 15.5
-  EXPECT_EQ(iq[1], 15);
-  EXPECT_EQ(iq[2], 31);
-  EXPECT_EQ(iq[3], 0);
-  EXPECT_EQ(iq[4], 18);  // 3.2 - 0.258 = 2.942 -> level 2.5
-  EXPECT_EQ(iq[5], 12);  // -3.7 -> level -3.5
-  for (unsigned char b : iq) EXPECT_LE(b, 31);
 }
 
 TEST(SimGeometry, OrbitTimeAndGeodesyAreConsistent) {
@@ -301,32 +197,6 @@ TEST(SimGeometry, OrbitTimeAndGeodesyAreConsistent) {
   const double tc = closestApproachTime(orbit, target, 0.0);
   const StateVector sc = orbit.at(tc);
   EXPECT_NEAR(dot(sc.pos - target, sc.vel) / norm(sc.pos - target), 0.0, 1e-6);
-}
-
-TEST(SimEcho, AttitudeGivesTheCentroidOfTheTurnedBeam) {
-  SceneDescription s = smallScene();
-  s.attitudeGiven = true;
-  const double f0 = RawSceneSimulator(s).scene().dopplerCentroidHz;
-  EXPECT_NEAR(f0, 0.0, 1e-3);  // the zero-Doppler beam
-  s.yawDeg = 0.1;
-  const RawSceneSimulator yawed(s);
-  const double lambda = kC / yawed.scene().carrierHz;
-  const StateVector sv = yawed.orbit().at(yawed.lineTime(s.lines / 2));
-  // Small yaw: 2 v sin(yaw) sin(off-nadir angle) / lambda.
-  const double R = kC / 2.0 * (yawed.swst() + 0.5 * s.samples / yawed.scene().samplingRateHz);
-  double lat = 0, lon = 0, h = 0;
-  ecefToGeodetic(sv.pos, lat, lon, h);
-  const double offNadir = std::acos(std::min(1.0, (h + 0.5 * (R * R - h * h) / 6.37e6) / R));
-  EXPECT_GT(yawed.scene().dopplerCentroidHz, 0.0);
-  EXPECT_NEAR(yawed.scene().dopplerCentroidHz, 2.0 * norm(sv.vel) * std::sin(0.1 * M_PI / 180.0) * std::sin(offNadir) / lambda,
-              0.1 * yawed.scene().dopplerCentroidHz);
-  s.yawDeg = 0.0;
-  s.pitchDeg = -0.05;
-  EXPECT_LT(RawSceneSimulator(s).scene().dopplerCentroidHz, 0.0);
-  SimIni ini;
-  std::string err;
-  ASSERT_TRUE(ini.loadText("[Scene]\nyaw_deg = 0.2\ndoppler_centroid_hz = 10\n", err));
-  EXPECT_FALSE(SceneDescription::fromIni(ini, s, err));
 }
 
 TEST(SimEcho, SamplingWindowChangeMovesTheEchoInTheWindow) {

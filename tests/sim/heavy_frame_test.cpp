@@ -2,6 +2,8 @@
 // number of threads. Left out of the default run.
 #include <gtest/gtest.h>
 
+#include "support/files.h"
+
 #include <cstdint>
 #include <filesystem>
 #include <fstream>
@@ -38,7 +40,7 @@ TEST(HeavySimFrame, FullErsFrameIsIdenticalSerialAndParallel) {
   s.noiseSigma = 1.0;
   for (int i = 0; i < 50; ++i) s.pixelTargets.push_back({1500.0 + 500.0 * i, 150.0 + 97.0 * i, 0.0, 4.0});
   const RawSceneSimulator sim(s);
-  const std::string dir = testing::TempDir() + "/sim_heavy_" + std::to_string(::getpid());
+  const std::string dir = support::scratchDir("sim_heavy");
   std::string err;
   ASSERT_EQ(sim.writeErsScene(dir + "/a", err), 0) << err;
   const std::string image = sim.imagePath(dir + "/a");
@@ -51,5 +53,4 @@ TEST(HeavySimFrame, FullErsFrameIsIdenticalSerialAndParallel) {
   omp_set_num_threads(threads);
   EXPECT_EQ(fileHash(sim.imagePath(dir + "/b")), parallel);
 #endif
-  std::filesystem::remove_all(dir);
 }

@@ -2,6 +2,8 @@
 // windows, against closed-form values.
 #include <gtest/gtest.h>
 
+#include "support/files.h"
+
 #include <algorithm>
 #include <cmath>
 #include <cstring>
@@ -115,7 +117,7 @@ TEST(PointTargetAnalysis, SquintedSpectrumAndRasterFilesInBothByteOrders) {
   std::vector<cdouble> img = syntheticImage(rows, cols, 120.45, 70.2, -2.0, opt.azimuth, opt.range);
   for (int i = 0; i < rows; ++i)
     for (int j = 0; j < cols; ++j) img[static_cast<std::size_t>(i) * cols + j] *= std::polar(1.0, 2.0 * M_PI * 0.4 * (i - 120.45));
-  const std::string dir = testing::TempDir() + "/sim_pta_" + std::to_string(::getpid());
+  const std::string dir = support::scratchDir("sim_pta");
   std::filesystem::create_directories(dir);
   for (bool big : {false, true}) {
     const std::string path = dir + (big ? "/img_be" : "/img_le");
@@ -171,5 +173,4 @@ TEST(PointTargetAnalysis, SquintedSpectrumAndRasterFilesInBothByteOrders) {
     EXPECT_NEAR(r.errorLine, -0.55, 0.01);
     EXPECT_NEAR(r.errorSample, 1.2, 0.01);
   }
-  std::filesystem::remove_all(dir);
 }

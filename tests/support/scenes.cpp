@@ -1,58 +1,67 @@
-#pragma once
-// Synthetic range-compressed rasters for the Doppler centroid tests.
-//
-// Two kinds of clutter, both ERS-like (antenna 10 m, V 7100 m/s, PRF 1680 Hz,
-// fc 5.3 GHz, fs 18.96 MHz) with receiver noise:
-//  - makeVaryingClutter: azimuth lines of a moving-average process whose
-//    autocorrelation is that of a two-way sinc^2 antenna pattern (the cubic
-//    B-spline at lags 0, 1, 2), modulated to a centroid that varies linearly
-//    in range and azimuth. Exact second-order statistics, no range migration:
-//    for the fractional centroid.
-//  - makeChirpedClutter: white reflectivity through the two-dimensional
-//    transfer function of a side-looking radar (range band, antenna pattern
-//    around a constant absolute centroid with its aliases, range-Doppler
-//    phase with range migration): for the ambiguity estimators.
-#include <gtest/gtest.h>
-#include <unistd.h>
+#include "scenes.h"
 
 #include <algorithm>
 #include <bit>
-#include <cmath>
-#include <complex>
-#include <cstdio>
 #include <cstring>
-#include <filesystem>
-#include <fstream>
-#include <numbers>
 #include <random>
-#include <string>
-#include <vector>
 
-#include "base/fcomplex.h"
-#include "core/fft.h"
-#include "doppler/dc_state.h"
+namespace support {
 
-namespace dc_scene {
+SceneDescription ersScene(int lines, int samples, double dopplerHz) {
+  SceneDescription s;
+  s.mission = "ERS2";
+  s.orbit.semiMajorAxis = 7159500.0;
+  s.orbit.eccentricity = 0.0011;
+  s.orbit.inclinationDeg = 98.52;
+  s.orbit.nodeLongitudeDeg = 0.0;
+  s.orbit.argPerigeeDeg = 90.0;
+  s.orbit.meanAnomalyDeg = -50.0;
+  double start = 0.0;
+  simParseDate("18-JAN-2010 17:49:28.683", start);
+  s.orbit.epoch = start;
+  s.startTime = start;
+  s.lines = lines;
+  s.samples = samples;
+  s.nearRangeTime = 0.00555;
+  s.dopplerCentroidHz = dopplerHz;
+  s.orbitNumber = 77106;
+  s.frame = 2925;
+  s.arcNumber = 123;
+  s.sceneDir = "ERS2_SIM";
+  s.clutterSigma = 2.0;
+  s.noiseSigma = 1.0;
+  s.seed = 11;
+  return s;
+}
 
-struct Radar {
-  double fc = 5.3e9;
-  double fs = 18.96e6;
-  double prf = 1680.0;
-  double antenna = 10.0;
-  double velocity = 7100.0;
-  double range0 = 850e3;      // slant range, m
-  double bandFraction = 0.82; // range band as a fraction of fs
-};
+SensorScene ersSceneFiles(const RawSceneSimulator& sim, const std::string& folder) {
+  SensorScene out;
+  out.root = folder + "sim";
+  out.truth = out.root + "/truth.txt";
+  out.files = {{"image", sim.imagePath(out.root)},
+               {"leader", sim.leaderPath(out.root)},
+               {"orbit", sim.odrPath(out.root)},
+               {"orbit_archive", out.root + "/orbits"}};
+  return out;
+}
 
-// Centroid in PRF units: f0 + perSample * r + perLine * l.
-struct Centroid {
-  double f0 = 0.3;
-  double perSample = 0.0;
-  double perLine = 0.0;
-  double at(double r, double l) const { return f0 + perSample * r + perLine * l; }
-};
+bool simulateErs(const SceneDescription& scene, const std::string& folder, SensorScene& out,
+                 std::string& error) {
+  try {
+    const RawSceneSimulator sim(scene);
+    out = ersSceneFiles(sim, folder);
+    return sim.writeErsScene(out.root, error) == 0;
+  } catch (const std::exception& e) {
+    error = e.what();
+    return false;
+  }
+}
 
-inline double bspline3(double x) {
+namespace clutter {
+
+namespace {
+
+double bspline3(double x) {
   const double a = std::fabs(x);
   if (a <= 1.0) return 2.0 / 3.0 - a * a + a * a * a / 2.0;
   if (a < 2.0) return 4.0 / 3.0 - 2.0 * a + a * a - a * a * a / 6.0;
@@ -62,7 +71,7 @@ inline double bspline3(double x) {
 // Taps g0, g1, g2 of the causal filter whose output autocorrelation is
 // B(0), B(x), B(2x), x = 2 V / (L PRF) (spectral factorisation of the MA(2)
 // autocorrelation, roots inside the unit circle).
-inline std::vector<double> antennaTaps(const Radar& rd) {
+std::vector<double> antennaTaps(const Radar& rd) {
   const double x = 2.0 * rd.velocity / (rd.antenna * rd.prf);
   const double b0 = bspline3(0.0), b1 = bspline3(x), b2 = bspline3(2.0 * x);
   using C = std::complex<double>;
@@ -99,10 +108,10 @@ inline std::vector<double> antennaTaps(const Radar& rd) {
   return taps;
 }
 
-// Clutter of power B(0) per sample plus white noise at snrDb; rows of
-// `samples` samples, `lines` rows.
-inline std::vector<fcomplex> makeVaryingClutter(const Radar& rd, const Centroid& dc, int samples,
-                                                int lines, double snrDb, unsigned seed) {
+}  // namespace
+
+std::vector<fcomplex> makeVaryingClutter(const Radar& rd, const Centroid& dc, int samples, int lines,
+                                         double snrDb, unsigned seed) {
   const std::vector<double> g = antennaTaps(rd);
   const int nt = static_cast<int>(g.size());
   std::mt19937 rng(seed);
@@ -133,43 +142,43 @@ inline std::vector<fcomplex> makeVaryingClutter(const Radar& rd, const Centroid&
   return out;
 }
 
-// Clutter of unit power at an absolute centroid `dcPrf` (PRF units) plus
-// white noise at snrDb; `points` bright scatterers of amplitude `pointAmp`
-// against a reflectivity cell of unit power at random places.
-inline std::vector<fcomplex> makeChirpedClutter(const Radar& rd, double dcPrf, int samples,
-                                                int lines, double snrDb, unsigned seed,
-                                                int points = 0, double pointAmp = 0.0) {
+
+std::vector<fcomplex> makeClutter(const ClutterScene& sc, int samples, int lines) {
   const double c = 299792458.0;
   const double pi = std::numbers::pi;
-  std::mt19937 rng(seed);
+  std::mt19937 rng(sc.seed);
   std::normal_distribution<float> n01(0.0f, 1.0f);
   FFTBuffer data(static_cast<size_t>(samples) * lines);
   for (auto& v : data) v = fcomplex(n01(rng), n01(rng)) * static_cast<float>(std::sqrt(0.5));
   std::uniform_int_distribution<size_t> where(0, data.size() - 1);
-  for (int i = 0; i < points; ++i) data[where(rng)] += static_cast<float>(pointAmp);
+  std::uniform_real_distribution<double> phase(0.0, 2.0 * std::numbers::pi);
+  for (int i = 0; i < sc.points; ++i) {
+    const size_t at = where(rng);
+    data[at] += fcomplex(std::polar(sc.pointAmp, phase(rng)));
+  }
   fft_c(samples, samples, lines, lines, FFT_FORWARD, FFT_FORWARD, data.data(), data.data());
-  const double fdc = dcPrf * rd.prf;
-  const double k2 = std::pow(c / (2.0 * rd.velocity), 2);
+  const double fdc = sc.dcPrf * sc.prf;
+  const double k2 = std::pow(c / (2.0 * sc.velocity), 2);
   auto sinc = [pi](double x) { return std::fabs(x) < 1e-12 ? 1.0 : std::sin(pi * x) / (pi * x); };
   for (int q = 0; q < lines; ++q) {
-    const double fq = (q < lines / 2 ? q : q - lines) * rd.prf / lines;
+    const double fq = (q < lines / 2 ? q : q - lines) * sc.prf / lines;
     for (int k = 0; k < samples; ++k) {
-      const double fr = (k < samples / 2 ? k : k - samples) * rd.fs / samples;
+      const double fr = (k < samples / 2 ? k : k - samples) * sc.fs / samples;
       fcomplex& v = data[static_cast<size_t>(q) * samples + k];
-      if (std::fabs(fr) > rd.bandFraction * rd.fs / 2.0) {
+      if (std::fabs(fr) > sc.bandFraction * sc.fs / 2.0) {
         v = 0.0f;
         continue;
       }
-      const double f0 = rd.fc + fr;
-      const double centre = fdc * f0 / rd.fc;  // the beam centre scales with frequency
-      const double base = fq + std::round((centre - fq) / rd.prf) * rd.prf;
+      const double f0 = sc.fc + fr;
+      const double centre = fdc * f0 / sc.fc;  // the beam centre scales with frequency
+      const double base = fq + std::round((centre - fq) / sc.prf) * sc.prf;
       std::complex<double> h = 0.0;
       for (int m = -2; m <= 2; ++m) {
-        const double fa = base + m * rd.prf;
-        const double s = sinc(rd.antenna * (fa - centre) * rd.fc / (2.0 * rd.velocity * f0));
+        const double fa = base + m * sc.prf;
+        const double s = sinc(sc.antenna * (fa - centre) * sc.fc / (2.0 * sc.velocity * f0));
         // Range-Doppler phase less the bulk delay, in a cancellation-free form.
         const double dq = -k2 * fa * fa / (std::sqrt(f0 * f0 - k2 * fa * fa) + f0);
-        h += s * s * std::polar(1.0, -4.0 * pi * rd.range0 / c * dq);
+        h += s * s * std::polar(1.0, -4.0 * pi * sc.range0 / c * dq);
       }
       v *= fcomplex(h);
     }
@@ -178,20 +187,30 @@ inline std::vector<fcomplex> makeChirpedClutter(const Radar& rd, double dcPrf, i
         data.data(), data.data());
   // Noise against the clutter power alone (the reflectivity had unit power).
   double p = 0.0;
-  const size_t clutterCells = data.size();
   for (const auto& v : data) p += std::norm(v);
-  p /= static_cast<double>(clutterCells);
-  const double pointPower = double(points) * pointAmp * pointAmp / double(clutterCells);
+  p /= static_cast<double>(data.size());
+  const double pointPower = double(sc.points) * sc.pointAmp * sc.pointAmp / double(data.size());
   const float scale = static_cast<float>(1.0 / std::sqrt(p / (1.0 + pointPower)));
-  const float noise = static_cast<float>(std::sqrt(std::pow(10.0, -snrDb / 10.0) / 2.0));
+  const float noise = static_cast<float>(std::sqrt(std::pow(10.0, -sc.snrDb / 10.0) / 2.0));
   std::vector<fcomplex> out(data.size());
   for (size_t i = 0; i < data.size(); ++i) out[i] = data[i] * scale + noise * fcomplex(n01(rng), n01(rng));
   return out;
 }
 
-// Writes a FLOAT_COMPLEX raster, little-endian (byteOrder 0) or big-endian (1).
-inline bool writeRaster(const std::string& path, const std::vector<fcomplex>& data,
-                        int byteOrder = 0) {
+std::vector<fcomplex> makeClutter(const Radar& rd, double dcPrf, int samples, int lines, double snrDb,
+                                  unsigned seed, int points, double pointAmp) {
+  ClutterScene sc;
+  static_cast<Radar&>(sc) = rd;
+  sc.dcPrf = dcPrf;
+  sc.snrDb = snrDb;
+  sc.seed = seed;
+  sc.points = points;
+  sc.pointAmp = pointAmp;
+  return makeClutter(sc, samples, lines);
+}
+
+bool writeRaster(const std::string& path, const std::vector<fcomplex>& data,
+                        int byteOrder) {
   std::ofstream f(path, std::ios::binary);
   if (!f) return false;
   const bool hostLittle = std::endian::native == std::endian::little;
@@ -209,10 +228,10 @@ inline bool writeRaster(const std::string& path, const std::vector<fcomplex>& da
 }
 
 // Estimation state with ERS-like settings, scaled to small test rasters.
-inline DcEstState ersState(const Radar& rd) {
+DcEstState ersState(const Radar& rd, int blocks, int blockl) {
   DcEstState st;
-  st.blocks = 64;
-  st.blockl = 256;
+  st.blocks = blocks;
+  st.blockl = blockl;
   st.memory = int64_t(64) << 20;
   st.nBest = 10;
   st.nWdar = 5;
@@ -245,7 +264,7 @@ inline DcEstState ersState(const Radar& rd) {
 }
 
 // Input record for a raster written by the test.
-inline DcEstInput inputFor(const Radar& rd, const std::string& path, const std::string& dir,
+DcEstInput inputFor(const Radar& rd, const std::string& path, const std::string& dir,
                            int samples, int lines) {
   DcEstInput in;
   in.rasterFile = path;
@@ -259,7 +278,7 @@ inline DcEstInput inputFor(const Radar& rd, const std::string& path, const std::
 
 // Centroid of a Hz polynomial (range time from the first sample, azimuth
 // time from the first line) at sample r, line l, in PRF units.
-inline double polyPrf(const double poly[7], const Radar& rd, double r, double l) {
+double polyPrf(const double poly[7], const Radar& rd, double r, double l) {
   const double t = r / rd.fs, u = l / rd.prf;
   const double hz = poly[0] + poly[1] * t + poly[2] * u + poly[3] * t * u + poly[4] * t * t +
                     poly[5] * t * t * t + poly[6] * t * t * t * t;
@@ -267,18 +286,12 @@ inline double polyPrf(const double poly[7], const Radar& rd, double r, double l)
 }
 
 // Wrapped to (-1/2, 1/2].
-inline double wrapHalf(double v) {
+double wrapHalf(double v) {
   double w = v - std::floor(v);
   if (w > 0.5) w -= 1.0;
   return w;
 }
 
-// A fresh folder under the test temp dir.
-inline std::string tempDir(const std::string& name) {
-  const std::string d = ::testing::TempDir() + "/dc_" + name + "_" + std::to_string(::getpid());
-  std::filesystem::remove_all(d);
-  std::filesystem::create_directories(d);
-  return d;
-}
+}  // namespace clutter
 
-}  // namespace dc_scene
+}  // namespace support
