@@ -5,6 +5,7 @@
 #include <new>
 #include <vector>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/azimuth_focus.h"
 #include "core/fft.h"
@@ -23,7 +24,7 @@
 
 namespace {
 
-constexpr double kPi = 3.14159265358979323846;
+constexpr double kPi = consts::kPi;
 constexpr double kEqSpeedPlaceholder = 6900.0;
 
 int calledError(int status) {

@@ -11,6 +11,7 @@
 #include <fstream>
 #include <new>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/ckerr.h"
 #include "diag/report.h"
@@ -21,7 +22,6 @@
 
 namespace {
 
-constexpr double kSpeedOfLight = 299792458.0;
 // Sampling window start of a line from its window code, seconds.
 constexpr double kSwstStep = 2.10943e-07;
 constexpr double kSwstOffset = 0.005357529;
@@ -198,7 +198,7 @@ int ATERSExtractor::readLeader() {
 
   smp.fc_hz = f.real(1212, 8) * 1000000000.0;
   if (!(smp.fc_hz > 0.0)) return ERS_FAIL(bad("radar frequency"), STATUS_BAD_PARAMETER);
-  smp.lambda_m = kSpeedOfLight / smp.fc_hz;
+  smp.lambda_m = consts::kSpeedOfLight / smp.fc_hz;
   chirpCoefficient_ = f.real2(1366, 16);
   smp.Brg_hz = chirpCoefficient_;
   const double rateMHz = f.real(1430, 16);
