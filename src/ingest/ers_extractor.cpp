@@ -16,7 +16,7 @@
 #include "diag/ckerr.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
-#include "ingest/ceos_fields.h"
+#include "ingest/ceos/ceos_fields.h"
 #include "orbit/general_sar_orbit.h"
 #include "product/time_base.h"
 

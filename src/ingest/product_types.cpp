@@ -6,7 +6,7 @@
 
 #include "base/status.h"
 #include "diag/report.h"
-#include "ingest/ceos_fields.h"
+#include "ingest/ceos/ceos_fields.h"
 #include "product/roi.h"
 #include "product/time_base.h"
 

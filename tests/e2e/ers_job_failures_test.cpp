@@ -4,7 +4,7 @@
 #include <gtest/gtest.h>
 
 #include "e2e_support.h"
-#include "focus/level0_focusers.h"
+#include "focus/sensors/ers.h"
 #include "focus/multiplatform_focuser.h"
 #include "job/focuser_handover.h"
 

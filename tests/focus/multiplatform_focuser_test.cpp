@@ -10,7 +10,10 @@
 #include <string>
 #include <vector>
 
-#include "focus/level0_focusers.h"
+#include "focus/sensors/envisat.h"
+#include "focus/sensors/ers.h"
+#include "focus/sensors/palsar.h"
+#include "focus/sensors/radarsat.h"
 #include "focus/sar_focuser.h"
 #include "product/par_element.h"
 
@@ -412,19 +415,19 @@ TEST(MultiplatformFocuser, PalsarSceneCountMustFitThePolarisationsOfTheProduct) 
   f.platform = "PALSAR";
   f.level0Filename = s.touch("IMG-HH", std::string(800, '\0'));
   f.auxFile1 = "orbit";
-  EXPECT_EQ(f.palsarSceneCount(), 1);
+  EXPECT_EQ(palsarSceneCount(f), 1);
   f.level0FilenameSecondPol = "IMG-HV";
-  EXPECT_EQ(f.palsarSceneCount(), 2);
+  EXPECT_EQ(palsarSceneCount(f), 2);
   f.level0FilenameFourthPol = "IMG-VV";
-  EXPECT_EQ(f.palsarSceneCount(), 4);
+  EXPECT_EQ(palsarSceneCount(f), 4);
 
-  EXPECT_EQ(f.checkMultiPolPalsar(2), 10);  // no leader
+  EXPECT_EQ(checkMultiPolPalsar(f, 2), 10);  // no leader
   f.auxFile2 = leader("LED-single", "   1");
-  EXPECT_EQ(f.checkMultiPolPalsar(1), 0);
-  EXPECT_EQ(f.checkMultiPolPalsar(2), 10);
+  EXPECT_EQ(checkMultiPolPalsar(f, 1), 0);
+  EXPECT_EQ(checkMultiPolPalsar(f, 2), 10);
   f.auxFile2 = leader("LED-double", "   2");
-  EXPECT_EQ(f.checkMultiPolPalsar(2), 0);
-  EXPECT_EQ(f.checkMultiPolPalsar(3), 10);
+  EXPECT_EQ(checkMultiPolPalsar(f, 2), 0);
+  EXPECT_EQ(checkMultiPolPalsar(f, 3), 10);
   f.auxFile2 = leader("LED-quad", "   4");
-  EXPECT_EQ(f.checkMultiPolPalsar(4), 0);
+  EXPECT_EQ(checkMultiPolPalsar(f, 4), 0);
 }

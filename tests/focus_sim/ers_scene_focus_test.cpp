@@ -16,7 +16,7 @@
 #include "diag/ckerr.h"
 #include "diag/environment.h"
 #include "diag/report.h"
-#include "focus/level0_focusers.h"
+#include "focus/sensors/ers.h"
 #include "focus/sar_focuser.h"
 #include "product/data_set_info.h"
 #include "product/general_sar.h"
