@@ -10,7 +10,7 @@
 #include "diag/report.h"
 #include "focus/sensor_registry.h"
 #include "focus/sensors/palsar.h"
-#include "ingest/product_types.h"
+#include "ingest/palsar/palsar_types.h"
 #include "job/focuser_handover.h"
 #include "output/general_sar_kelmir.h"
 #include "output/raster_to_geotiff.h"

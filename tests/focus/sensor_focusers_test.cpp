@@ -5,7 +5,7 @@
 #include "focus/sensors/radarsat.h"
 #include "focus/sar_focuser.h"
 #include "focus_fixture.h"
-#include "ingest/ers_extractor.h"
+#include "ingest/ers/ers_extractor.h"
 #include "product/data_set_info.h"
 
 namespace {

@@ -6,9 +6,9 @@
 #include "diag/report.h"
 #include "focus/sensors/level0_chain.h"
 #include "focus/sensors/sensor_job.h"
-#include "ingest/ers_extractor.h"
-#include "ingest/product_types.h"
-#include "ingest/sar_product.h"
+#include "ingest/ers/ers_extractor.h"
+#include "ingest/ers/ers_level0.h"
+#include "ingest/ers/ers_types.h"
 #include "output/general_sar_kelmir.h"
 
 namespace {

@@ -4,7 +4,7 @@
 
 #include "base/status.h"
 #include "focus/sensors/sensor_job.h"
-#include "ingest/product_types.h"
+#include "ingest/palsar/palsar_types.h"
 #include "output/general_sar_kelmir.h"
 
 namespace {
