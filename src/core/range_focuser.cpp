@@ -181,13 +181,8 @@ int ATRangeFocuser::run() {
       ChirpLen = chirp.NrOfPixelsPerLine;
       if (ChirpLen < 1) return RF_FAIL("Replica raster is empty: " + ChirpFile, STATUS_BAD_PARAMETER);
       replica.assign(ChirpLen, fcomplex(0.0f, 0.0f));
-      BufferIO io;
-      io.file = &chirp;
-      io.first_column = 0;
-      io.columns = ChirpLen;
-      io.first_row = 0;
-      io.rows = 1;
-      io.memory_type = FLOAT_COMPLEX;
+      BufferIO io{.file = &chirp, .first_column = 0, .columns = ChirpLen, .first_row = 0,
+                   .rows = 1};
       const int st = io.readbuffer(replica.data());
       chirp.close();
       if (st != 0) return RF_CALLED(st);
@@ -287,13 +282,7 @@ int ATRangeFocuser::run() {
         std::fill(dst + shift[r] + V, dst + O, fcomplex(0.0f, 0.0f));
       }
     }
-    BufferIO io;
-    io.file = &out;
-    io.first_column = 0;
-    io.columns = O;
-    io.first_row = b * P;
-    io.rows = count;
-    io.memory_type = FLOAT_COMPLEX;
+    BufferIO io{.file = &out, .first_column = 0, .columns = O, .first_row = b * P, .rows = count};
     if (int st = io.writebuffer(outBlock.data()); st != 0) return RF_CALLED(st);
   }
   waitbar_close();

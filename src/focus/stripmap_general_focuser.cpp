@@ -19,8 +19,6 @@
 
 namespace {
 
-constexpr double kEqSpeedPlaceholder = 6900.0;
-
 int calledError(int status) {
   ORV_REPORT_CALLED_ERROR();
   return status;
@@ -253,16 +251,11 @@ int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
   record.polynomials.CreatePolys(1, 1);
   SARFocuser_conf conf = chainConfFrom(configuration);
   conf.Memory = Memory;
-  DcEstInput in;
-  in.rasterFile = file;
-  in.outDir = dir;
-  in.samples = record.dataFile.NrOfPixelsPerLine;
-  in.lines = record.dataFile.NrOfLinesPerImage;
-  in.prf = record.sampling.prf_hz;
-  in.velocity = kEqSpeedPlaceholder;
+  DcEstInput in = dcEstInput(file, dir, record.dataFile.NrOfPixelsPerLine,
+                             record.dataFile.NrOfLinesPerImage, record.sampling.prf_hz,
+                             record.roi.roi.SlowStartTime);
   in.byteOrder = record.dataFile.ByteOrder;
   in.headerOffset = record.dataFile.HeaderOffset;
-  in.timeOrigin = record.roi.roi.SlowStartTime;
   DcEstState state;
   fillDcEstState(conf, record.sampling.fc_hz, record.sampling.frg_hz, state);
   double c[7] = {0, 0, 0, 0, 0, 0, 0};
@@ -309,15 +302,8 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
   const int lines = record.dataFile.NrOfLinesPerImage;
   const int samples = record.dataFile.NrOfPixelsPerLine;
 
-  AzimuthFocusFiles files;
-  files.input = input;
-  files.output = output;
-  files.frg_hz = smp.frg_hz;
-  files.fc_hz = smp.fc_hz;
-  files.prf_hz = smp.prf_hz;
-  files.FastStartTime = roi.FastStartTime;
-  files.bandwidth_hz = smp.Brg_hz;
-  files.SlowStartTime = roi.SlowStartTime;
+  const AzimuthFocusFiles files =
+      azimuthFocusFiles(input, output, smp, roi.FastStartTime, roi.SlowStartTime);
   AzimuthFocusScene scene;
   scene.samples = samples;
   scene.lines = lines;
@@ -396,13 +382,8 @@ int stripmapGeneralFocuserModular::align_rawdata(const std::string& file) {
   std::vector<float> swst(lines);
   {
     std::vector<char> prefixes(static_cast<std::size_t>(in.RowPrefix) * lines);
-    BufferIO io;
-    io.file = &in;
-    io.first_column = 0;
-    io.columns = S;
-    io.first_row = 0;
-    io.rows = lines;
-    io.memory_type = in.CellType;
+    BufferIO io{.file = &in, .first_column = 0, .columns = S, .first_row = 0, .rows = lines,
+                 .memory_type = in.CellType};
     if (int st = io.readprefix(prefixes.data()); st != 0) return calledError(st);
     in.close();
     for (int l = 0; l < lines; ++l)
@@ -444,13 +425,7 @@ int stripmapGeneralFocuserModular::align_rawdata(const std::string& file) {
   std::vector<fcomplex> row(S), line(static_cast<std::size_t>(S) + D);
   if (int st = out.open(1); st != 0) return calledError(st);
   for (int l = 0; l < lines; ++l) {
-    BufferIO io;
-    io.file = &in;
-    io.first_column = 0;
-    io.columns = S;
-    io.first_row = l;
-    io.rows = 1;
-    io.memory_type = FLOAT_COMPLEX;
+    BufferIO io{.file = &in, .first_column = 0, .columns = S, .first_row = l, .rows = 1};
     if (int st = io.readbuffer(row.data()); st != 0) return calledError(st);
     std::fill(line.begin(), line.end(), fcomplex(0.0f, 0.0f));
     std::copy(row.begin(), row.end(), line.begin() + shift[l]);
@@ -570,22 +545,10 @@ int stripmapGeneralFocuserModular::cutRAW(const std::string& input, const std::s
     ORV_REPORT("Memory allocation failed", REPORT_ERROR);
     return STATUS_NO_MEMORY;
   }
-  BufferIO io;
-  io.file = &in;
-  io.first_column = s0;
-  io.columns = ns;
-  io.first_row = l0;
-  io.rows = nl;
-  io.memory_type = FLOAT_COMPLEX;
+  BufferIO io{.file = &in, .first_column = s0, .columns = ns, .first_row = l0, .rows = nl};
   if (int st = io.readbuffer(block.data()); st != 0) return calledError(st);
   in.close();
-  BufferIO wo;
-  wo.file = &out;
-  wo.first_column = 0;
-  wo.columns = ns;
-  wo.first_row = 0;
-  wo.rows = nl;
-  wo.memory_type = FLOAT_COMPLEX;
+  BufferIO wo{.file = &out, .first_column = 0, .columns = ns, .first_row = 0, .rows = nl};
   if (int st = wo.writebuffer(block.data()); st != 0) return calledError(st);
   if (int st = out.close(); st != 0) return calledError(st);
 

@@ -216,13 +216,8 @@ int SARPulse_Obj::writeChirp(const std::string& file) const {
   raster.RowPrefix = 0;
   raster.HeaderOffset = 0;
   raster.CellType = FLOAT_COMPLEX;
-  BufferIO io;
-  io.file = &raster;
-  io.first_column = 0;
-  io.columns = raster.NrOfPixelsPerLine;
-  io.first_row = 0;
-  io.rows = 1;
-  io.memory_type = FLOAT_COMPLEX;
+  BufferIO io{.file = &raster, .first_column = 0, .columns = raster.NrOfPixelsPerLine,
+               .first_row = 0, .rows = 1};
   int status = io.writebuffer(chirp.data());
   const int closeStatus = raster.close();
   if (status == 0) status = closeStatus;

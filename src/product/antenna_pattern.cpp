@@ -137,13 +137,8 @@ int AntennaPattern_Obj::getPatternArray(float* buffer) {
       ORV_REPORT("No antenna pattern samples", REPORT_ERROR);
       return 10;
     }
-    BufferIO io;
-    io.file = &patternFile;
-    io.first_column = 0;
-    io.columns = PatternSamples;
-    io.first_row = 0;
-    io.rows = 1;
-    io.memory_type = FLOAT32;
+    BufferIO io{.file = &patternFile, .first_column = 0, .columns = PatternSamples, .first_row = 0,
+                 .rows = 1, .memory_type = FLOAT32};
     int status = io.readbuffer(buffer);
     patternFile.close();
     if (status != 0) {
@@ -167,13 +162,8 @@ int AntennaPattern_Obj::WritePatternArray() {
   patternFile.RowPrefix = 0;
   patternFile.HeaderOffset = 0;
   patternFile.CellType = FLOAT32;
-  BufferIO io;
-  io.file = &patternFile;
-  io.first_column = 0;
-  io.columns = PatternSamples;
-  io.first_row = 0;
-  io.rows = 1;
-  io.memory_type = FLOAT32;
+  BufferIO io{.file = &patternFile, .first_column = 0, .columns = PatternSamples, .first_row = 0,
+               .rows = 1, .memory_type = FLOAT32};
   int status = io.writebuffer(Pattern.data());
   const int closeStatus = patternFile.close();
   if (status == 0) status = closeStatus;
