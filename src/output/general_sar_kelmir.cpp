@@ -11,6 +11,8 @@
 #include "diag/environment.h"
 #include "diag/orvane_exception.h"
 #include "diag/report.h"
+#include "orbit/general_sar_orbit.h"
+#include "orbit/palsar_orbit.h"
 #include "output/description_text.h"
 #include "output/description_xml.h"
 #include "product/time_base.h"
@@ -764,59 +766,20 @@ int GeneralSAR_kelmir::writehdr_kelmir(const std::string& file, const std::strin
   return writeFiles(file);
 }
 
-namespace {
-
-// Start time (date text) and step of the state vectors in the position
-// record of a CEOS leader.
-int readLeaderOrbitTiming(const std::string& leader, std::string& stepText, double& step,
-                          std::string& firstText) {
-  constexpr long kPositionRecord = 720 + 4096;
-  std::FILE* in = std::fopen(leader.c_str(), "rb");
-  if (!in) {
-    ORV_REPORT("File not opened! " + leader, REPORT_ERROR);
-    return STATUS_NOT_OPENED;
-  }
-  char record[206] = {};
-  bool ok = std::fseek(in, kPositionRecord, SEEK_SET) == 0 &&
-            std::fread(record, 1, 204, in) == 204;
-  std::fclose(in);
-  if (!ok) {
-    ORV_REPORT("File reading failed! " + leader, REPORT_ERROR);
-    return STATUS_READ_FAILED;
-  }
-  auto field = [&record](int offset, int length) { return std::string(record + offset, static_cast<std::size_t>(length)); };
-  int year = std::atoi(field(144, 4).c_str());
-  int month = std::atoi(field(148, 4).c_str());
-  int day = std::atoi(field(152, 4).c_str());
-  double secondsOfDay = std::atof(field(160, 22).c_str());
-  stepText = field(182, 22);
-  step = std::atof(stepText.c_str());
-  if (month < 1 || month > 12 || day < 1 || day > 31 || year < 1985) {
-    ORV_REPORT("File reading failed! " + leader + " (state vector date)", REPORT_ERROR);
-    return STATUS_READ_FAILED;
-  }
-  static const char months[] = "JANFEBMARAPRMAYJUNJULAUGSEPOCTNOVDEC";
-  char date[40];
-  std::snprintf(date, sizeof date, "%02d-%.3s-%04d 00:00:00.000000", day, months + 3 * (month - 1), year);
-  firstText = timeText(ascii2sec85(date) + secondsOfDay);
-  return STATUS_OK;
-}
-
-}  // namespace
-
 int GeneralSAR_kelmir::writehdr_ersdac_kelmir(const std::string& file, const std::string& leader,
                                               float defaultSpeed, int productTag) {
   if (productTag != KT_PALSAR_ERSDAC) {
     ORV_REPORT("ONLY ERSDAC with writehdr_ersdac_kelmir function", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  std::string stepText, firstText;
-  double step = 0.0;
-  int st = readLeaderOrbitTiming(leader, stepText, step, firstText);
+  std::string stepText;
+  double step = 0.0, firstTime = 0.0;
+  int st = read_palsar_leader_timing(leader, firstTime, stepText, step);
   if (st != 0) {
     ORV_REPORT_CALLED_ERROR();
     return st;
   }
+  const std::string firstText = timeText(firstTime);
   header_ = existingHeader(file);
   st = fillHeader("", defaultSpeed, productTag, false);
   if (st != 0) return st;

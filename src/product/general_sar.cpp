@@ -1,5 +1,3 @@
-// The record itself never touches the orbit classes (see the header).
-#define TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
 #include "product/general_sar.h"
 
 #include <cstdio>

@@ -1,5 +1,3 @@
-// Configuration never touches the orbit classes directly (see general_sar.h).
-#define TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
 #include "product/general_sar_configuration.h"
 
 #include <cstdio>

@@ -1,5 +1,3 @@
-// The aggregates never touch the orbit classes directly (see general_sar.h).
-#define TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
 #include "product/product_aggregates.h"
 
 #include <algorithm>
