@@ -38,7 +38,7 @@ int checkFocusInputs(GeneralSAR& record, bool needRate) {
     missing = "DataSetInfo does not exist!";
   if (!missing) return 0;
   ORV_REPORT(missing, REPORT_ERROR);
-  return 1;
+  return STATUS_BAD_CONDITION;
 }
 
 void removeReported(const std::string& name) {
@@ -73,37 +73,37 @@ stripmapGeneralFocuser::~stripmapGeneralFocuser() = default;
 int stripmapGeneralFocuser::checkNamesAndFiles() {
   if (level0Filename.empty()) {
     ORV_REPORT("Data filename not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (orbitFilename.empty()) {
     ORV_REPORT("Orbit filename not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (configurationFilename.empty()) {
     ORV_REPORT("Processing conf not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   outputSelected_ = !outputFilename.empty();
   if (!fileOpens(orbitFilename)) {
     ORV_REPORT("orbit file does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   // An ERS scene may be a directory.
   if (!fileOpens(level0Filename) && !directoryOpens(level0Filename)) {
     ORV_REPORT("data file does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (!fileOpens(configurationFilename)) {
     ORV_REPORT("processing configuration file does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (skipLines < 0) {
     ORV_REPORT("skip lines <0!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (extractLines < 0) {
     ORV_REPORT("extract lines <0!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   return 0;
 }
@@ -142,7 +142,7 @@ int stripmapGeneralFocuser::run(const std::string& raw, const std::string& chirp
 }
 
 int stripmapGeneralFocuser::sarfocuser() {
-  if (!conf_->Flag_set) return 1;
+  if (!conf_->Flag_set) return STATUS_BAD_CONDITION;
   conf_->Verbose = 1;
   int status = sarFocuser_->run();
   if (status != 0) {
@@ -155,7 +155,7 @@ int stripmapGeneralFocuser::sarfocuser() {
 
 int stripmapGeneralFocuser::sarfocuser(const std::string& raw, const std::string& chirp,
                                        const std::string& antenna, const std::string& output) {
-  if (outputSelected_) return 1;
+  if (outputSelected_) return STATUS_BAD_CONDITION;
   sarFocuser_->RawDataFile = raw;
   sarFocuser_->ChirpFile = chirp;
   if (!antenna.empty()) sarFocuser_->AntennaFile = antenna;
@@ -179,7 +179,7 @@ int stripmapGeneralFocuserModular::initialize_modular() {
   if (status != 0) return status;
   if (outputFilename.empty() && outputSelected_) {
     ORV_REPORT("Output filename not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   conf_->Flag_set = 0;
   return 0;
@@ -221,7 +221,7 @@ int stripmapGeneralFocuserModular::rangefoc(const std::string& raw, const std::s
   record.GSread(raw + ".hdr");
   if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
     ORV_REPORT("Raw data image does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   ATRangeFocuser rf;
   rf.RawData = raw;
@@ -246,7 +246,7 @@ int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
   if (int st = record.GSread(file + ".hdr"); st != 0) return calledError(st);
   if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
     ORV_REPORT("Range focused image does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   record.polynomials.CreatePolys(1, 1);
   SARFocuser_conf conf = chainConfFrom(configuration);
@@ -340,19 +340,19 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
 }
 
 int stripmapGeneralFocuserModular::rangefoc() {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return rangefoc(work.rawFile, work.chirpFile, work.rgfocFile);
 }
 int stripmapGeneralFocuserModular::dcEst() {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return dcEst(work.rgfocFile);
 }
 int stripmapGeneralFocuserModular::frEst() {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return frEst(work.rgfocFile);
 }
 int stripmapGeneralFocuserModular::azfoc(double azimuthShift) {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return azfoc(work.rgfocFile, work.outputFile, azimuthShift);
 }
 
@@ -364,7 +364,7 @@ int stripmapGeneralFocuserModular::align_rawdata(const std::string& file) {
   if (!record.GSexists(GeneralSAR::GS_DATAFILE) || !record.GSexists(GeneralSAR::GS_DATASETINFO) ||
       !record.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA)) {
     ORV_REPORT("Input File is not a not aligned raw data file", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   DataFile in(record.dataFile);
   in.filename = file;
@@ -484,7 +484,7 @@ int stripmapGeneralFocuserModular::getFOCroi(const ROI_Obj& raw, const ROI_Obj& 
       endSample > raw.Samples) {
     ORV_REPORT("Requested focused block cannot be obtained from the given extracted data",
                REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   result = raw;
   result.SetFastAxe(raw.FastStartTime + firstSample * raw.FastTimeDelta, raw.FastTimeDelta,
@@ -509,7 +509,7 @@ int stripmapGeneralFocuserModular::getRAWroi(const ROI_Obj& raw, const ROI_Obj& 
     ORV_REPORT("Requested raw block lies outside the raw data", REPORT_ERROR);
     *lines = std::max(*lines, 0);
     *samples = std::max(*samples, 0);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   return 0;
 }
@@ -521,7 +521,7 @@ int stripmapGeneralFocuserModular::cutRAW(const std::string& input, const std::s
   if (!record.GSexists(GeneralSAR::GS_DATAFILE) || !record.GSexists(GeneralSAR::GS_DATASETINFO) ||
       !record.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA_ALIGNED)) {
     ORV_REPORT("Raw Data must be range aligned!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   ROI_Obj& roi = record.roi.roi;
   int l0 = 0, nl = 0, s0 = 0, ns = 0;

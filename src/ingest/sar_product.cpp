@@ -27,11 +27,11 @@ int parseAuxName(const std::string& name, double* generation, double* start, dou
                             "%*14s%4d%2d%2d_%2d%2d%2d_%4d%2d%2d_%2d%2d%2d_%4d%2d%2d_%2d%2d%2d", &v[0],
                             &v[1], &v[2], &v[3], &v[4], &v[5], &v[6], &v[7], &v[8], &v[9], &v[10],
                             &v[11], &v[12], &v[13], &v[14], &v[15], &v[16], &v[17]);
-  if (n != 18) return 1;
+  if (n != 18) return STATUS_BAD_CONDITION;
   double t[3];
   for (int k = 0; k < 3; ++k) {
     const int* d = v + 6 * k;
-    if (!dateToSec85(d[0], d[1], d[2], d[3], d[4], d[5], t[k])) return 1;
+    if (!dateToSec85(d[0], d[1], d[2], d[3], d[4], d[5], t[k])) return STATUS_BAD_CONDITION;
   }
   *generation = t[0];
   *start = t[1];
@@ -44,9 +44,9 @@ int parseDorName(const std::string& name, double* start, double* stop) {
   const int n = std::sscanf(name.c_str(), "%*12s-P%*d_%*d_%4d%2d%2d_%2d%2d%2d_%4d%2d%2d_%2d%2d%2d",
                             &v[0], &v[1], &v[2], &v[3], &v[4], &v[5], &v[6], &v[7], &v[8], &v[9],
                             &v[10], &v[11]);
-  if (n != 12) return 1;
-  if (!dateToSec85(v[0], v[1], v[2], v[3], v[4], v[5], *start)) return 1;
-  if (!dateToSec85(v[6], v[7], v[8], v[9], v[10], v[11], *stop)) return 1;
+  if (n != 12) return STATUS_BAD_CONDITION;
+  if (!dateToSec85(v[0], v[1], v[2], v[3], v[4], v[5], *start)) return STATUS_BAD_CONDITION;
+  if (!dateToSec85(v[6], v[7], v[8], v[9], v[10], v[11], *stop)) return STATUS_BAD_CONDITION;
   return 0;
 }
 
@@ -89,10 +89,10 @@ int validityTime(const std::string& fileName, bool stop, double* t, Parse parse)
   if (fileName.empty()) {
     ORV_REPORT(stop ? "File not set, cannot find stop time" : "File not set, cannot find start time",
                REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   double first = 0.0, last = 0.0;
-  if (parse(&first, &last) != 0) return 1;
+  if (parse(&first, &last) != 0) return STATUS_BAD_CONDITION;
   *t = stop ? last : first;
   return 0;
 }
@@ -101,11 +101,11 @@ int validityTime(const std::string& fileName, bool stop, double* t, Parse parse)
 
 // ---- base ------------------------------------------------------------------------
 
-int SAR_product::getTimeStop(double*) { return 1; }
-int SAR_product::getTimeStart(double*) { return 1; }
+int SAR_product::getTimeStop(double*) { return STATUS_BAD_CONDITION; }
+int SAR_product::getTimeStart(double*) { return STATUS_BAD_CONDITION; }
 
 int SAR_product::setfileName(const std::string& name) {
-  if (name.empty()) return 1;
+  if (name.empty()) return STATUS_BAD_CONDITION;
   fileName_ = name;
   return 0;
 }
@@ -173,9 +173,9 @@ int Envisat_DorVor::getTimeStop(double* t) {
 
 int Envisat_DorVor::getDorVor(double time, const std::string& path) {
   CheckedCall cc("Envisat_DorVor::getDorVor()");
-  if (time < 0.0 || path.empty()) return 1;
+  if (time < 0.0 || path.empty()) return STATUS_BAD_CONDITION;
   DirHandle dir(opendir(path.c_str()));
-  if (!dir) return 1;
+  if (!dir) return STATUS_BAD_CONDITION;
   const bool backslash = path.back() == '\\';
   while (const dirent* entry = readdir(dir.get())) {
     const std::string name = entry->d_name;
@@ -195,17 +195,17 @@ int Envisat_DorVor::getDorVor(double time, const std::string& path) {
 // ---- ENVISAT level 0 -------------------------------------------------------------
 
 int Envisat_level0::getTimeStart(double* t) {
-  if (fileName_.empty()) return 1;
+  if (fileName_.empty()) return STATUS_BAD_CONDITION;
   ROI_Obj roi;
-  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return 1;
+  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return STATUS_BAD_CONDITION;
   *t = roi.SlowStartTime;
   return 0;
 }
 
 int Envisat_level0::getTimeStop(double* t) {
-  if (fileName_.empty()) return 1;
+  if (fileName_.empty()) return STATUS_BAD_CONDITION;
   ROI_Obj roi;
-  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return 1;
+  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return STATUS_BAD_CONDITION;
   *t = roi.SlowStartTime + roi.SlowTimeLength;
   return 0;
 }

@@ -13,6 +13,7 @@
 #include "diag/orvane_exception.h"
 #include "diag/parameter_lines.h"
 #include "diag/report.h"
+#include "product/profile.h"
 #include "focus/sensor_registry.h"
 #include "job/job_file.h"
 
@@ -110,7 +111,7 @@ int ftesv_main_focussing_stripmap(const std::string& jobPath) {
   ORV_REPORT(parameters[0], REPORT_WARNING);
   fillFocuserFields(focuser->job, parameters, ceosDirectory);
   int alternatingPolarisation = 0;
-  if (chooseParameterProfile(focuser->job, ceosDirectory, alternatingPolarisation) != 0) return 1;
+  if (chooseParameterProfile(focuser->job, ceosDirectory, alternatingPolarisation) != 0) return STATUS_BAD_CONDITION;
 
   if (focuser->checkpar() != 0) TESV_FATAL(EC_STAGE_FAILED, "checkpar()");
   if (focuser->InitProcessing() != 0) TESV_FATAL(EC_STAGE_FAILED, "InitProcessing()");
@@ -137,6 +138,10 @@ int stripmapFocuserEntry(int argc, char** argv) {
     // Library code that does not return statuses ends the run here.
     try {
       result = ftesv_main_focussing_stripmap(command.substr(prefix.size()));
+    } catch (const ProfileMemoryError& e) {
+      // A profile that does not fit in memory ends the run at once.
+      std::fputs(e.what(), stderr);
+      std::exit(1);
     } catch (const orvaneException& e) {
       TESV_FATAL(EC_STAGE_FAILED, e.getMessage() + " (" + e.getFile() + ", " + e.getFunction() +
                                       ", line " + std::to_string(e.getLine()) + ")");

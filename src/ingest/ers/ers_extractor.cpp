@@ -119,7 +119,7 @@ int ATERSExtractor::runall(const std::string& file, int channel) {
   std::string target = ReportFilename;
   if (getConfigurationFile(file, channel, "ATERSExtractor", target)) {
     ReportFilename = target;
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (int st = InitProcessing(file, channel); st != 0) return ERS_CALLED(st);
   if (int st = run(); st != 0) return ERS_CALLED(st);

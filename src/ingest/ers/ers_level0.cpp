@@ -18,7 +18,7 @@ int Ers_DEOS::getTimeStart(double*) { return 0; }
 
 int Ers_DEOS::getDEOS(double time, int satellite, const std::string& path) {
   CheckedCall cc("Ers_DEOS::getDEOS()");
-  if ((satellite != 0 && satellite != 1) || time < 0.0 || path.empty()) return 1;
+  if ((satellite != 0 && satellite != 1) || time < 0.0 || path.empty()) return STATUS_BAD_CONDITION;
   // The same list serves both satellites.
   const std::string list = path + "/ERS1/PRECISE/arclist";
   std::unique_ptr<std::FILE, int (*)(std::FILE*)> in(std::fopen(list.c_str(), "r"), &std::fclose);
@@ -38,8 +38,8 @@ int Ers_DEOS::getDEOS(double time, int satellite, const std::string& path) {
     y1 += y1 > 85 ? 1900 : 2000;
     y2 += y2 > 85 ? 1900 : 2000;
     double begin = 0.0, end = 0.0;
-    if (!dateToSec85(y1, m1, d1, h1, mi1, s1, begin)) return 1;
-    if (!dateToSec85(y2, m2, d2, h2, mi2, 0, end)) return 1;
+    if (!dateToSec85(y1, m1, d1, h1, mi1, s1, begin)) return STATUS_BAD_CONDITION;
+    if (!dateToSec85(y2, m2, d2, h2, mi2, 0, end)) return STATUS_BAD_CONDITION;
     if (!(begin < time && time < end)) continue;
     int arc = 0;
     if (std::sscanf(line, " %3d%*s", &arc) != 1) continue;
@@ -56,14 +56,14 @@ int Ers_DEOS::getDEOS(double time, int satellite, const std::string& path) {
 
 int Ers_level0::getTimeStart(double* t) {
   ROI_Obj roi;
-  if (ErsTypes(fileName_).read_roi(&roi) != 1) return 1;
+  if (ErsTypes(fileName_).read_roi(&roi) != 1) return STATUS_BAD_CONDITION;
   *t = roi.SlowStartTime;
   return 0;
 }
 
 int Ers_level0::getTimeStop(double* t) {
   ROI_Obj roi;
-  if (ErsTypes(fileName_).read_roi(&roi) != 1) return 1;
+  if (ErsTypes(fileName_).read_roi(&roi) != 1) return STATUS_BAD_CONDITION;
   *t = roi.SlowStartTime + roi.SlowTimeLength;
   return 0;
 }
@@ -73,14 +73,14 @@ int Ers_level0::getAuxFiles(int selector, const std::string& path) {
   if (selector != 3) return 0;
   const ErsTypes types(fileName_);
   ROI_Obj roi;
-  if (types.read_roi(&roi) != 1) return 1;
+  if (types.read_roi(&roi) != 1) return STATUS_BAD_CONDITION;
   int satellite;
   if (types.is_ers1())
     satellite = 0;
   else if (types.is_ers2())
     satellite = 1;
   else
-    return 1;
+    return STATUS_BAD_CONDITION;
   const std::string tag = satellite == 0 ? "ERS1" : "ERS2";
   ORV_REPORT(tag + " image found, looking for orbit... ", REPORT_CHECKPOINT);
   if (int st = orbit_.getDEOS(roi.SlowStartTime, satellite, path); st != 0) {
