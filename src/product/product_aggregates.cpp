@@ -4,6 +4,7 @@
 #include <cmath>
 
 #include "base/constants.h"
+#include "base/status.h"
 #include "diag/report.h"
 
 namespace {
@@ -79,7 +80,7 @@ int ImageSARData_Obj::destroyAll() {
 int ImageSARData_Obj::compute_eqspeed() {
   if (polynomials.FR.empty() || polynomials.DC.empty()) {
     ORV_REPORT("NO FR poly available", REPORT_ERROR);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   const double c = consts::kSpeedOfLight;
   const double lambda = c / sampling.fc_hz;
