@@ -308,13 +308,7 @@ int ATRangeFocuser::run() {
   }
   roi.Lines = lines;
   info.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
-  gs.dataFile.filename = OutputFile;
-  gs.dataFile.NrOfPixelsPerLine = O;
-  gs.dataFile.NrOfLinesPerImage = lines;
-  gs.dataFile.RowPrefix = 0;
-  gs.dataFile.HeaderOffset = 0;
-  gs.dataFile.CellType = FLOAT_COMPLEX;
-  gs.dataFile.ByteOrder = 0;
+  setComplexRasterLayout(gs.dataFile, OutputFile, O, lines);
   if (int st = gs.GSwrite(OutputFile + ".hdr"); st != 0) return RF_CALLED(st);
   if (int st = out.write_hdr(); st != 0) return RF_CALLED(st);
   return 0;

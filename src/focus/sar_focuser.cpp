@@ -282,14 +282,7 @@ void setHammingWindows(SpectralWindows_Obj& w, const SARFocuser_conf& conf) {
 void setFocusedProduct(GeneralSAR& product, const std::string& raster,
                        const AzimuthFocusScene& scene, const ROI_Obj& deltas,
                        const SARFocuser_conf& conf, double lambda) {
-  DataFile& df = product.dataFile;
-  df.filename = raster;
-  df.NrOfPixelsPerLine = scene.outSamples;
-  df.NrOfLinesPerImage = scene.outLines;
-  df.RowPrefix = 0;
-  df.HeaderOffset = 0;
-  df.CellType = FLOAT_COMPLEX;
-  df.ByteOrder = 0;
+  setComplexRasterLayout(product.dataFile, raster, scene.outSamples, scene.outLines);
   ROI_Obj& roi = product.roi.roi;
   roi.SetFastAxe(scene.firstSampleTime, deltas.FastTimeDelta, scene.outSamples);
   roi.SetSlowAxe(scene.firstLineTime, deltas.SlowTimeDelta, scene.outLines);
@@ -644,13 +637,7 @@ int SARFocuser::process() {
     rg.dataSetInfo.Polarization = rawRecord.dataSetInfo.Polarization;
     rg.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
     rg.rasterName = ctx.rgfocFile;
-    rg.dataFile.filename = ctx.rgfocFile;
-    rg.dataFile.RowPrefix = 0;
-    rg.dataFile.HeaderOffset = 0;
-    rg.dataFile.CellType = FLOAT_COMPLEX;
-    rg.dataFile.ByteOrder = 0;
-    rg.dataFile.NrOfPixelsPerLine = rgSamples;
-    rg.dataFile.NrOfLinesPerImage = rgLines;
+    setComplexRasterLayout(rg.dataFile, ctx.rgfocFile, rgSamples, rgLines);
     rg.roi.SetFastAxe(ctx.swstMin, rawRoi.FastTimeDelta, rgSamples);
     rg.roi.SetSlowAxe(ctx.azimuthStart, rawRoi.SlowTimeDelta, rgLines);
     rg.polynomials.CreatePolys(1, 1);

@@ -556,13 +556,7 @@ int stripmapGeneralFocuserModular::cutRAW(const std::string& input, const std::s
   roi.SetFastAxe(fast0, roi.FastTimeDelta, ns);
   roi.SetSlowAxe(roi.SlowStartTime + l0 * roi.SlowTimeDelta, roi.SlowTimeDelta, nl);
   record.dataSetInfo.SWST_MIN = record.dataSetInfo.SWST_MAX = fast0;
-  record.dataFile.filename = output;
-  record.dataFile.NrOfPixelsPerLine = ns;
-  record.dataFile.NrOfLinesPerImage = nl;
-  record.dataFile.RowPrefix = 0;
-  record.dataFile.HeaderOffset = 0;
-  record.dataFile.CellType = FLOAT_COMPLEX;
-  record.dataFile.ByteOrder = 0;
+  setComplexRasterLayout(record.dataFile, output, ns, nl);
   if (int st = record.GSwrite(output + ".hdr"); st != 0) return calledError(st);
   record.GSdestroy();
   return 0;
