@@ -18,25 +18,25 @@ const unsigned char kTypeFilePointer[4] = {0xdb, 0xc0, 0x12, 0x12};
 const unsigned char kTypeText[4] = {0x12, 0x3f, 0x12, 0x12};
 const unsigned char kTypeNull[4] = {0xc0, 0xc0, 0x3f, 0x12};
 
-void putF16(char* r, int off, double v) { putFormat(r, off, 16, "%16.7f", v); }
+void putF16(char* r, CeosField field, double v) { putFormat(r, field, "%16.7f", v); }
 
 // File descriptor record head shared by the leader and the image file.
 void fileDescriptorHead(char* r, const std::string& software, int fileNumber, const std::string& fileName) {
-  putText(r, 12, 4, "A");
-  putText(r, 16, 12, "CEOS-SAR-CCT");
-  putText(r, 28, 4, " B B");
-  putText(r, 32, 12, software);
-  putInt(r, 44, 4, "%4ld", fileNumber);
-  putText(r, 48, 16, fileName);
-  putText(r, 64, 4, "FSEQ");
-  putInt(r, 68, 8, "%8ld", 1);
-  putInt(r, 76, 4, "%4ld", 4);
-  putText(r, 80, 4, "FTYP");
-  putInt(r, 84, 8, "%8ld", 5);
-  putInt(r, 92, 4, "%4ld", 4);
-  putText(r, 96, 4, "FLGT");
-  putInt(r, 100, 8, "%8ld", 9);
-  putInt(r, 108, 4, "%4ld", 4);
+  putText(r, ceos_descriptor::kAsciiFlag, "A");
+  putText(r, ceos_descriptor::kFormatDocument, "CEOS-SAR-CCT");
+  putText(r, ceos_descriptor::kFormatRevision, " B B");
+  putText(r, ceos_descriptor::kSoftwareVersion, software);
+  putInt(r, ceos_descriptor::kFileNumber, "%4ld", fileNumber);
+  putText(r, ceos_descriptor::kFileName, fileName);
+  putText(r, ceos_descriptor::kSequenceFlag, "FSEQ");
+  putInt(r, ceos_descriptor::kSequenceLocation, "%8ld", 1);
+  putInt(r, ceos_descriptor::kSequenceWidth, "%4ld", 4);
+  putText(r, ceos_descriptor::kCodeFlag, "FTYP");
+  putInt(r, ceos_descriptor::kCodeLocation, "%8ld", 5);
+  putInt(r, ceos_descriptor::kCodeWidth, "%4ld", 4);
+  putText(r, ceos_descriptor::kLengthFlag, "FLGT");
+  putInt(r, ceos_descriptor::kLengthLocation, "%8ld", 9);
+  putInt(r, ceos_descriptor::kLengthWidth, "%4ld", 4);
 }
 
 }  // namespace
@@ -84,189 +84,211 @@ void putInt(char* rec, int offset, int width, const char* format, long value) {
   std::memcpy(rec + offset + (width - n), buf, n);
 }
 
+void putText(char* rec, CeosField field, const std::string& text) {
+  putText(rec, field.offset, field.width, text);
+}
+
+void putFormat(char* rec, CeosField field, const char* format, double value) {
+  putFormat(rec, field.offset, field.width, format, value);
+}
+
+void putInt(char* rec, CeosField field, const char* format, long value) {
+  putInt(rec, field.offset, field.width, format, value);
+}
+
 std::vector<char> buildErsLeader(const ErsLeaderInfo& in) {
+  namespace fdr = ers_leader::fdr;
+  namespace dss = ers_leader::dss;
+  namespace ppr = ers_leader::ppr;
   const int nVec = static_cast<int>(in.vectors.size());
-  const int pprLength = 386 + 132 * nVec;
-  const int facilityLength = 12288;
-  const std::size_t total = 720 + 1886 + pprLength + 2 * facilityLength;
+  const int pprLength = ppr::length(nVec);
+  const int facilityLength = ers_leader::kFacilityLength;
+  const std::size_t total = ers_leader::kFileDescriptorLength + ers_leader::kDataSetSummaryLength +
+                            pprLength + 2 * facilityLength;
   std::vector<char> file(total, ' ');
 
   // File descriptor record.
-  char* r = file.data();
-  putCeosRecordHead(r, 1, kTypeFdr, 720);
+  char* r = file.data() + ers_leader::kFileDescriptor;
+  putCeosRecordHead(r, 1, kTypeFdr, ers_leader::kFileDescriptorLength);
   fileDescriptorHead(r, in.software, 1, in.mission + ".SAR.RAWLEAD");
-  putInt(r, 180, 6, "%6ld", 1);
-  putInt(r, 186, 6, "%6ld", 1886);
-  putInt(r, 192, 6, "%6ld", 0);
-  putInt(r, 198, 6, "%6ld", 0);
-  putInt(r, 204, 6, "%6ld", 1);
-  putInt(r, 210, 6, "%6ld", pprLength);
-  for (int k = 0; k < 12; ++k) {  // attitude .. ground control points: none
-    putInt(r, 216 + 12 * k, 6, "%6ld", 0);
-    putInt(r, 222 + 12 * k, 6, "%6ld", 0);
+  putInt(r, fdr::kSummaryCount, "%6ld", 1);
+  putInt(r, fdr::kSummaryLength, "%6ld", ers_leader::kDataSetSummaryLength);
+  putInt(r, fdr::kMapProjectionCount, "%6ld", 0);
+  putInt(r, fdr::kMapProjectionLength, "%6ld", 0);
+  putInt(r, fdr::kPositionCount, "%6ld", 1);
+  putInt(r, fdr::kPositionLength, "%6ld", pprLength);
+  for (int k = 0; k < fdr::kOtherKinds; ++k) {  // attitude .. ground control points: none
+    putInt(r, fdr::kOtherCount.element(k, fdr::kOtherStride), "%6ld", 0);
+    putInt(r, fdr::kOtherLength.element(k, fdr::kOtherStride), "%6ld", 0);
   }
-  putInt(r, 420, 6, "%6ld", 2);
-  putInt(r, 426, 6, "%6ld", facilityLength);
+  putInt(r, fdr::kFacilityCount, "%6ld", 2);
+  putInt(r, fdr::kFacilityLength, "%6ld", facilityLength);
 
   // Data set summary record.
-  r = file.data() + kErsDssOffset;
-  putCeosRecordHead(r, 2, kTypeDss, 1886);
-  putInt(r, 12, 4, "%4ld", 1);
-  putInt(r, 16, 4, "%4ld", 1);
-  putText(r, 36, 32, in.sceneDesignator);
-  putText(r, 68, 32, simCompactDateText(in.sceneCentreTime));
-  putF16(r, 116, in.sceneCentreLat);
-  putF16(r, 132, in.sceneCentreLon);
-  putF16(r, 148, kAbsent);
-  putText(r, 164, 16, in.ellipsoid);
-  putF16(r, 180, in.semiMajorKm);
-  putF16(r, 196, in.semiMinorKm);
-  putF16(r, 212, 3.9860044);
-  putF16(r, 244, 1082.28);
-  putF16(r, 260, -2.3);
-  putF16(r, 276, -0.2);
-  putInt(r, 324, 8, "%08ld", in.centreLine);
-  putInt(r, 332, 8, "%08ld", in.centrePixel);
-  putF16(r, 340, in.sceneLengthKm);
-  putF16(r, 356, in.sceneWidthKm);
-  putText(r, 388, 4, "0001");
-  putText(r, 396, 16, in.mission);
-  putText(r, 412, 32, "   SAR- C-HR-IM-" + in.polarisation.substr(0, 2));
-  putInt(r, 444, 8, "%8ld", in.orbitNumber);
-  putFormat(r, 452, 8, "%8.3f", in.platformLat);
-  putFormat(r, 460, 8, "%8.3f", in.platformLon);
-  putFormat(r, 468, 8, "%8.3f", in.platformHeading);
-  putFormat(r, 476, 8, "%8.3f", 90.0);
-  putFormat(r, 484, 8, "%8.3f", in.incidenceDeg);
-  putFormat(r, 492, 8, "%8.3f", in.radarFreqGHz);
-  putFormat(r, 502, 16, "%16.9f", in.wavelength);
-  putText(r, 518, 16, "LINEAR FM CHIRP");
-  const double amplitude[5] = {1.0, 0.0, 0.0, 0.0, 0.0};
-  const double phase[5] = {0.0, 0.0, in.chirpCoefficient, 0.0, 0.0};
-  for (int k = 0; k < 5; ++k) putFormat(r, 534 + 16 * k, 16, "%16.7e", amplitude[k]);
-  for (int k = 0; k < 5; ++k) putFormat(r, 614 + 16 * k, 16, "%16.7e", phase[k]);
-  putInt(r, 694, 8, "%8ld", 29);
-  putF16(r, 710, in.samplingRateMHz);
-  putF16(r, 742, in.pulseLengthUs);
-  putText(r, 762, 4, "NO");
-  putInt(r, 798, 8, "%08ld", 5);
-  putText(r, 806, 12, "UNIFORM IQ");
-  putF16(r, 818, in.biasI);
-  putF16(r, 834, in.biasQ);
-  putF16(r, 850, kAbsent);
-  putF16(r, 914, in.mechanicalBoresightDeg);
-  putF16(r, 934, in.prf);
-  putText(r, 998, 32, simCompactDateText(in.firstLineTime));
-  putText(r, 1046, 16, in.facility);
-  putText(r, 1062, 8, "SARSIM");
-  putText(r, 1070, 8, "1.0");
-  putText(r, 1110, 32, "SAR RAW SIGNAL DATA");
-  for (int k = 0; k < 6; ++k) putF16(r, 1174 + 16 * k, kAbsent);
-  putText(r, 1334, 16, "HDDT");
-  putF16(r, 1350, kAbsent);
-  putF16(r, 1366, kAbsent);
-  for (int k = 0; k < 3; ++k) {
-    putF16(r, 1414 + 16 * k, kAbsent);
-    putF16(r, 1478 + 16 * k, kAbsent);
-    putF16(r, 1542 + 16 * k, kAbsent);
-    putF16(r, 1606 + 16 * k, kAbsent);
+  r = file.data() + ers_leader::kDataSetSummary;
+  putCeosRecordHead(r, 2, kTypeDss, ers_leader::kDataSetSummaryLength);
+  putInt(r, dss::kSequence, "%4ld", 1);
+  putInt(r, dss::kSarChannel, "%4ld", 1);
+  putText(r, dss::kSceneDesignator, in.sceneDesignator);
+  putText(r, dss::kSceneCentreTime, simCompactDateText(in.sceneCentreTime));
+  putF16(r, dss::kSceneCentreLat, in.sceneCentreLat);
+  putF16(r, dss::kSceneCentreLon, in.sceneCentreLon);
+  putF16(r, dss::kSceneCentreHeading, kAbsent);
+  putText(r, dss::kEllipsoid, in.ellipsoid);
+  putF16(r, dss::kSemiMajorKm, in.semiMajorKm);
+  putF16(r, dss::kSemiMinorKm, in.semiMinorKm);
+  putF16(r, dss::kEarthMass, 3.9860044);
+  putF16(r, dss::kJ2, 1082.28);
+  putF16(r, dss::kJ3, -2.3);
+  putF16(r, dss::kJ4, -0.2);
+  putInt(r, dss::kCentreLine, "%08ld", in.centreLine);
+  putInt(r, dss::kCentrePixel, "%08ld", in.centrePixel);
+  putF16(r, dss::kSceneLengthKm, in.sceneLengthKm);
+  putF16(r, dss::kSceneWidthKm, in.sceneWidthKm);
+  putText(r, dss::kChannelCount, "0001");
+  putText(r, dss::kMission, in.mission);
+  putText(r, dss::kSensorId, "   SAR- C-HR-IM-" + in.polarisation.substr(0, 2));
+  putInt(r, dss::kOrbitNumber, "%8ld", in.orbitNumber);
+  putFormat(r, dss::kPlatformLat, "%8.3f", in.platformLat);
+  putFormat(r, dss::kPlatformLon, "%8.3f", in.platformLon);
+  putFormat(r, dss::kPlatformHeading, "%8.3f", in.platformHeading);
+  putFormat(r, dss::kClockAngle, "%8.3f", 90.0);
+  putFormat(r, dss::kIncidence, "%8.3f", in.incidenceDeg);
+  putFormat(r, dss::kRadarFrequencyGHz, "%8.3f", in.radarFreqGHz);
+  putFormat(r, dss::kWavelength, "%16.9f", in.wavelength);
+  putText(r, dss::kPulseCode, "LINEAR FM CHIRP");
+  const double amplitude[dss::kPulseCoefficients] = {1.0, 0.0, 0.0, 0.0, 0.0};
+  const double phase[dss::kPulseCoefficients] = {0.0, 0.0, in.chirpCoefficient, 0.0, 0.0};
+  for (int k = 0; k < dss::kPulseCoefficients; ++k) {
+    putFormat(r, dss::kPulseAmplitude.element(k, dss::kPulseCoefficientStride), "%16.7e",
+              amplitude[k]);
   }
-  putText(r, 1526, 8, "INCREASE");
-  putText(r, 1534, 8, "INCREASE");
-  putText(r, 1670, 8, "RANGE");
-  putText(r, 1678, 4, "NOT");
-  putText(r, 1682, 4, "NOT");
-  putF16(r, 1686, in.lineSpacing);
-  putF16(r, 1702, in.pixelSpacing);
-  putF16(r, 1766, in.firstRangeTimeMs);
-  putF16(r, 1782, in.centreRangeTimeMs);
-  putF16(r, 1798, in.lastRangeTimeMs);
-  putText(r, 1814, 24, simDateText(in.firstLineTime));
-  putText(r, 1838, 24, simDateText(in.centreLineTime));
-  putText(r, 1862, 24, simDateText(in.lastLineTime));
+  for (int k = 0; k < dss::kPulseCoefficients; ++k)
+    putFormat(r, dss::kPulsePhase.element(k, dss::kPulseCoefficientStride), "%16.7e", phase[k]);
+  putInt(r, dss::kChirpExtractionIndex, "%8ld", 29);
+  putF16(r, dss::kSamplingRateMHz, in.samplingRateMHz);
+  putF16(r, dss::kPulseLengthUs, in.pulseLengthUs);
+  putText(r, dss::kBasebandConversion, "NO");
+  putInt(r, dss::kQuantisationBits, "%08ld", 5);
+  putText(r, dss::kQuantiser, "UNIFORM IQ");
+  putF16(r, dss::kBiasI, in.biasI);
+  putF16(r, dss::kBiasQ, in.biasQ);
+  putF16(r, dss::kGainImbalance, kAbsent);
+  putF16(r, dss::kBoresight, in.mechanicalBoresightDeg);
+  putF16(r, dss::kPrf, in.prf);
+  putText(r, dss::kFirstLineCompact, simCompactDateText(in.firstLineTime));
+  putText(r, dss::kFacility, in.facility);
+  putText(r, dss::kProcessingSystem, "SARSIM");
+  putText(r, dss::kProcessingVersion, "1.0");
+  putText(r, dss::kProductType, "SAR RAW SIGNAL DATA");
+  for (int k = 0; k < dss::kProcessingRealCount; ++k)
+    putF16(r, dss::kProcessingReals.element(k, 16), kAbsent);
+  putText(r, dss::kDataInputSource, "HDDT");
+  putF16(r, dss::kUnsetA, kAbsent);
+  putF16(r, dss::kUnsetB, kAbsent);
+  for (int k = 0; k < 3; ++k)
+    for (const CeosField& group : dss::kUnsetGroups)
+      putF16(r, group.element(k, dss::kUnsetGroupStride), kAbsent);
+  putText(r, dss::kPixelTimeDirection, "INCREASE");
+  putText(r, dss::kLineTimeDirection, "INCREASE");
+  putText(r, dss::kLineContent, "RANGE");
+  putText(r, dss::kClutterLock, "NOT");
+  putText(r, dss::kAutofocus, "NOT");
+  putF16(r, dss::kLineSpacing, in.lineSpacing);
+  putF16(r, dss::kPixelSpacing, in.pixelSpacing);
+  putF16(r, dss::kFirstRangeTimeMs, in.firstRangeTimeMs);
+  putF16(r, dss::kCentreRangeTimeMs, in.centreRangeTimeMs);
+  putF16(r, dss::kLastRangeTimeMs, in.lastRangeTimeMs);
+  putText(r, dss::kFirstLineTime, simDateText(in.firstLineTime));
+  putText(r, dss::kCentreLineTime, simDateText(in.centreLineTime));
+  putText(r, dss::kLastLineTime, simDateText(in.lastLineTime));
 
   // Platform position record.
-  r = file.data() + kErsPprOffset;
+  r = file.data() + ers_leader::kPlatformPosition;
   putCeosRecordHead(r, 3, kTypePpr, pprLength);
   const CivilTime c = simCivil(in.firstVectorTime);
-  putInt(r, 140, 4, "%04ld", nVec);
-  putInt(r, 144, 4, "%4ld", c.year);
-  putInt(r, 148, 4, "%04ld", c.month);
-  putInt(r, 152, 4, "%4ld", c.day);
-  putInt(r, 156, 4, "%04ld", simDayOfYear(c.year, c.month, c.day));
+  putInt(r, ppr::kVectorCount, "%04ld", nVec);
+  putInt(r, ppr::kYear, "%4ld", c.year);
+  putInt(r, ppr::kMonth, "%04ld", c.month);
+  putInt(r, ppr::kDay, "%4ld", c.day);
+  putInt(r, ppr::kDayOfYear, "%04ld", simDayOfYear(c.year, c.month, c.day));
   const double sod = std::round((in.firstVectorTime - simSec85({c.year, c.month, c.day, 0, 0, 0.0})) * 1e6) / 1e6;
-  putFormat(r, 160, 22, "%22.15E", sod);
-  putFormat(r, 182, 22, "%22.15E", in.vectorInterval);
-  putText(r, 204, 64, "Earth Centred Rotating");
-  putFormat(r, 268, 22, "%22.15E", -9999.999999999998);
-  for (int k = 0; k < 3; ++k) putF16(r, 290 + 16 * k, kAbsent);
+  putFormat(r, ppr::kSecondsOfDay, "%22.15E", sod);
+  putFormat(r, ppr::kInterval, "%22.15E", in.vectorInterval);
+  putText(r, ppr::kReferenceSystem, "Earth Centred Rotating");
+  putFormat(r, ppr::kGreenwichAngle, "%22.15E", -9999.999999999998);
+  for (int k = 0; k < 3; ++k) putF16(r, ppr::kPositionErrors.element(k, ppr::kPositionErrorStride), kAbsent);
   for (int v = 0; v < nVec; ++v) {
     const StateVector& sv = in.vectors[v];
     const double vals[6] = {sv.pos[0], sv.pos[1], sv.pos[2], sv.vel[0], sv.vel[1], sv.vel[2]};
-    for (int k = 0; k < 6; ++k) putFormat(r, 386 + 132 * v + 22 * k, 22, "%22.15E", vals[k]);
+    const CeosField vector = ppr::kVectorComponent.element(v, ppr::kVectorStride);
+    for (int k = 0; k < 6; ++k)
+      putFormat(r, vector.element(k, ppr::kComponentStride), "%22.15E", vals[k]);
   }
 
   // Facility related data records.
   for (int f = 0; f < 2; ++f) {
-    r = file.data() + kErsPprOffset + pprLength + f * facilityLength;
+    r = file.data() + ers_leader::kPlatformPosition + pprLength + f * facilityLength;
     putCeosRecordHead(r, 4 + f, kTypeFacility, facilityLength);
-    putText(r, 12, 64, "FACILITY RELATED DATA RECORD [ESA GENERAL TYPE]");
+    putText(r, ers_leader::facility::kTitle, "FACILITY RELATED DATA RECORD [ESA GENERAL TYPE]");
   }
   return file;
 }
 
 std::vector<char> buildErsImageDescriptor(const std::string& mission, const std::string& software, int records,
                                           int samples) {
+  namespace ids = ers_image::descriptor;
   std::vector<char> d(kErsImageDescriptorSize, ' ');
   char* r = d.data();
   putCeosRecordHead(r, 1, kTypeFdr, kErsImageDescriptorSize);
   fileDescriptorHead(r, software, 2, mission + ".SAR.RAWIMGY");
-  putInt(r, 180, 6, "%06ld", records);
-  putInt(r, 186, 6, "%06ld", kErsDataPrefix + 2 * samples);
-  putInt(r, 216, 4, "%4ld", 16);
-  putInt(r, 220, 4, "%4ld", 1);
-  putInt(r, 224, 4, "%4ld", 2);
-  putInt(r, 232, 4, "%4ld", 1);
-  putInt(r, 236, 8, "%08ld", records);
-  putInt(r, 244, 4, "%4ld", 0);
-  putInt(r, 248, 8, "%08ld", samples);
-  putText(r, 256, 4, "0000");
-  putInt(r, 260, 4, "%4ld", 0);
-  putInt(r, 264, 4, "%4ld", 0);
-  putText(r, 268, 4, "BSQ");
-  putInt(r, 272, 2, "%2ld", 1);
-  putInt(r, 274, 2, "%2ld", 1);
-  putText(r, 276, 4, " 400");
-  putInt(r, 280, 8, "%08ld", 2 * samples);
-  putInt(r, 288, 4, "%4ld", 0);
-  putInt(r, 292, 4, "%4ld", 1);
+  putInt(r, ids::kRecordCount, "%06ld", records);
+  putInt(r, ids::kRecordLength, "%06ld", kErsDataPrefix + 2 * samples);
+  putInt(r, ids::kBitsPerSample, "%4ld", 16);
+  putInt(r, ids::kSamplesPerGroup, "%4ld", 1);
+  putInt(r, ids::kBytesPerGroup, "%4ld", 2);
+  putInt(r, ids::kChannels, "%4ld", 1);
+  putInt(r, ids::kLines, "%08ld", records);
+  putInt(r, ids::kBorderPixels, "%4ld", 0);
+  putInt(r, ids::kSamples, "%08ld", samples);
+  putText(r, ids::kBorderRight, "0000");
+  putInt(r, ids::kTopBorder, "%4ld", 0);
+  putInt(r, ids::kBottomBorder, "%4ld", 0);
+  putText(r, ids::kInterleave, "BSQ");
+  putInt(r, ids::kRecordsPerLine, "%2ld", 1);
+  putInt(r, ids::kRecordsPerChannel, "%2ld", 1);
+  putText(r, ids::kPrefixBytes, " 400");
+  putInt(r, ids::kDataBytes, "%08ld", 2 * samples);
+  putInt(r, ids::kSuffixBytes, "%4ld", 0);
+  putInt(r, ids::kRepeatFlag, "%4ld", 1);
   const char* locators[5] = {"  13 4PB", "  49 2PB", "  45 4PB", "  21 4PB", "  29 4PB"};
-  for (int k = 0; k < 5; ++k) putText(r, 296 + 8 * k, 8, locators[k]);
-  putText(r, 400, 28, "COMPLEX UNSIGNED INTEGER");
-  putText(r, 428, 4, "CI*2");
-  putInt(r, 432, 4, "%4ld", 0);
-  putInt(r, 436, 4, "%4ld", 0);
-  putInt(r, 440, 8, "%8ld", 255);
+  for (int k = 0; k < 5; ++k) putText(r, ids::kLocators.element(k, ids::kLocatorStride), locators[k]);
+  putText(r, ids::kDataFormat, "COMPLEX UNSIGNED INTEGER");
+  putText(r, ids::kDataFormatCode, "CI*2");
+  putInt(r, ids::kLeftFill, "%4ld", 0);
+  putInt(r, ids::kRightFill, "%4ld", 0);
+  putInt(r, ids::kMaximumValue, "%8ld", 255);
   return d;
 }
 
 void buildErsDataRecord(char* rec, std::uint32_t sequence, std::uint32_t lineNumber, int samples,
                         std::uint16_t swstCode, std::uint16_t priCode, std::uint32_t formatCounter,
                         const unsigned char* iq) {
+  namespace data = ers_image::data;
   const int length = kErsDataPrefix + 2 * samples;
   std::memset(rec, 0, kErsDataPrefix);
   putCeosRecordHead(rec, sequence, kTypeData, length);
-  putBE32(rec + 12, lineNumber);
-  putBE32(rec + 16, 1);
+  putBE32(rec + data::kLineNumber.offset, lineNumber);
+  putBE32(rec + data::kImageRecord.offset, 1);
   // Instrument auxiliary data: sync bytes, format counter, window start
   // code, pulse repetition interval code, gain.
-  rec[202] = static_cast<char>(0xAA);
-  rec[208] = static_cast<char>(0xAA);
-  putBE32(rec + 210, formatCounter);
-  putBE16(rec + 214, swstCode);
-  putBE16(rec + 216, priCode);
-  rec[218] = 0x2c;
-  rec[219] = 0x1e;
+  rec[data::kSyncA.offset] = static_cast<char>(0xAA);
+  rec[data::kSyncB.offset] = static_cast<char>(0xAA);
+  putBE32(rec + data::kFormatCounter.offset, formatCounter);
+  putBE16(rec + data::kWindowStartCode.offset, swstCode);
+  putBE16(rec + data::kPriCode.offset, priCode);
+  rec[data::kGainA.offset] = 0x2c;
+  rec[data::kGainB.offset] = 0x1e;
   std::memcpy(rec + kErsDataPrefix, iq, 2 * static_cast<std::size_t>(samples));
 }
 

@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "ingest/ers/ers_ceos_layout.h"
 #include "sim/sim_geometry.h"
 
 // CEOS record head: sequence number, four type bytes, record length (all
@@ -20,6 +21,10 @@ void putText(char* rec, int offset, int width, const std::string& text);
 // results are right-aligned); a wider result throws std::length_error.
 void putFormat(char* rec, int offset, int width, const char* format, double value);
 void putInt(char* rec, int offset, int width, const char* format, long value);
+// The same on a field of a layout table.
+void putText(char* rec, CeosField field, const std::string& text);
+void putFormat(char* rec, CeosField field, const char* format, double value);
+void putInt(char* rec, CeosField field, const char* format, long value);
 void putBE32(char* p, std::uint32_t v);
 void putBE16(char* p, std::uint16_t v);
 
@@ -60,12 +65,12 @@ struct ErsLeaderInfo {
 // The whole leader file: file descriptor (720), data set summary (1886),
 // platform position (386 + 132 per vector), two facility records (12288).
 std::vector<char> buildErsLeader(const ErsLeaderInfo& info);
-inline constexpr int kErsDssOffset = 720;
-inline constexpr int kErsPprOffset = 2606;
+inline constexpr int kErsDssOffset = ers_leader::kDataSetSummary;
+inline constexpr int kErsPprOffset = ers_leader::kPlatformPosition;
 
 // Image file.
-inline constexpr int kErsImageDescriptorSize = 11644;
-inline constexpr int kErsDataPrefix = 412;
+inline constexpr int kErsImageDescriptorSize = ers_image::kDescriptorLength;
+inline constexpr int kErsDataPrefix = ers_image::kDataPrefix;
 std::vector<char> buildErsImageDescriptor(const std::string& mission, const std::string& software,
                                           int records, int samples);
 // One data record of 412 + 2 * samples bytes; iq holds I, Q bytes per sample.

@@ -4,9 +4,9 @@
 #include <complex>
 #include <cstddef>
 #include <new>
-#include <numbers>
 #include <string>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/fft.h"
 #include "diag/report.h"
@@ -32,7 +32,7 @@ int EnPhaseAzCntrlWNestimate(double& value, int nRange, int nAzimuth, int nInner
                REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  const double L = 2.0 * std::numbers::pi * step / scale;
+  const double L = 2.0 * consts::kPi * step / scale;
   if (!std::isfinite(L) || L == 0.0) {
     ORV_REPORT("Azimuth centre estimate: bad step or scale", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
@@ -74,7 +74,7 @@ int EnPhaseAzCntrlWNestimate(double& value, int nRange, int nAzimuth, int nInner
                        ? 0.0
                        : std::atan2(static_cast<double>(h1.imag()), static_cast<double>(h1.real()));
 
-  double d = std::fmod(p * L / (-2.0 * std::numbers::pi) - value, L);
+  double d = std::fmod(p * L / (-2.0 * consts::kPi) - value, L);
   if (d > L / 2) d -= L;
   if (d < -L / 2) d += L;
   value += d;

@@ -9,6 +9,7 @@
 #include <memory>
 #include <new>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/azimuth_block.h"
 #include "core/fft.h"
@@ -17,7 +18,7 @@
 
 namespace {
 
-constexpr double kC = 299792458.0;
+constexpr double kC = consts::kSpeedOfLight;
 
 struct FileCloser {
   void operator()(std::FILE* f) const {

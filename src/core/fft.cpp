@@ -1,4 +1,5 @@
 #include "core/fft.h"
+#include "base/status.h"
 
 #include <fftw3.h>
 
@@ -218,10 +219,10 @@ void scaleRect(fcomplex* out, int nx, int ux, int uy, float f) {
 int fft_makep_c(FFTPlan& plan, int nx, int ux, int ny, int uy, int rowDirection,
                 int colDirection, int inPlace) {
   plan = FFTPlan{};
-  if (nx < 1 || ny < 1) return 1;
+  if (nx < 1 || ny < 1) return STATUS_BAD_CONDITION;
   if (ux > nx) return 2;
   if (uy > ny) return 3;
-  if (ux < 1 || uy < 1 || !validDirection(rowDirection) || !validDirection(colDirection)) return 1;
+  if (ux < 1 || uy < 1 || !validDirection(rowDirection) || !validDirection(colDirection)) return STATUS_BAD_CONDITION;
   plan.nx = nx;
   plan.ux = ux;
   plan.ny = ny;
@@ -233,7 +234,7 @@ int fft_makep_c(FFTPlan& plan, int nx, int ux, int ny, int uy, int rowDirection,
     AxisKey k{Kind::C2C, ux, uy, 1, nx, 1, nx,
               plan.rowDirection > 0 ? FFTW_FORWARD : FFTW_BACKWARD, 0};
     plan.row = axisEntry(k, plan.inPlace, true);
-    if (!plan.row) return 4;
+    if (!plan.row) return STATUS_READ_FAILED;
   }
   if (colDirection != 0 && uy != 1) {
     plan.colNormalise = colDirection == -1;
@@ -242,7 +243,7 @@ int fft_makep_c(FFTPlan& plan, int nx, int ux, int ny, int uy, int rowDirection,
               plan.colDirection > 0 ? FFTW_FORWARD : FFTW_BACKWARD, 0};
     // Columns run in place on the output after a row step.
     plan.col = axisEntry(k, plan.inPlace || plan.row, true);
-    if (!plan.col) return 5;
+    if (!plan.col) return STATUS_WRITE_FAILED;
   }
   return 0;
 }
@@ -252,7 +253,7 @@ int pfft_c(const FFTPlan& plan, const fcomplex* in, fcomplex* out) {
   if (plan.row) {
     auto* e = static_cast<AxisEntry*>(plan.row);
     fftwf_plan p = variantFor(e, src, out);
-    if (!p) return 4;
+    if (!p) return STATUS_READ_FAILED;
     fftwf_execute_dft(p, reinterpret_cast<fftwf_complex*>(const_cast<fcomplex*>(src)),
                       reinterpret_cast<fftwf_complex*>(out));
     src = out;
@@ -260,7 +261,7 @@ int pfft_c(const FFTPlan& plan, const fcomplex* in, fcomplex* out) {
   if (plan.col) {
     auto* e = static_cast<AxisEntry*>(plan.col);
     fftwf_plan p = variantFor(e, src, out);
-    if (!p) return 5;
+    if (!p) return STATUS_WRITE_FAILED;
     fftwf_execute_dft(p, reinterpret_cast<fftwf_complex*>(const_cast<fcomplex*>(src)),
                       reinterpret_cast<fftwf_complex*>(out));
   }
@@ -294,10 +295,10 @@ int fft_c(int nx, int ux, int ny, int uy, int rowDirection, int colDirection, co
 int fft_makep_r(FFTPlanR& plan, int nx, int ux, int ny, int uy, int rowDirection,
                 int colDirection, int inPlace) {
   plan = FFTPlanR{};
-  if (nx < 1 || ny < 1) return 1;
+  if (nx < 1 || ny < 1) return STATUS_BAD_CONDITION;
   if (ux > nx) return 2;
   if (uy > ny) return 3;
-  if (ux < 1 || uy < 1 || !validDirection(rowDirection) || !validDirection(colDirection)) return 1;
+  if (ux < 1 || uy < 1 || !validDirection(rowDirection) || !validDirection(colDirection)) return STATUS_BAD_CONDITION;
   plan.nx = nx;
   plan.ux = ux;
   plan.ny = ny;
@@ -312,7 +313,7 @@ int fft_makep_r(FFTPlanR& plan, int nx, int ux, int ny, int uy, int rowDirection
                     ? AxisKey{Kind::R2C, ux, uy, 1, nx, 1, cx, FFTW_FORWARD, 0}
                     : AxisKey{Kind::C2R, ux, uy, 1, cx, 1, nx, FFTW_BACKWARD, 0};
     plan.row = axisEntry(k, false, true);
-    if (!plan.row) return 4;
+    if (!plan.row) return STATUS_READ_FAILED;
   }
   if (colDirection != 0 && uy != 1) {
     plan.colNormalise = colDirection == -1;
@@ -320,7 +321,7 @@ int fft_makep_r(FFTPlanR& plan, int nx, int ux, int ny, int uy, int rowDirection
     AxisKey k{Kind::C2C, uy, cu, cx, 1, cx, 1,
               plan.colDirection > 0 ? FFTW_FORWARD : FFTW_BACKWARD, 0};
     plan.col = axisEntry(k, true, true);
-    if (!plan.col) return 5;
+    if (!plan.col) return STATUS_WRITE_FAILED;
   }
   return 0;
 }
@@ -338,7 +339,7 @@ int pfft_r(const FFTPlanR& plan, const void* in, void* out) {
     auto* cout = static_cast<fcomplex*>(out);
     if (plan.row) {
       fftwf_plan p = variantFor(static_cast<AxisEntry*>(plan.row), in, out);
-      if (!p) return 4;
+      if (!p) return STATUS_READ_FAILED;
       fftwf_execute_dft_r2c(p, const_cast<float*>(static_cast<const float*>(in)),
                             reinterpret_cast<fftwf_complex*>(cout));
     } else if (in != out) {
@@ -346,7 +347,7 @@ int pfft_r(const FFTPlanR& plan, const void* in, void* out) {
     }
     if (plan.col) {
       fftwf_plan p = variantFor(static_cast<AxisEntry*>(plan.col), cout, cout);
-      if (!p) return 5;
+      if (!p) return STATUS_WRITE_FAILED;
       fftwf_execute_dft(p, reinterpret_cast<fftwf_complex*>(cout),
                         reinterpret_cast<fftwf_complex*>(cout));
     }
@@ -358,13 +359,13 @@ int pfft_r(const FFTPlanR& plan, const void* in, void* out) {
                              static_cast<const fcomplex*>(in) + complexCount);
   if (plan.col) {
     fftwf_plan p = variantFor(static_cast<AxisEntry*>(plan.col), work.data(), work.data());
-    if (!p) return 5;
+    if (!p) return STATUS_WRITE_FAILED;
     fftwf_execute_dft(p, reinterpret_cast<fftwf_complex*>(work.data()),
                       reinterpret_cast<fftwf_complex*>(work.data()));
   }
   auto* rout = static_cast<float*>(out);
   fftwf_plan p = variantFor(static_cast<AxisEntry*>(plan.row), work.data(), out);
-  if (!p) return 4;
+  if (!p) return STATUS_READ_FAILED;
   fftwf_execute_dft_c2r(p, reinterpret_cast<fftwf_complex*>(work.data()), rout);
   if (f != 1.0f) {
     for (int y = 0; y < plan.uy; ++y)
@@ -442,7 +443,7 @@ void ifftshift(fcomplex* data, int n, int rows) {
 
 int czt_makep_c(CZTPlan& plan, int M, int K) {
   plan = CZTPlan{};
-  if (M < 1 || K < 1) return 1;
+  if (M < 1 || K < 1) return STATUS_BAD_CONDITION;
   const int L = genpow(M + K - 1, 1);
   int st = fft_makep_c(plan.forward, L, L, 1, 1, FFT_FORWARD, FFT_NONE, 1);
   if (st != 0) return st;

@@ -181,13 +181,8 @@ int ATRangeFocuser::run() {
       ChirpLen = chirp.NrOfPixelsPerLine;
       if (ChirpLen < 1) return RF_FAIL("Replica raster is empty: " + ChirpFile, STATUS_BAD_PARAMETER);
       replica.assign(ChirpLen, fcomplex(0.0f, 0.0f));
-      BufferIO io;
-      io.file = &chirp;
-      io.first_column = 0;
-      io.columns = ChirpLen;
-      io.first_row = 0;
-      io.rows = 1;
-      io.memory_type = FLOAT_COMPLEX;
+      BufferIO io{.file = &chirp, .first_column = 0, .columns = ChirpLen, .first_row = 0,
+                   .rows = 1};
       const int st = io.readbuffer(replica.data());
       chirp.close();
       if (st != 0) return RF_CALLED(st);
@@ -287,13 +282,7 @@ int ATRangeFocuser::run() {
         std::fill(dst + shift[r] + V, dst + O, fcomplex(0.0f, 0.0f));
       }
     }
-    BufferIO io;
-    io.file = &out;
-    io.first_column = 0;
-    io.columns = O;
-    io.first_row = b * P;
-    io.rows = count;
-    io.memory_type = FLOAT_COMPLEX;
+    BufferIO io{.file = &out, .first_column = 0, .columns = O, .first_row = b * P, .rows = count};
     if (int st = io.writebuffer(outBlock.data()); st != 0) return RF_CALLED(st);
   }
   waitbar_close();
@@ -319,13 +308,7 @@ int ATRangeFocuser::run() {
   }
   roi.Lines = lines;
   info.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
-  gs.dataFile.filename = OutputFile;
-  gs.dataFile.NrOfPixelsPerLine = O;
-  gs.dataFile.NrOfLinesPerImage = lines;
-  gs.dataFile.RowPrefix = 0;
-  gs.dataFile.HeaderOffset = 0;
-  gs.dataFile.CellType = FLOAT_COMPLEX;
-  gs.dataFile.ByteOrder = 0;
+  setComplexRasterLayout(gs.dataFile, OutputFile, O, lines);
   if (int st = gs.GSwrite(OutputFile + ".hdr"); st != 0) return RF_CALLED(st);
   if (int st = out.write_hdr(); st != 0) return RF_CALLED(st);
   return 0;

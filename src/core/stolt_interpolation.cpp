@@ -6,7 +6,6 @@
 #include <cstddef>
 #include <memory>
 #include <new>
-#include <numbers>
 #include <string>
 #include <vector>
 
@@ -14,6 +13,7 @@
 #include <omp.h>
 #endif
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/fft.h"
 #include "diag/report.h"
@@ -21,10 +21,10 @@
 
 namespace {
 
-constexpr double kC = 299792458.0;
-constexpr double kPi = std::numbers::pi;
-constexpr double kTwoPi = 2.0 * std::numbers::pi;
-constexpr double kFourPi = 4.0 * std::numbers::pi;
+constexpr double kC = consts::kSpeedOfLight;
+constexpr double kPi = consts::kPi;
+constexpr double kTwoPi = 2.0 * consts::kPi;
+constexpr double kFourPi = 4.0 * consts::kPi;
 // Fractional positions of the least-squares filter table: (r - 50) / 100.
 constexpr int kFractions = 101;
 

@@ -8,6 +8,7 @@
 #include <new>
 #include <vector>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/azimuth_block.h"
 #include "core/fft.h"
@@ -17,12 +18,12 @@
 
 namespace {
 
-constexpr double kC = 299792458.0;
-constexpr double kHalfC = 149896229.0;
-constexpr double kQuarterC = 74948114.5;
-constexpr double kFourPi = 12.566370614359172;
-constexpr double kTwoPi = 6.283185307179586;
-constexpr double kPi = 3.14159265358979323846;
+constexpr double kC = consts::kSpeedOfLight;
+constexpr double kHalfC = consts::kSpeedOfLight / 2.0;
+constexpr double kQuarterC = consts::kSpeedOfLight / 4.0;
+constexpr double kFourPi = 4.0 * consts::kPi;
+constexpr double kTwoPi = 2.0 * consts::kPi;
+constexpr double kPi = consts::kPi;
 
 double rateAt(const AzimuthBlockPar& par, double t) {
   const double x = t - par.trg0;

@@ -5,9 +5,9 @@
 #include <cstdio>
 #include <memory>
 #include <new>
-#include <numbers>
 #include <vector>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
@@ -79,7 +79,7 @@ void finishBin(const BinSums& sums, const DcEstState& st, DcBin& bin) {
   const double a = std::abs(r) / ns;
   if (!(mean / a < st.sThr)) return;  // too little azimuth correlation (or a = 0)
   bin.valid = 1;
-  bin.dcWrapped = std::arg(r) / (2.0 * std::numbers::pi);
+  bin.dcWrapped = std::arg(r) / (2.0 * consts::kPi);
   bin.contrast = double(st.blocks) * st.blockl * q / (p * p);
   bin.power = mean;
   bin.noise = mean - (st.r0 / st.r1) * a;

@@ -6,8 +6,8 @@
 #include <cstdio>
 #include <memory>
 #include <new>
-#include <numbers>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/fft.h"
 #include "diag/report.h"
@@ -17,7 +17,7 @@
 
 namespace {
 
-constexpr double kPi = std::numbers::pi;
+constexpr double kPi = consts::kPi;
 constexpr int kHistBins = 1024;
 
 // Rounds half away from zero.

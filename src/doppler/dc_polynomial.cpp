@@ -6,9 +6,9 @@
 #include <cstring>
 #include <memory>
 #include <new>
-#include <numbers>
 #include <vector>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/fft.h"
 #include "diag/report.h"
@@ -19,7 +19,7 @@
 
 namespace {
 
-constexpr double kPi = std::numbers::pi;
+constexpr double kPi = consts::kPi;
 constexpr int kHistBins = 1024;
 // Standard deviation reported for an empty set of estimates: never good.
 constexpr double kNoStd = 1e10;

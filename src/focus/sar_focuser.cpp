@@ -5,6 +5,7 @@
 #include <new>
 #include <vector>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "core/azimuth_focus.h"
 #include "core/fft.h"
@@ -24,7 +25,7 @@
 
 namespace {
 
-constexpr double kPi = 3.14159265358979323846;
+constexpr double kPi = consts::kPi;
 constexpr double kEqSpeedPlaceholder = 6900.0;
 
 int calledError(int status) {
@@ -83,6 +84,86 @@ bool hasKey(const std::string& file, const std::string& section, const std::stri
   return GetSetProfileChar(0, section, key, "", file) != nullptr;
 }
 
+// The Doppler estimator's values of the chain: profile key in "DCestConf",
+// place in the chain's block, in the processing configuration document and
+// in the estimator's state. Reading, copying and handing over all walk this
+// one list.
+template <class Visit>
+void forEachDcEstValue(Visit&& v) {
+  v("RgBand", &SARFocuser_conf::RgBand, &DCestConf::RgBand, &DcEstState::rgBand);
+  v("Blocks", &SARFocuser_conf::Blocks, &DCestConf::Blocks, &DcEstState::blocks);
+  v("Blockl", &SARFocuser_conf::Blockl, &DCestConf::Blockl, &DcEstState::blockl);
+  v("AnLen", &SARFocuser_conf::AnLen, &DCestConf::AnLen, &DcEstState::anLen);
+  v("Kthr", &SARFocuser_conf::Kthr, &DCestConf::Kthr, &DcEstState::kThr);
+  v("Sthr", &SARFocuser_conf::Sthr, &DCestConf::Sthr, &DcEstState::sThr);
+  v("Varthr", &SARFocuser_conf::Varthr, &DCestConf::Varth, &DcEstState::varTh);
+  v("Lookbf", &SARFocuser_conf::Lookbf, &DCestConf::Lookbf, &DcEstState::lookBf);
+  v("Lookbt", &SARFocuser_conf::Lookbt, &DCestConf::Lookbt, &DcEstState::lookBt);
+  v("Lookrp", &SARFocuser_conf::Lookrp, &DCestConf::Lookrp, &DcEstState::lookRp);
+  v("Lookrs", &SARFocuser_conf::Lookrs, &DCestConf::Lookrs, &DcEstState::lookRs);
+  v("Decfac", &SARFocuser_conf::Decfac, &DCestConf::Decfac, &DcEstState::decFac);
+  v("Flength", &SARFocuser_conf::Flength, &DCestConf::Flength, &DcEstState::fLength);
+  v("Dftstep", &SARFocuser_conf::Dftstep, &DCestConf::Dftstep, &DcEstState::dftStep);
+  v("Fftrgprc", &SARFocuser_conf::Fftrgprc, &DCestConf::Fftrgprc, &DcEstState::fftRgPrc);
+  v("Fftazprc", &SARFocuser_conf::Fftazprc, &DCestConf::Fftazprc, &DcEstState::fftAzPrc);
+  v("Peakwid", &SARFocuser_conf::Peakwid, &DCestConf::Peakwid, &DcEstState::peakWid);
+  v("Minamb", &SARFocuser_conf::Minamb, &DCestConf::Minamb, &DcEstState::minAmb);
+  v("Maxamb", &SARFocuser_conf::Maxamb, &DCestConf::Maxamb, &DcEstState::maxAmb);
+  v("Nbestblocks", &SARFocuser_conf::Nbestblocks, &DCestConf::Nbestblocks, &DcEstState::nBest);
+  v("Nummlbf", &SARFocuser_conf::Nummlbf, &DCestConf::Nummlbf, &DcEstState::nMlbf);
+  v("Nwdarblocks", &SARFocuser_conf::Nwdarblocks, &DCestConf::Nwdarbloks, &DcEstState::nWdar);
+  v("Patchs", &SARFocuser_conf::Patchs, &DCestConf::Patchs, &DcEstState::patchs);
+  v("Patchl", &SARFocuser_conf::Patchl, &DCestConf::Patchl, &DcEstState::patchl);
+  v("Dswst", &SARFocuser_conf::Dswst, &DCestConf::Dswst, &DcEstState::dswst);
+  v("Amb_flag", &SARFocuser_conf::Amb_flag, &DCestConf::Amb_flag, &DcEstState::ambFlag);
+}
+
+// The azimuth focuser's values of the chain: profile key in "AzimuthConf",
+// place in the chain's block, in the processing configuration document and
+// in the kernel's configuration. The overlaps, halved at reading, and the
+// bandwidths, fractions of the sampling rates, are handled beside the list.
+template <class Visit>
+void forEachAzimuthValue(Visit&& v) {
+  v("AntennaLength", &SARFocuser_conf::AntennaLength, &AzimuthConf::AntennaLength,
+    &AzimuthFocusConf::AntennaLength);
+  v("WhiteningFlag", &SARFocuser_conf::WhiteningFlag, &AzimuthConf::WhiteningFlag,
+    &AzimuthFocusConf::WhiteningFlag);
+  v("RangeWindowHammingParameter", &SARFocuser_conf::RangeWindowHammingParameter,
+    &AzimuthConf::RangeWindowHammingParameter, &AzimuthFocusConf::RangeWindowHammingParameter);
+  v("AzimuthWindowHammingParameter", &SARFocuser_conf::AzimuthWindowHammingParameter,
+    &AzimuthConf::AzimuthWindowHammingParameter,
+    &AzimuthFocusConf::AzimuthWindowHammingParameter);
+  v("RangeLookBandwidth", &SARFocuser_conf::RangeLookBandwidth, &AzimuthConf::RangeLookBandwidth,
+    &AzimuthFocusConf::RangeLookBandwidth);
+  v("AzimuthLookBandwidth", &SARFocuser_conf::AzimuthLookBandwidth,
+    &AzimuthConf::AzimuthLookBandwidth, &AzimuthFocusConf::AzimuthLookBandwidth);
+  v("RangeTransitionBandwidth", &SARFocuser_conf::RangeTransitionBandwidth,
+    &AzimuthConf::RangeTransitionBandwidth, &AzimuthFocusConf::RangeTransitionBandwidth);
+  v("AzimuthTransitionBandwidth", &SARFocuser_conf::AzimuthTransitionBandwidth,
+    &AzimuthConf::AzimuthTransitionBandwidth, &AzimuthFocusConf::AzimuthTransitionBandwidth);
+  v("LinesInBlock", &SARFocuser_conf::LinesInBlock, &AzimuthConf::LinesInBlock,
+    &AzimuthFocusConf::LinesInBlock);
+  v("SamplesInBlock", &SARFocuser_conf::SamplesInBlock, &AzimuthConf::SamplesInBlock,
+    &AzimuthFocusConf::SamplesInBlock);
+  v("PerformInterpolation", &SARFocuser_conf::PerformInterpolation,
+    &AzimuthConf::PerformInterpolation, &AzimuthFocusConf::PerformInterpolation);
+  v("StoltPadding", &SARFocuser_conf::StoltPadding, &AzimuthConf::StoltPadding,
+    &AzimuthFocusConf::StoltPadding);
+  v("ApplyAzShift", &SARFocuser_conf::ApplyAzShift, &AzimuthConf::ApplyAzShift,
+    &AzimuthFocusConf::ApplyAzShift);
+  v("ApplyRgShift", &SARFocuser_conf::ApplyRgShift, &AzimuthConf::ApplyRgShift,
+    &AzimuthFocusConf::ApplyRgShift);
+}
+
+void readValue(const std::string& file, const std::string& section, const std::string& key,
+               int& value) {
+  readInt(file, section, key, value);
+}
+void readValue(const std::string& file, const std::string& section, const std::string& key,
+               double& value) {
+  readDouble(file, section, key, value);
+}
+
 }  // namespace
 
 // ---- kernels --------------------------------------------------------------------
@@ -108,58 +189,54 @@ int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   return azimuthfoc(files, scene, conf);
 }
 
+DcEstInput dcEstInput(const std::string& raster, const std::string& outDir, int samples, int lines,
+                      double prf, double timeOrigin) {
+  DcEstInput in;
+  in.rasterFile = raster;
+  in.outDir = outDir;
+  in.samples = samples;
+  in.lines = lines;
+  in.prf = prf;
+  in.velocity = kEqSpeedPlaceholder;
+  in.timeOrigin = timeOrigin;
+  return in;
+}
+
+AzimuthFocusFiles azimuthFocusFiles(const std::string& input, const std::string& output,
+                                    const SamplingConstants_Obj& smp, double fastStart,
+                                    double slowStart) {
+  AzimuthFocusFiles files;
+  files.input = input;
+  files.output = output;
+  files.frg_hz = smp.frg_hz;
+  files.fc_hz = smp.fc_hz;
+  files.prf_hz = smp.prf_hz;
+  files.FastStartTime = fastStart;
+  files.bandwidth_hz = smp.Brg_hz;
+  files.SlowStartTime = slowStart;
+  return files;
+}
+
 void fillDcEstState(const SARFocuser_conf& conf, double fc, double fs, DcEstState& state) {
-  state.blocks = conf.Blocks;
-  state.blockl = conf.Blockl;
+  forEachDcEstValue([&](const char*, auto chain, auto, auto estimator) {
+    state.*estimator = conf.*chain;
+  });
   state.memory = static_cast<int64_t>(conf.Memory) << 20;
-  state.nBest = conf.Nbestblocks;
-  state.nWdar = conf.Nwdarblocks;
-  state.nMlbf = conf.Nummlbf;
-  state.anLen = conf.AnLen;
-  state.rgBand = conf.RgBand;
   state.fc = fc;
   state.fs = fs;
-  state.maxAmb = conf.Maxamb;
-  state.minAmb = conf.Minamb;
-  state.kThr = conf.Kthr;
-  state.sThr = conf.Sthr;
-  state.varTh = conf.Varthr;
-  state.lookBf = conf.Lookbf;
-  state.lookBt = conf.Lookbt;
-  state.lookRp = conf.Lookrp;
-  state.lookRs = conf.Lookrs;
-  state.fLength = conf.Flength;
-  state.decFac = conf.Decfac;
-  state.dftStep = conf.Dftstep;
-  state.peakWid = conf.Peakwid;
-  state.ambFlag = conf.Amb_flag;
   for (int i = 0; i < 7; ++i) state.polMask[i] = conf.Pol_Weights[i];
-  state.patchs = conf.Patchs;
-  state.patchl = conf.Patchl;
-  state.fftRgPrc = conf.Fftrgprc;
-  state.fftAzPrc = conf.Fftazprc;
-  state.dswst = conf.Dswst;
   state.verbose = conf.Verbose;
 }
 
 AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, double prf) {
   AzimuthFocusConf ac;
-  ac.PerformInterpolation = conf.PerformInterpolation;
-  ac.StoltPadding = conf.StoltPadding;
-  ac.AntennaLength = conf.AntennaLength;
-  ac.WhiteningFlag = conf.WhiteningFlag;
-  ac.RangeWindowHammingParameter = conf.RangeWindowHammingParameter;
-  ac.AzimuthWindowHammingParameter = conf.AzimuthWindowHammingParameter;
+  forEachAzimuthValue([&](const char*, auto chain, auto, auto kernel) { ac.*kernel = conf.*chain; });
   ac.RangeLookBandwidth = conf.RangeLookBandwidth * frg;
   ac.AzimuthLookBandwidth = conf.AzimuthLookBandwidth * prf;
   ac.RangeTransitionBandwidth = conf.RangeTransitionBandwidth * frg;
   ac.AzimuthTransitionBandwidth = conf.AzimuthTransitionBandwidth * prf;
-  ac.SamplesInBlock = conf.SamplesInBlock;
-  ac.LinesInBlock = conf.LinesInBlock;
   ac.RangeOverlap = conf.RangeOverlap;
   ac.AzimuthOverlap = conf.AzimuthOverlap;
-  ac.ApplyAzShift = conf.ApplyAzShift;
-  ac.ApplyRgShift = conf.ApplyRgShift;
   return ac;
 }
 
@@ -174,51 +251,13 @@ SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& c) {
   conf.ReportFilename = common.ReportFilename;
 
   const DCestConf& d = c.dcestConf;
-  conf.RgBand = d.RgBand;
-  conf.Blocks = d.Blocks;
-  conf.Blockl = d.Blockl;
-  conf.AnLen = d.AnLen;
-  conf.Kthr = d.Kthr;
-  conf.Sthr = d.Sthr;
-  conf.Varthr = d.Varth;
-  conf.Lookbf = d.Lookbf;
-  conf.Lookbt = d.Lookbt;
-  conf.Lookrp = d.Lookrp;
-  conf.Lookrs = d.Lookrs;
-  conf.Decfac = d.Decfac;
-  conf.Flength = d.Flength;
-  conf.Dftstep = d.Dftstep;
-  conf.Fftrgprc = d.Fftrgprc;
-  conf.Fftazprc = d.Fftazprc;
-  conf.Peakwid = d.Peakwid;
-  conf.Minamb = d.Minamb;
-  conf.Maxamb = d.Maxamb;
-  conf.Nbestblocks = d.Nbestblocks;
-  conf.Nummlbf = d.Nummlbf;
-  conf.Nwdarblocks = d.Nwdarbloks;
-  conf.Patchs = d.Patchs;
-  conf.Patchl = d.Patchl;
-  conf.Dswst = d.Dswst;
-  conf.Amb_flag = d.Amb_flag;
+  forEachDcEstValue([&](const char*, auto chain, auto document, auto) { conf.*chain = d.*document; });
   for (int i = 0; i < 7; ++i) conf.Pol_Weights[i] = d.Pol_weights[i];
 
   const AzimuthConf& a = c.azimuthConf;
-  conf.AntennaLength = a.AntennaLength;
-  conf.WhiteningFlag = a.WhiteningFlag;
-  conf.RangeWindowHammingParameter = a.RangeWindowHammingParameter;
-  conf.AzimuthWindowHammingParameter = a.AzimuthWindowHammingParameter;
-  conf.RangeLookBandwidth = a.RangeLookBandwidth;
-  conf.AzimuthLookBandwidth = a.AzimuthLookBandwidth;
-  conf.RangeTransitionBandwidth = a.RangeTransitionBandwidth;
-  conf.AzimuthTransitionBandwidth = a.AzimuthTransitionBandwidth;
-  conf.LinesInBlock = a.LinesInBlock;
-  conf.SamplesInBlock = a.SamplesInBlock;
+  forEachAzimuthValue([&](const char*, auto chain, auto document, auto) { conf.*chain = a.*document; });
   conf.RangeOverlap = a.RangeOverlap / 2;
   conf.AzimuthOverlap = a.AzimuthOverlap / 2;
-  conf.PerformInterpolation = a.PerformInterpolation;
-  conf.StoltPadding = a.StoltPadding;
-  conf.ApplyAzShift = a.ApplyAzShift;
-  conf.ApplyRgShift = a.ApplyRgShift;
 
   const generalProcessingConf& g = c.generalConf;
   conf.Flag_rangefoc = g.Flag_rangefoc;
@@ -244,14 +283,7 @@ void setHammingWindows(SpectralWindows_Obj& w, const SARFocuser_conf& conf) {
 void setFocusedProduct(GeneralSAR& product, const std::string& raster,
                        const AzimuthFocusScene& scene, const ROI_Obj& deltas,
                        const SARFocuser_conf& conf, double lambda) {
-  DataFile& df = product.dataFile;
-  df.filename = raster;
-  df.NrOfPixelsPerLine = scene.outSamples;
-  df.NrOfLinesPerImage = scene.outLines;
-  df.RowPrefix = 0;
-  df.HeaderOffset = 0;
-  df.CellType = FLOAT_COMPLEX;
-  df.ByteOrder = 0;
+  setComplexRasterLayout(product.dataFile, raster, scene.outSamples, scene.outLines);
   ROI_Obj& roi = product.roi.roi;
   roi.SetFastAxe(scene.firstSampleTime, deltas.FastTimeDelta, scene.outSamples);
   roi.SetSlowAxe(scene.firstLineTime, deltas.SlowTimeDelta, scene.outLines);
@@ -299,32 +331,7 @@ int SARFocuser_conf::readconf(const std::string& file) {
     return STATUS_NOT_OPENED;
   }
   const std::string d = "DCestConf";
-  readDouble(file, d, "RgBand", RgBand);
-  readInt(file, d, "Blocks", Blocks);
-  readInt(file, d, "Blockl", Blockl);
-  readDouble(file, d, "AnLen", AnLen);
-  readDouble(file, d, "Kthr", Kthr);
-  readDouble(file, d, "Sthr", Sthr);
-  readDouble(file, d, "Varthr", Varthr);
-  readDouble(file, d, "Lookbf", Lookbf);
-  readDouble(file, d, "Lookbt", Lookbt);
-  readDouble(file, d, "Lookrp", Lookrp);
-  readDouble(file, d, "Lookrs", Lookrs);
-  readInt(file, d, "Decfac", Decfac);
-  readInt(file, d, "Flength", Flength);
-  readDouble(file, d, "Dftstep", Dftstep);
-  readDouble(file, d, "Fftrgprc", Fftrgprc);
-  readDouble(file, d, "Fftazprc", Fftazprc);
-  readDouble(file, d, "Peakwid", Peakwid);
-  readDouble(file, d, "Minamb", Minamb);
-  readDouble(file, d, "Maxamb", Maxamb);
-  readInt(file, d, "Nbestblocks", Nbestblocks);
-  readInt(file, d, "Nummlbf", Nummlbf);
-  readInt(file, d, "Nwdarblocks", Nwdarblocks);
-  readInt(file, d, "Patchs", Patchs);
-  readInt(file, d, "Patchl", Patchl);
-  readInt(file, d, "Dswst", Dswst);
-  readInt(file, d, "Amb_flag", Amb_flag);
+  forEachDcEstValue([&](const char* key, auto chain, auto, auto) { readValue(file, d, key, this->*chain); });
   {
     int w[7] = {1, 1, 1, 1, 1, 1, 1};
     if (hasKey(file, d, "Pol_Weights") && GetMyProfileIntArray(d, "Pol_Weights", w, 7, file) != 0)
@@ -333,16 +340,7 @@ int SARFocuser_conf::readconf(const std::string& file) {
   }
 
   const std::string a = "AzimuthConf";
-  readDouble(file, a, "AntennaLength", AntennaLength);
-  readInt(file, a, "WhiteningFlag", WhiteningFlag);
-  readDouble(file, a, "RangeWindowHammingParameter", RangeWindowHammingParameter);
-  readDouble(file, a, "AzimuthWindowHammingParameter", AzimuthWindowHammingParameter);
-  readDouble(file, a, "RangeLookBandwidth", RangeLookBandwidth);
-  readDouble(file, a, "AzimuthLookBandwidth", AzimuthLookBandwidth);
-  readDouble(file, a, "RangeTransitionBandwidth", RangeTransitionBandwidth);
-  readDouble(file, a, "AzimuthTransitionBandwidth", AzimuthTransitionBandwidth);
-  readInt(file, a, "LinesInBlock", LinesInBlock);
-  readInt(file, a, "SamplesInBlock", SamplesInBlock);
+  forEachAzimuthValue([&](const char* key, auto chain, auto, auto) { readValue(file, a, key, this->*chain); });
   if (hasKey(file, a, "RangeOverlap")) {
     int v = 0;
     readInt(file, a, "RangeOverlap", v);
@@ -353,10 +351,6 @@ int SARFocuser_conf::readconf(const std::string& file) {
     readInt(file, a, "AzimuthOverlap", v);
     AzimuthOverlap = v / 2;
   }
-  readInt(file, a, "PerformInterpolation", PerformInterpolation);
-  readDouble(file, a, "StoltPadding", StoltPadding);
-  readDouble(file, a, "ApplyAzShift", ApplyAzShift);
-  readDouble(file, a, "ApplyRgShift", ApplyRgShift);
 
   const std::string g = "GeneralProcessingConf";
   Flag_rangefoc = 1;
@@ -539,13 +533,8 @@ int SARFocuser::process() {
     return STATUS_NO_MEMORY;
   }
   if (!chirp.empty()) {
-    BufferIO io;
-    io.file = &chirpFile;
-    io.first_column = 0;
-    io.columns = static_cast<int>(chirp.size());
-    io.first_row = 0;
-    io.rows = 1;
-    io.memory_type = FLOAT_COMPLEX;
+    BufferIO io{.file = &chirpFile, .first_column = 0, .columns = static_cast<int>(chirp.size()),
+                 .first_row = 0, .rows = 1};
     const int st = io.readbuffer(chirp.data());
     chirpFile.close();
     if (st != 0) return calledError(st);
@@ -604,14 +593,7 @@ int SARFocuser::process() {
   frPoly.trg0 = ctx.swstMin;
   frPoly.taz0 = ctx.azimuthStart;
   if (conf.Flag_dcest) {
-    DcEstInput in;
-    in.rasterFile = ctx.rgfocFile;
-    in.outDir = ".";
-    in.samples = rgSamples;
-    in.lines = rgLines;
-    in.prf = ctx.prf_hz;
-    in.velocity = kEqSpeedPlaceholder;
-    in.timeOrigin = ctx.azimuthStart;
+    DcEstInput in = dcEstInput(ctx.rgfocFile, ".", rgSamples, rgLines, ctx.prf_hz, ctx.azimuthStart);
     DcEstState state;
     fillDcEstState(conf, ctx.fc_hz, ctx.frg_hz, state);
     if (conf.Incore) {
@@ -656,13 +638,7 @@ int SARFocuser::process() {
     rg.dataSetInfo.Polarization = rawRecord.dataSetInfo.Polarization;
     rg.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
     rg.rasterName = ctx.rgfocFile;
-    rg.dataFile.filename = ctx.rgfocFile;
-    rg.dataFile.RowPrefix = 0;
-    rg.dataFile.HeaderOffset = 0;
-    rg.dataFile.CellType = FLOAT_COMPLEX;
-    rg.dataFile.ByteOrder = 0;
-    rg.dataFile.NrOfPixelsPerLine = rgSamples;
-    rg.dataFile.NrOfLinesPerImage = rgLines;
+    setComplexRasterLayout(rg.dataFile, ctx.rgfocFile, rgSamples, rgLines);
     rg.roi.SetFastAxe(ctx.swstMin, rawRoi.FastTimeDelta, rgSamples);
     rg.roi.SetSlowAxe(ctx.azimuthStart, rawRoi.SlowTimeDelta, rgLines);
     rg.polynomials.CreatePolys(1, 1);
@@ -685,15 +661,8 @@ int SARFocuser::process() {
   AzimuthFocusScene scene;
   if (conf.Flag_azimuthfoc) {
     if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
-    AzimuthFocusFiles files;
-    files.input = ctx.rgfocFile;
-    files.output = ctx.outputFile;
-    files.frg_hz = ctx.frg_hz;
-    files.fc_hz = ctx.fc_hz;
-    files.prf_hz = ctx.prf_hz;
-    files.FastStartTime = ctx.swstMin;
-    files.bandwidth_hz = ctx.brg_hz;
-    files.SlowStartTime = ctx.azimuthStart;
+    const AzimuthFocusFiles files =
+        azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
     scene.verbose = conf.Verbose;
     scene.samples = rgSamples;
     scene.lines = rgLines;
@@ -846,13 +815,8 @@ int SARFocuser::descallop() {
   for (int b = 0; b < B && status == 0; ++b) {
     waitbar_update(0, static_cast<float>(b) / B * 100.0f);
     std::fill(block.begin(), block.end(), fcomplex(0.0f, 0.0f));
-    BufferIO rio;
-    rio.file = &in;
-    rio.first_column = 0;
-    rio.columns = Nc;
-    rio.first_row = b * kStep;
-    rio.rows = kBlock;
-    rio.memory_type = FLOAT_COMPLEX;
+    BufferIO rio{.file = &in, .first_column = 0, .columns = Nc, .first_row = b * kStep,
+                 .rows = kBlock};
     if ((status = rio.readbuffer(block.data())) != 0) break;
     pfft_c(fwd, block.data(), block.data());
     const double tb = (b + 0.5) * kStep * dt + roi.SlowStartTime;

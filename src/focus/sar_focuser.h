@@ -13,6 +13,7 @@
 class GeneralSAR;
 class GeneralSAR_configuration;
 class ROI_Obj;
+class SamplingConstants_Obj;
 class SpectralWindows_Obj;
 class poly;
 
@@ -174,6 +175,14 @@ int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
                  const AzimuthFocusConf& conf);
 
 // Set-up shared by the chain and the modular steps.
+// Input of the centroid estimation of a range-focused raster.
+DcEstInput dcEstInput(const std::string& raster, const std::string& outDir, int samples, int lines,
+                      double prf, double timeOrigin);
+// Names and sampling of the azimuth focusing of a range-focused raster whose
+// first sample and line are at fastStart and slowStart.
+AzimuthFocusFiles azimuthFocusFiles(const std::string& input, const std::string& output,
+                                    const SamplingConstants_Obj& smp, double fastStart,
+                                    double slowStart);
 // Estimator values of the block, with carrier fc and range rate fs.
 void fillDcEstState(const SARFocuser_conf& conf, double fc, double fs, DcEstState& state);
 // Azimuth focusing values of the block; bandwidth fractions become hertz.

@@ -19,8 +19,6 @@
 
 namespace {
 
-constexpr double kEqSpeedPlaceholder = 6900.0;
-
 int calledError(int status) {
   ORV_REPORT_CALLED_ERROR();
   return status;
@@ -40,7 +38,7 @@ int checkFocusInputs(GeneralSAR& record, bool needRate) {
     missing = "DataSetInfo does not exist!";
   if (!missing) return 0;
   ORV_REPORT(missing, REPORT_ERROR);
-  return 1;
+  return STATUS_BAD_CONDITION;
 }
 
 void removeReported(const std::string& name) {
@@ -75,37 +73,37 @@ stripmapGeneralFocuser::~stripmapGeneralFocuser() = default;
 int stripmapGeneralFocuser::checkNamesAndFiles() {
   if (level0Filename.empty()) {
     ORV_REPORT("Data filename not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (orbitFilename.empty()) {
     ORV_REPORT("Orbit filename not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (configurationFilename.empty()) {
     ORV_REPORT("Processing conf not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   outputSelected_ = !outputFilename.empty();
   if (!fileOpens(orbitFilename)) {
     ORV_REPORT("orbit file does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   // An ERS scene may be a directory.
   if (!fileOpens(level0Filename) && !directoryOpens(level0Filename)) {
     ORV_REPORT("data file does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (!fileOpens(configurationFilename)) {
     ORV_REPORT("processing configuration file does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (skipLines < 0) {
     ORV_REPORT("skip lines <0!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (extractLines < 0) {
     ORV_REPORT("extract lines <0!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   return 0;
 }
@@ -144,7 +142,7 @@ int stripmapGeneralFocuser::run(const std::string& raw, const std::string& chirp
 }
 
 int stripmapGeneralFocuser::sarfocuser() {
-  if (!conf_->Flag_set) return 1;
+  if (!conf_->Flag_set) return STATUS_BAD_CONDITION;
   conf_->Verbose = 1;
   int status = sarFocuser_->run();
   if (status != 0) {
@@ -157,7 +155,7 @@ int stripmapGeneralFocuser::sarfocuser() {
 
 int stripmapGeneralFocuser::sarfocuser(const std::string& raw, const std::string& chirp,
                                        const std::string& antenna, const std::string& output) {
-  if (outputSelected_) return 1;
+  if (outputSelected_) return STATUS_BAD_CONDITION;
   sarFocuser_->RawDataFile = raw;
   sarFocuser_->ChirpFile = chirp;
   if (!antenna.empty()) sarFocuser_->AntennaFile = antenna;
@@ -181,7 +179,7 @@ int stripmapGeneralFocuserModular::initialize_modular() {
   if (status != 0) return status;
   if (outputFilename.empty() && outputSelected_) {
     ORV_REPORT("Output filename not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   conf_->Flag_set = 0;
   return 0;
@@ -223,7 +221,7 @@ int stripmapGeneralFocuserModular::rangefoc(const std::string& raw, const std::s
   record.GSread(raw + ".hdr");
   if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
     ORV_REPORT("Raw data image does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   ATRangeFocuser rf;
   rf.RawData = raw;
@@ -248,21 +246,16 @@ int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
   if (int st = record.GSread(file + ".hdr"); st != 0) return calledError(st);
   if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
     ORV_REPORT("Range focused image does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   record.polynomials.CreatePolys(1, 1);
   SARFocuser_conf conf = chainConfFrom(configuration);
   conf.Memory = Memory;
-  DcEstInput in;
-  in.rasterFile = file;
-  in.outDir = dir;
-  in.samples = record.dataFile.NrOfPixelsPerLine;
-  in.lines = record.dataFile.NrOfLinesPerImage;
-  in.prf = record.sampling.prf_hz;
-  in.velocity = kEqSpeedPlaceholder;
+  DcEstInput in = dcEstInput(file, dir, record.dataFile.NrOfPixelsPerLine,
+                             record.dataFile.NrOfLinesPerImage, record.sampling.prf_hz,
+                             record.roi.roi.SlowStartTime);
   in.byteOrder = record.dataFile.ByteOrder;
   in.headerOffset = record.dataFile.HeaderOffset;
-  in.timeOrigin = record.roi.roi.SlowStartTime;
   DcEstState state;
   fillDcEstState(conf, record.sampling.fc_hz, record.sampling.frg_hz, state);
   double c[7] = {0, 0, 0, 0, 0, 0, 0};
@@ -309,15 +302,8 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
   const int lines = record.dataFile.NrOfLinesPerImage;
   const int samples = record.dataFile.NrOfPixelsPerLine;
 
-  AzimuthFocusFiles files;
-  files.input = input;
-  files.output = output;
-  files.frg_hz = smp.frg_hz;
-  files.fc_hz = smp.fc_hz;
-  files.prf_hz = smp.prf_hz;
-  files.FastStartTime = roi.FastStartTime;
-  files.bandwidth_hz = smp.Brg_hz;
-  files.SlowStartTime = roi.SlowStartTime;
+  const AzimuthFocusFiles files =
+      azimuthFocusFiles(input, output, smp, roi.FastStartTime, roi.SlowStartTime);
   AzimuthFocusScene scene;
   scene.samples = samples;
   scene.lines = lines;
@@ -354,19 +340,19 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
 }
 
 int stripmapGeneralFocuserModular::rangefoc() {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return rangefoc(work.rawFile, work.chirpFile, work.rgfocFile);
 }
 int stripmapGeneralFocuserModular::dcEst() {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return dcEst(work.rgfocFile);
 }
 int stripmapGeneralFocuserModular::frEst() {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return frEst(work.rgfocFile);
 }
 int stripmapGeneralFocuserModular::azfoc(double azimuthShift) {
-  if (!outputSelected_) return 1;
+  if (!outputSelected_) return STATUS_BAD_CONDITION;
   return azfoc(work.rgfocFile, work.outputFile, azimuthShift);
 }
 
@@ -378,7 +364,7 @@ int stripmapGeneralFocuserModular::align_rawdata(const std::string& file) {
   if (!record.GSexists(GeneralSAR::GS_DATAFILE) || !record.GSexists(GeneralSAR::GS_DATASETINFO) ||
       !record.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA)) {
     ORV_REPORT("Input File is not a not aligned raw data file", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   DataFile in(record.dataFile);
   in.filename = file;
@@ -396,13 +382,8 @@ int stripmapGeneralFocuserModular::align_rawdata(const std::string& file) {
   std::vector<float> swst(lines);
   {
     std::vector<char> prefixes(static_cast<std::size_t>(in.RowPrefix) * lines);
-    BufferIO io;
-    io.file = &in;
-    io.first_column = 0;
-    io.columns = S;
-    io.first_row = 0;
-    io.rows = lines;
-    io.memory_type = in.CellType;
+    BufferIO io{.file = &in, .first_column = 0, .columns = S, .first_row = 0, .rows = lines,
+                 .memory_type = in.CellType};
     if (int st = io.readprefix(prefixes.data()); st != 0) return calledError(st);
     in.close();
     for (int l = 0; l < lines; ++l)
@@ -444,13 +425,7 @@ int stripmapGeneralFocuserModular::align_rawdata(const std::string& file) {
   std::vector<fcomplex> row(S), line(static_cast<std::size_t>(S) + D);
   if (int st = out.open(1); st != 0) return calledError(st);
   for (int l = 0; l < lines; ++l) {
-    BufferIO io;
-    io.file = &in;
-    io.first_column = 0;
-    io.columns = S;
-    io.first_row = l;
-    io.rows = 1;
-    io.memory_type = FLOAT_COMPLEX;
+    BufferIO io{.file = &in, .first_column = 0, .columns = S, .first_row = l, .rows = 1};
     if (int st = io.readbuffer(row.data()); st != 0) return calledError(st);
     std::fill(line.begin(), line.end(), fcomplex(0.0f, 0.0f));
     std::copy(row.begin(), row.end(), line.begin() + shift[l]);
@@ -509,7 +484,7 @@ int stripmapGeneralFocuserModular::getFOCroi(const ROI_Obj& raw, const ROI_Obj& 
       endSample > raw.Samples) {
     ORV_REPORT("Requested focused block cannot be obtained from the given extracted data",
                REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   result = raw;
   result.SetFastAxe(raw.FastStartTime + firstSample * raw.FastTimeDelta, raw.FastTimeDelta,
@@ -534,7 +509,7 @@ int stripmapGeneralFocuserModular::getRAWroi(const ROI_Obj& raw, const ROI_Obj& 
     ORV_REPORT("Requested raw block lies outside the raw data", REPORT_ERROR);
     *lines = std::max(*lines, 0);
     *samples = std::max(*samples, 0);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   return 0;
 }
@@ -546,7 +521,7 @@ int stripmapGeneralFocuserModular::cutRAW(const std::string& input, const std::s
   if (!record.GSexists(GeneralSAR::GS_DATAFILE) || !record.GSexists(GeneralSAR::GS_DATASETINFO) ||
       !record.dataSetInfo.IsImageType(DataSetInfo_Obj::IT_RAW_DATA_ALIGNED)) {
     ORV_REPORT("Raw Data must be range aligned!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   ROI_Obj& roi = record.roi.roi;
   int l0 = 0, nl = 0, s0 = 0, ns = 0;
@@ -570,22 +545,10 @@ int stripmapGeneralFocuserModular::cutRAW(const std::string& input, const std::s
     ORV_REPORT("Memory allocation failed", REPORT_ERROR);
     return STATUS_NO_MEMORY;
   }
-  BufferIO io;
-  io.file = &in;
-  io.first_column = s0;
-  io.columns = ns;
-  io.first_row = l0;
-  io.rows = nl;
-  io.memory_type = FLOAT_COMPLEX;
+  BufferIO io{.file = &in, .first_column = s0, .columns = ns, .first_row = l0, .rows = nl};
   if (int st = io.readbuffer(block.data()); st != 0) return calledError(st);
   in.close();
-  BufferIO wo;
-  wo.file = &out;
-  wo.first_column = 0;
-  wo.columns = ns;
-  wo.first_row = 0;
-  wo.rows = nl;
-  wo.memory_type = FLOAT_COMPLEX;
+  BufferIO wo{.file = &out, .first_column = 0, .columns = ns, .first_row = 0, .rows = nl};
   if (int st = wo.writebuffer(block.data()); st != 0) return calledError(st);
   if (int st = out.close(); st != 0) return calledError(st);
 
@@ -593,13 +556,7 @@ int stripmapGeneralFocuserModular::cutRAW(const std::string& input, const std::s
   roi.SetFastAxe(fast0, roi.FastTimeDelta, ns);
   roi.SetSlowAxe(roi.SlowStartTime + l0 * roi.SlowTimeDelta, roi.SlowTimeDelta, nl);
   record.dataSetInfo.SWST_MIN = record.dataSetInfo.SWST_MAX = fast0;
-  record.dataFile.filename = output;
-  record.dataFile.NrOfPixelsPerLine = ns;
-  record.dataFile.NrOfLinesPerImage = nl;
-  record.dataFile.RowPrefix = 0;
-  record.dataFile.HeaderOffset = 0;
-  record.dataFile.CellType = FLOAT_COMPLEX;
-  record.dataFile.ByteOrder = 0;
+  setComplexRasterLayout(record.dataFile, output, ns, nl);
   if (int st = record.GSwrite(output + ".hdr"); st != 0) return calledError(st);
   record.GSdestroy();
   return 0;

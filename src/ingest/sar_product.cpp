@@ -12,30 +12,13 @@
 #include "base/status.h"
 #include "diag/ckerr.h"
 #include "diag/report.h"
+#include "ingest/product_files.h"
 #include "ingest/product_types.h"
 #include "product/antenna_pattern.h"
 #include "product/roi.h"
 #include "product/time_base.h"
 
 namespace {
-
-constexpr const char* kMonths[12] = {"JAN", "FEB", "MAR", "APR", "MAY", "JUN",
-                                     "JUL", "AUG", "SEP", "OCT", "NOV", "DEC"};
-
-// Seconds since 1985 through the text date form; false for a month outside 1..12.
-bool dateToSec85(int year, int month, int day, int hour, int minute, int second, double& out) {
-  if (month < 1 || month > 12) return false;
-  char text[64];
-  std::snprintf(text, sizeof text, "%d-%3s-%d %d:%d:%d", day, kMonths[month - 1], year, hour, minute,
-                second);
-  out = ascii2sec85(text);
-  return true;
-}
-
-std::string baseName(const std::string& path) {
-  const auto cut = path.find_last_of("/\\");
-  return cut == std::string::npos ? path : path.substr(cut + 1);
-}
 
 // Generation, validity start and stop of an auxiliary product name.
 int parseAuxName(const std::string& name, double* generation, double* start, double* stop) {
@@ -44,11 +27,11 @@ int parseAuxName(const std::string& name, double* generation, double* start, dou
                             "%*14s%4d%2d%2d_%2d%2d%2d_%4d%2d%2d_%2d%2d%2d_%4d%2d%2d_%2d%2d%2d", &v[0],
                             &v[1], &v[2], &v[3], &v[4], &v[5], &v[6], &v[7], &v[8], &v[9], &v[10],
                             &v[11], &v[12], &v[13], &v[14], &v[15], &v[16], &v[17]);
-  if (n != 18) return 1;
+  if (n != 18) return STATUS_BAD_CONDITION;
   double t[3];
   for (int k = 0; k < 3; ++k) {
     const int* d = v + 6 * k;
-    if (!dateToSec85(d[0], d[1], d[2], d[3], d[4], d[5], t[k])) return 1;
+    if (!dateToSec85(d[0], d[1], d[2], d[3], d[4], d[5], t[k])) return STATUS_BAD_CONDITION;
   }
   *generation = t[0];
   *start = t[1];
@@ -61,9 +44,9 @@ int parseDorName(const std::string& name, double* start, double* stop) {
   const int n = std::sscanf(name.c_str(), "%*12s-P%*d_%*d_%4d%2d%2d_%2d%2d%2d_%4d%2d%2d_%2d%2d%2d",
                             &v[0], &v[1], &v[2], &v[3], &v[4], &v[5], &v[6], &v[7], &v[8], &v[9],
                             &v[10], &v[11]);
-  if (n != 12) return 1;
-  if (!dateToSec85(v[0], v[1], v[2], v[3], v[4], v[5], *start)) return 1;
-  if (!dateToSec85(v[6], v[7], v[8], v[9], v[10], v[11], *stop)) return 1;
+  if (n != 12) return STATUS_BAD_CONDITION;
+  if (!dateToSec85(v[0], v[1], v[2], v[3], v[4], v[5], *start)) return STATUS_BAD_CONDITION;
+  if (!dateToSec85(v[6], v[7], v[8], v[9], v[10], v[11], *stop)) return STATUS_BAD_CONDITION;
   return 0;
 }
 
@@ -106,10 +89,10 @@ int validityTime(const std::string& fileName, bool stop, double* t, Parse parse)
   if (fileName.empty()) {
     ORV_REPORT(stop ? "File not set, cannot find stop time" : "File not set, cannot find start time",
                REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   double first = 0.0, last = 0.0;
-  if (parse(&first, &last) != 0) return 1;
+  if (parse(&first, &last) != 0) return STATUS_BAD_CONDITION;
   *t = stop ? last : first;
   return 0;
 }
@@ -118,11 +101,11 @@ int validityTime(const std::string& fileName, bool stop, double* t, Parse parse)
 
 // ---- base ------------------------------------------------------------------------
 
-int SAR_product::getTimeStop(double*) { return 1; }
-int SAR_product::getTimeStart(double*) { return 1; }
+int SAR_product::getTimeStop(double*) { return STATUS_BAD_CONDITION; }
+int SAR_product::getTimeStart(double*) { return STATUS_BAD_CONDITION; }
 
 int SAR_product::setfileName(const std::string& name) {
-  if (name.empty()) return 1;
+  if (name.empty()) return STATUS_BAD_CONDITION;
   fileName_ = name;
   return 0;
 }
@@ -131,88 +114,6 @@ int SAR_product::getFileName(std::string& out) const {
   if (!fileName_.empty()) out = fileName_;
   return 0;
 }
-
-// ---- ERS -------------------------------------------------------------------------
-
-int Ers_DEOS::getTimeStop(double*) { return 0; }
-int Ers_DEOS::getTimeStart(double*) { return 0; }
-
-int Ers_DEOS::getDEOS(double time, int satellite, const std::string& path) {
-  CheckedCall cc("Ers_DEOS::getDEOS()");
-  if ((satellite != 0 && satellite != 1) || time < 0.0 || path.empty()) return 1;
-  // The same list serves both satellites.
-  const std::string list = path + "/ERS1/PRECISE/arclist";
-  std::unique_ptr<std::FILE, int (*)(std::FILE*)> in(std::fopen(list.c_str(), "r"), &std::fclose);
-  if (!in) {
-    ORV_REPORT("File not opened!", REPORT_ERROR);
-    return STATUS_NOT_OPENED;
-  }
-  fileName_.clear();
-  char line[99];
-  int counted = 0;
-  while (std::fgets(line, sizeof line, in.get())) {
-    if (std::strlen(line) < 67) continue;
-    if (counted++ < 22) continue;  // the list's head
-    int y1, m1, d1, h1, mi1, s1, y2, m2, d2, h2, mi2;
-    if (std::sscanf(line + 63, " %2d%2d%2d %2d:%2d:%2d", &y1, &m1, &d1, &h1, &mi1, &s1) != 6) continue;
-    if (std::sscanf(line + 20, " %2d%2d%2d %2d:%2d", &y2, &m2, &d2, &h2, &mi2) != 5) continue;
-    y1 += y1 > 85 ? 1900 : 2000;
-    y2 += y2 > 85 ? 1900 : 2000;
-    double begin = 0.0, end = 0.0;
-    if (!dateToSec85(y1, m1, d1, h1, mi1, s1, begin)) return 1;
-    if (!dateToSec85(y2, m2, d2, h2, mi2, 0, end)) return 1;
-    if (!(begin < time && time < end)) continue;
-    int arc = 0;
-    if (std::sscanf(line, " %3d%*s", &arc) != 1) continue;
-    char name[1100];
-    std::snprintf(name, sizeof name, "%s%s%3.0d", path.c_str(),
-                  satellite == 1 ? "/ERS2/PRECISE/ODR." : "/ERS1/PRECISE/ODR.", arc);
-    std::string formed = name;
-    for (std::size_t k = formed.size() >= 3 ? formed.size() - 3 : 0; k < formed.size(); ++k)
-      if (formed[k] == ' ') formed[k] = '0';
-    fileName_ = formed;
-  }
-  return STATUS_OK;
-}
-
-int Ers_level0::getTimeStart(double* t) {
-  ROI_Obj roi;
-  if (ErsTypes(fileName_).read_roi(&roi) != 1) return 1;
-  *t = roi.SlowStartTime;
-  return 0;
-}
-
-int Ers_level0::getTimeStop(double* t) {
-  ROI_Obj roi;
-  if (ErsTypes(fileName_).read_roi(&roi) != 1) return 1;
-  *t = roi.SlowStartTime + roi.SlowTimeLength;
-  return 0;
-}
-
-int Ers_level0::getAuxFiles(int selector, const std::string& path) {
-  CheckedCall cc("Ers_level0::getAuxFiles()");
-  if (selector != 3) return 0;
-  const ErsTypes types(fileName_);
-  ROI_Obj roi;
-  if (types.read_roi(&roi) != 1) return 1;
-  int satellite;
-  if (types.is_ers1())
-    satellite = 0;
-  else if (types.is_ers2())
-    satellite = 1;
-  else
-    return 1;
-  const std::string tag = satellite == 0 ? "ERS1" : "ERS2";
-  ORV_REPORT(tag + " image found, looking for orbit... ", REPORT_CHECKPOINT);
-  if (int st = orbit_.getDEOS(roi.SlowStartTime, satellite, path); st != 0) {
-    ORV_REPORT_CALLED_ERROR();
-    return st;
-  }
-  ORV_REPORT(tag + " orbit found", REPORT_CHECKPOINT);
-  return 0;
-}
-
-int Ers_level0::isAuxValid(int selector) const { return selector == 3 ? orbit_.isValid() : 0; }
 
 // ---- ENVISAT auxiliary products ------------------------------------------------------
 
@@ -272,9 +173,9 @@ int Envisat_DorVor::getTimeStop(double* t) {
 
 int Envisat_DorVor::getDorVor(double time, const std::string& path) {
   CheckedCall cc("Envisat_DorVor::getDorVor()");
-  if (time < 0.0 || path.empty()) return 1;
+  if (time < 0.0 || path.empty()) return STATUS_BAD_CONDITION;
   DirHandle dir(opendir(path.c_str()));
-  if (!dir) return 1;
+  if (!dir) return STATUS_BAD_CONDITION;
   const bool backslash = path.back() == '\\';
   while (const dirent* entry = readdir(dir.get())) {
     const std::string name = entry->d_name;
@@ -294,17 +195,17 @@ int Envisat_DorVor::getDorVor(double time, const std::string& path) {
 // ---- ENVISAT level 0 -------------------------------------------------------------
 
 int Envisat_level0::getTimeStart(double* t) {
-  if (fileName_.empty()) return 1;
+  if (fileName_.empty()) return STATUS_BAD_CONDITION;
   ROI_Obj roi;
-  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return 1;
+  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return STATUS_BAD_CONDITION;
   *t = roi.SlowStartTime;
   return 0;
 }
 
 int Envisat_level0::getTimeStop(double* t) {
-  if (fileName_.empty()) return 1;
+  if (fileName_.empty()) return STATUS_BAD_CONDITION;
   ROI_Obj roi;
-  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return 1;
+  if (EnvisatTypes(fileName_).read_roi(&roi) != 1) return STATUS_BAD_CONDITION;
   *t = roi.SlowStartTime + roi.SlowTimeLength;
   return 0;
 }

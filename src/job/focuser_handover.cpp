@@ -25,34 +25,7 @@ class MultiplatformJobFocuser : public JobFocuser {
     return status;
   }
 
-  void toFocuser() {
-    ATmultiplatformFocuser& f = focuser_;
-    f.Memory = job.Memory;
-    f.ReportFilename = job.ReportFilename;
-    f.ReportLevel = job.ReportLevel;
-    f.Incore = job.Incore;
-    f.Verbose = job.Verbose;
-    f.processingConfFilename = job.processingConfFilename;
-    f.platform = job.platform;
-    f.level0Filename = job.level0Filename;
-    f.level0FilenameSecondPol = job.level0FilenameSecondPol;
-    f.level0FilenameThirdPol = job.level0FilenameThirdPol;
-    f.level0FilenameFourthPol = job.level0FilenameFourthPol;
-    f.outputFilename = job.outputFilename;
-    f.auxFile1 = job.auxFile1;
-    f.auxFile2 = job.auxFile2;
-    f.auxFile3 = job.auxFile3;
-    f.auxFile4 = job.auxFile4;
-    f.auxFile5 = job.auxFile5;
-    f.auxDirectory1 = job.auxDirectory1;
-    f.auxDirectory2 = job.auxDirectory2;
-    f.auxDirectory3 = job.auxDirectory3;
-    f.auxDirectory4 = job.auxDirectory4;
-    f.auxDirectory5 = job.auxDirectory5;
-    f.skipLines = job.skipLines;
-    f.extractLines = job.extractLines;
-    f.eraseTemporaryFiles = job.eraseTemporaryFiles;
-  }
+  void toFocuser() { static_cast<FocuserJobFields&>(focuser_) = job; }
 
   // The fills write the files they found into the auxiliary parameters.
   void fromFocuser() {

@@ -3,27 +3,7 @@
 #include <string>
 #include <vector>
 
-// Parameters the job driver hands to the multi-platform focuser, with the
-// focuser's defaults.
-struct FocuserJobFields {
-  int Memory = 256;
-  std::string ReportFilename = "ATmultiplatformFocuser.report";
-  int ReportLevel = 1;
-  int Incore = 0;
-  int Verbose = 1;
-  std::string processingConfFilename;
-  std::string platform;
-  std::string level0Filename;
-  std::string level0FilenameSecondPol;
-  std::string level0FilenameThirdPol;
-  std::string level0FilenameFourthPol;
-  std::string outputFilename;
-  std::string auxFile1, auxFile2, auxFile3, auxFile4, auxFile5;
-  std::string auxDirectory1, auxDirectory2, auxDirectory3, auxDirectory4, auxDirectory5;
-  int skipLines = 0;
-  int extractLines = 0;
-  int eraseTemporaryFiles = 0;
-};
+#include "focus/job_fields.h"
 
 // The focuser as the job driver sees it: fields filled by the driver, then
 // checkpar, InitProcessing, run, FinalizeProcessing in this order; each

@@ -13,13 +13,13 @@
 #include "diag/orvane_exception.h"
 #include "diag/parameter_lines.h"
 #include "diag/report.h"
-#include "ingest/product_types.h"
+#include "product/profile.h"
+#include "focus/sensor_registry.h"
 #include "job/job_file.h"
 
 namespace {
 
 constexpr const char* kCommandPrefix = "main_focussing_stripmap#";
-constexpr std::size_t kNameBuffer = 512;
 
 constexpr const char* kLabels[] = {
     "INPUT SATELLITE", "INPUT SCENE",     "INPUT SCENE_2",    "INPUT SCENE_3",
@@ -69,9 +69,10 @@ void fillFocuserFields(FocuserJobFields& fields, const std::vector<std::string>&
     *files[n] = unlessNotOk(p[6 + n]);
     *directories[n] = p[11 + n];
   }
-  // ENVISAT: an auxiliary file 2 to 4 given by neither name nor folder is
-  // looked for among the description files.
-  if (fields.platform == "ENVISAT")
+  // Sensors whose auxiliary files 2 to 4, given by neither name nor folder,
+  // are looked for among the description files (ENVISAT).
+  const SensorDriver* sensor = findSensor(fields.platform);
+  if (sensor && sensor->auxiliaryInDescriptionFiles)
     for (int n = 1; n <= 3; ++n)
       if (!given(p[11 + n]) && !given(p[6 + n])) *directories[n] = ceosDirectory;
   fields.skipLines = decimal(p[16]);
@@ -84,29 +85,13 @@ void fillFocuserFields(FocuserJobFields& fields, const std::vector<std::string>&
 int chooseParameterProfile(FocuserJobFields& fields, const std::string& ceosDirectory,
                            int& alternatingPolarisation) {
   alternatingPolarisation = 0;
-  const std::string& platform = fields.platform;
-  std::string profile;
-  if (platform == "ENVISAT") {
-    const EnvisatTypes scene(fields.level0Filename.substr(0, kNameBuffer - 1));
-    if (scene.is_im0()) {
-      profile = "parameters_ENVISAT.hdr";
-    } else if (scene.is_aph() || scene.is_apv() || scene.is_apc()) {
-      profile = "parameters_AP.hdr";
-      alternatingPolarisation = 1;
-    } else {
-      ORV_REPORT("File type not supported", REPORT_ERROR);
-      return 1;
-    }
-  } else if (platform == "RADARSAT") {
-    profile = "parameters_RS.hdr";
-  } else if (platform == "ERS") {
-    profile = "parameters_ERS.hdr";
-  } else if (platform == "PALSAR" || platform == "PALSAR_ERSDAC") {
-    profile = "parameters_PALSAR.hdr";
-  } else {
+  const SensorDriver* sensor = findSensor(fields.platform);
+  if (!sensor) {
     ORV_REPORT("Unknown platform", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
+  std::string profile;
+  if (sensor->profile(fields, profile, alternatingPolarisation) != 0) return STATUS_BAD_CONDITION;
   fields.processingConfFilename = ceosDirectory + profile;
   return 0;
 }
@@ -126,7 +111,7 @@ int ftesv_main_focussing_stripmap(const std::string& jobPath) {
   ORV_REPORT(parameters[0], REPORT_WARNING);
   fillFocuserFields(focuser->job, parameters, ceosDirectory);
   int alternatingPolarisation = 0;
-  if (chooseParameterProfile(focuser->job, ceosDirectory, alternatingPolarisation) != 0) return 1;
+  if (chooseParameterProfile(focuser->job, ceosDirectory, alternatingPolarisation) != 0) return STATUS_BAD_CONDITION;
 
   if (focuser->checkpar() != 0) TESV_FATAL(EC_STAGE_FAILED, "checkpar()");
   if (focuser->InitProcessing() != 0) TESV_FATAL(EC_STAGE_FAILED, "InitProcessing()");
@@ -153,6 +138,10 @@ int stripmapFocuserEntry(int argc, char** argv) {
     // Library code that does not return statuses ends the run here.
     try {
       result = ftesv_main_focussing_stripmap(command.substr(prefix.size()));
+    } catch (const ProfileMemoryError& e) {
+      // A profile that does not fit in memory ends the run at once.
+      std::fputs(e.what(), stderr);
+      std::exit(1);
     } catch (const orvaneException& e) {
       TESV_FATAL(EC_STAGE_FAILED, e.getMessage() + " (" + e.getFile() + ", " + e.getFunction() +
                                       ", line " + std::to_string(e.getLine()) + ")");

@@ -8,7 +8,9 @@
 #include "base/status.h"
 #include "diag/environment.h"
 #include "diag/report.h"
-#include "ingest/product_types.h"
+#include "focus/sensor_registry.h"
+#include "focus/sensors/palsar.h"
+#include "ingest/palsar/palsar_types.h"
 #include "job/focuser_handover.h"
 #include "output/general_sar_kelmir.h"
 #include "output/raster_to_geotiff.h"
@@ -51,12 +53,6 @@ std::string envisatLabel(const std::string& header) {
   return "1";
 }
 
-int palsarTag(const PalsarTypes& types) {
-  if (types.is_quadpol() == 1) return KT_PALSAR_QUAD;
-  if (types.is_doublepol() == 1) return KT_PALSAR_DOUBLE;
-  return KT_PALSAR_SINGLE;
-}
-
 // Header export of one product with its record.
 void exportHeaders(GeneralSAR_kelmir& record, const std::string& product, const std::string& second,
                    int tag) {
@@ -90,17 +86,9 @@ void finishSingleFile(const FocuserJobFields& job, const std::vector<std::string
   record.GSread(out + ".hdr");
   renameFile(out + ".hdr", store);
 
-  const std::string& platform = parameter(p, 0);
-  if (platform == "ENVISAT") {
-    exportHeaders(record, product, job.auxFile3, KT_ENVISAT_IM);
-  } else if (platform == "ERS") {
-    exportHeaders(record, product, "", ErsTypes(parameter(p, 1)).is_ers1() == 1 ? KT_ERS1 : KT_ERS2);
-  } else if (platform == "RADARSAT") {
-    exportHeaders(record, product, "", KT_RADARSAT);
-  } else if (platform == "PALSAR") {
-    exportHeaders(record, product, "", palsarTag(PalsarTypes(job.auxFile2, parameter(p, 1))));
-  } else if (platform == "PALSAR_ERSDAC") {
-    exportHeaders(record, product, parameter(p, 6), KT_PALSAR_ERSDAC);
+  if (const SensorDriver* sensor = findSensor(parameter(p, 0))) {
+    const FinishingTag tag = sensor->finishingTag(job, p);
+    if (tag.tag >= 0) exportHeaders(record, product, tag.second, tag.tag);
   }
   record.GSdestroy();
 
@@ -137,8 +125,8 @@ void finishAlternating(const FocuserJobFields& job, const std::vector<std::strin
 }
 
 void finishMultiFile(const FocuserJobFields& job, const std::vector<std::string>& p) {
-  const std::string& platform = parameter(p, 0);
-  if (platform != "PALSAR" && platform != "PALSAR_ERSDAC") return;
+  const SensorDriver* sensor = findSensor(parameter(p, 0));
+  if (!sensor || !sensor->multiFileProducts) return;
   const std::string& out = job.outputFilename;
   std::string label;
   std::vector<std::string> products;
@@ -156,11 +144,11 @@ void finishMultiFile(const FocuserJobFields& job, const std::vector<std::string>
       if (std::remove(store.c_str()) != 0) ORV_REPORT("Cannot remove file " + store, REPORT_WARNING);
       renameFile(product + ".hdr", store);
     }
-    exportHeaders(record, product, "", palsarTag(types));
+    exportHeaders(record, product, "", palsarExportTag(types));
     record.GSdestroy();
     products.push_back(product);
   }
-  if (platform == "PALSAR" && parameter(p, 22) == "OK")
+  if (sensor->multiFileGeoTiff && parameter(p, 22) == "OK")
     for (const auto& product : products) makeTiff(product, p);
 }
 

@@ -6,13 +6,14 @@
 #include <new>
 #include <vector>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/report.h"
 #include "numerics/matrix_kernels.h"
 
 namespace {
 
-constexpr double kPi = 3.14159265358979323846;
+constexpr double kPi = consts::kPi;
 constexpr int kGridDensity = 128;  // fine enough for the peaks to sit within 0.01 % of the ripple
 constexpr int kMaxExchanges = 40;
 

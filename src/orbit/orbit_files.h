@@ -1,9 +1,11 @@
 #pragma once
-// Readers of precise orbit files: DORIS-type ASCII products (DOR_VOR_AX,
-// DOR_POR_AX, AUX_FRO_AX, AUX_FPO_AX), DEOS ODR arcs of ERS, the three PALSAR
-// forms (CEOS leader, ALEOCF, ALDSEF) and RADARSAT text orbit files. Each
-// turns the file into Earth-fixed positions and velocities at the times of a
-// uniform state-vector table, by nine-point Lagrange interpolation.
+// What the orbit file readers share: the state-vector table of a scene, the
+// nine-point Lagrange interpolation, the points of an orbit file as they
+// stand, and the inertial to Earth-fixed rotation. Each file format has its
+// reader beside this header: doris_orbit.h (DORIS-type products), deos_orbit.h
+// (DEOS ODR arcs of ERS), palsar_orbit.h (the PALSAR forms) and
+// radarsat_orbit.h. Each turns the file into Earth-fixed positions and
+// velocities at the times of a uniform state-vector table.
 //
 // All times are seconds since 01-JAN-1985. Vectors are stored x y z per
 // point, metres and metres per second.
@@ -36,56 +38,6 @@ struct OrbitRecords {
   std::vector<int> orbit;     // absolute orbit number (DORIS-type files only)
   int size() const { return static_cast<int>(times.size()); }
 };
-
-// DORIS-type reader. n vectors at t + (i - (n - 1) / 2) dt into pos (and vel
-// when not null). orbitOut (if not null) gets the absolute orbit of the record
-// nearest to t. With wantNode 1, nodeOut gets the time of the first ascending
-// node crossing found before t.
-// Status: 9 not opened, 12 not a DORIS-type product, 13 time outside the
-// sensing interval, 4 read failure, 1 no ascending node.
-int interp_orb_l(const std::string& path, double t, int n, double dt, double* pos, double* vel,
-                 int* orbitOut = nullptr, int wantNode = 0, double* nodeOut = nullptr);
-
-// The records of a DORIS-type file with tStart <= time <= tStop, unchanged.
-int get_state_vectors(const std::string& path, double tStart, double tStop, OrbitRecords& out);
-
-// DEOS ODR arc: checks the satellite ("ERS1" or "ERS2") and the coverage of t,
-// converts the records to Cartesian and interpolates n positions at
-// t0 + k dt from the nine records around t. Status 9, 4 or 1.
-int interp_orb_deos(const std::string& path, double t, const std::string& satellite, double t0,
-                    double dt, int n, double* pos);
-// All records of a DEOS ODR arc in Cartesian form (no velocities).
-int read_deos_odr(const std::string& path, OrbitRecords& out, std::string* satelliteName = nullptr);
-// Geodetic (degrees, metres) to Cartesian as the DEOS arcs need it.
-void deos_to_cartesian(double latDeg, double lonDeg, double height, double xyz[3]);
-
-// PALSAR forms: the points of the file, 60 s apart, Earth-fixed.
-// CEOS leader: the platform position record (record type 30): point count at
-// 140 (I4), year, month, day, day of year at 144..156 (I4 each), seconds of
-// day at 160 (D22.15), points from 386 as six D22.15 fields (x y z vx vy vz),
-// leap-second flag at 4082. The processing facility of the data set summary
-// (record type 10, 16 characters at 1046) "VEXCEL" dates the points from the
-// day of year instead of month and day.
-int read_palsar_leader_orbit(const std::string& path, OrbitRecords& out);
-// ALEOCF / ALDSEF files: frame "ECR" or "ECI" at 88, file date at 498 (10
-// characters, digits YYYYMMDD with any separators) and 508 (8, time of day), 170-byte
-// records from 808: YYYYMMDDhhmmss (14 digits), microseconds (6 digits), then
-// x y z vx vy vz in six fields of 25 characters (m, m/s).
-int read_palsar_orbit_file(const std::string& path, OrbitRecords& out);
-
-// RADARSAT text orbit file, rotated to Earth-fixed. Blocks, each on a line
-// of its own and found by name in this order:
-//   GENERATION TIME: YYYY DDD HH:MM:SS.ffffff
-//   ORBIT NUMBER: n
-//   GREENWICH ANGLE: YYYY DDD HH:MM:SS.ffffff angle-in-degrees
-//   FIRST MODEL: text           SECOND MODEL: text
-// then one line per vector, inertial (true of date), metres and m/s:
-//   STATE VECTOR: YYYY DDD HH:MM:SS.ffffff x y z vx vy vz
-// Times are day of year of the given year. Status 9, 1 (block missing, with
-// its message) or 4 (no vectors).
-int read_radarsat_orbit(const std::string& path, OrbitRecords& out);
-// RADARSAT reader: n vectors at t + (i - (n - 1) / 2) dt.
-int interp_orb_l_v2(const std::string& path, double t, int n, double dt, double* pos, double* vel);
 
 // n positions and velocities at t0 + k dt from the nine points of `rec`
 // around tCentre. Status 1 with fewer than nine points.

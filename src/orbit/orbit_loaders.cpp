@@ -10,7 +10,11 @@
 #include "diag/report.h"
 #include "orbit/general_sar_orbit.h"
 #include "orbit/ground_geometry.h"
+#include "orbit/deos_orbit.h"
+#include "orbit/doris_orbit.h"
 #include "orbit/orbit_files.h"
+#include "orbit/palsar_orbit.h"
+#include "orbit/radarsat_orbit.h"
 
 // ---- GeneralSAROrbit loaders ----------------------------------------------------------
 

@@ -1,5 +1,6 @@
 // Sections and fields of the description headers.
 #include "output/description_section.h"
+#include "base/status.h"
 
 #include <cerrno>
 #include <charconv>
@@ -167,77 +168,77 @@ int tesv_description_field::numberOfElements() const {
 }
 
 int tesv_description_field::getDouble(double& value, int index) const {
-  if (index < 0) return 1;
+  if (index < 0) return STATUS_BAD_CONDITION;
   std::size_t i = static_cast<std::size_t>(index);
   switch (type) {
     case FT_DOUBLE:
-      if (i >= doubles.size()) return 1;
+      if (i >= doubles.size()) return STATUS_BAD_CONDITION;
       value = doubles[i];
       return 0;
     case FT_INTEGER:
-      if (i >= ints.size()) return 1;
+      if (i >= ints.size()) return STATUS_BAD_CONDITION;
       value = static_cast<double>(ints[i]);
       return 0;
     case FT_STRING:
-      if (i >= strings.size()) return 1;
+      if (i >= strings.size()) return STATUS_BAD_CONDITION;
       return parseDescriptionDouble(strings[i], value) ? 0 : 1;
-    default: return 1;
+    default: return STATUS_BAD_CONDITION;
   }
 }
 
 int tesv_description_field::getInt(long long& value, int index) const {
-  if (index < 0) return 1;
+  if (index < 0) return STATUS_BAD_CONDITION;
   std::size_t i = static_cast<std::size_t>(index);
   switch (type) {
     case FT_INTEGER:
-      if (i >= ints.size()) return 1;
+      if (i >= ints.size()) return STATUS_BAD_CONDITION;
       value = ints[i];
       return 0;
     case FT_DOUBLE: {
-      if (i >= doubles.size()) return 1;
+      if (i >= doubles.size()) return STATUS_BAD_CONDITION;
       double d = doubles[i];
-      if (!std::isfinite(d) || d != std::floor(d) || std::fabs(d) > 9.0e18) return 1;
+      if (!std::isfinite(d) || d != std::floor(d) || std::fabs(d) > 9.0e18) return STATUS_BAD_CONDITION;
       value = static_cast<long long>(d);
       return 0;
     }
     case FT_STRING: {
-      if (i >= strings.size()) return 1;
+      if (i >= strings.size()) return STATUS_BAD_CONDITION;
       if (parseDescriptionInt(strings[i], value)) return 0;
       double d = 0.0;
       if (!parseDescriptionDouble(strings[i], d) || !std::isfinite(d) || d != std::floor(d) ||
           std::fabs(d) > 9.0e18)
-        return 1;
+        return STATUS_BAD_CONDITION;
       value = static_cast<long long>(d);
       return 0;
     }
-    default: return 1;
+    default: return STATUS_BAD_CONDITION;
   }
 }
 
 int tesv_description_field::getInt(int& value, int index) const {
   long long v = 0;
-  if (getInt(v, index) != 0 || v < -2147483648LL || v > 2147483647LL) return 1;
+  if (getInt(v, index) != 0 || v < -2147483648LL || v > 2147483647LL) return STATUS_BAD_CONDITION;
   value = static_cast<int>(v);
   return 0;
 }
 
 int tesv_description_field::getString(std::string& value, int index) const {
-  if (index < 0) return 1;
+  if (index < 0) return STATUS_BAD_CONDITION;
   std::size_t i = static_cast<std::size_t>(index);
   switch (type) {
     case FT_STRING:
-      if (i >= strings.size()) return 1;
+      if (i >= strings.size()) return STATUS_BAD_CONDITION;
       value = strings[i];
       return 0;
     case FT_INTEGER:
-      if (i >= ints.size()) return 1;
+      if (i >= ints.size()) return STATUS_BAD_CONDITION;
       value = std::to_string(ints[i]);
       return 0;
     case FT_DOUBLE:
-      if (i >= doubles.size()) return 1;
+      if (i >= doubles.size()) return STATUS_BAD_CONDITION;
       value = descriptionDoubleText(doubles[i]);
       return 0;
-    default: return 1;
+    default: return STATUS_BAD_CONDITION;
   }
 }
 
@@ -245,7 +246,7 @@ int tesv_description_field::getDoubles(std::vector<double>& values) const {
   int n = numberOfElements();
   std::vector<double> out(static_cast<std::size_t>(n));
   for (int i = 0; i < n; ++i)
-    if (getDouble(out[static_cast<std::size_t>(i)], i) != 0) return 1;
+    if (getDouble(out[static_cast<std::size_t>(i)], i) != 0) return STATUS_BAD_CONDITION;
   values = std::move(out);
   return 0;
 }
@@ -322,7 +323,7 @@ tesv_description_field& tesv_description_section::setField(const std::string& fi
 
 int tesv_description_section::setMandatory(const std::string& fieldName, bool flag) {
   auto* field = getField(fieldName);
-  if (!field) return 1;
+  if (!field) return STATUS_BAD_CONDITION;
   field->mandatory = flag;
   return 0;
 }

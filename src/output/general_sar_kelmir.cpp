@@ -5,12 +5,16 @@
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
+#include <utility>
+#include <variant>
 
 #include "base/constants.h"
 #include "base/status.h"
 #include "diag/environment.h"
 #include "diag/orvane_exception.h"
 #include "diag/report.h"
+#include "orbit/general_sar_orbit.h"
+#include "orbit/palsar_orbit.h"
 #include "output/description_text.h"
 #include "output/description_xml.h"
 #include "product/time_base.h"
@@ -173,13 +177,21 @@ int Service_kelmir::take(const tesv_description_section& header, const std::stri
 
 // ---------------------------------------------------------------- raster layout
 
+namespace {
+
+// The plain counts of the raster layout, in header order: written and read
+// from the same table.
+const std::pair<const char*, int DataFile_kelmir::*> kRasterCounts[] = {
+    {"NrOfPixelsPerLine", &DataFile_kelmir::NrOfPixelsPerLine},
+    {"NrOfLinesPerImage", &DataFile_kelmir::NrOfLinesPerImage},
+    {"RowPrefix", &DataFile_kelmir::RowPrefix}, {"RowSuffix", &DataFile_kelmir::RowSuffix}};
+
+}  // namespace
+
 DataFile_kelmir::DataFile_kelmir() : Service_kelmir("DataFile_kelmir", "RasterInfo") {}
 
 int DataFile_kelmir::writehdr_kelmir(tesv_description_section& header) {
-  putInt(header, "NrOfPixelsPerLine", NrOfPixelsPerLine);
-  putInt(header, "NrOfLinesPerImage", NrOfLinesPerImage);
-  putInt(header, "RowPrefix", RowPrefix);
-  putInt(header, "RowSuffix", RowSuffix);
+  for (const auto& [key, count] : kRasterCounts) putInt(header, key, this->*count);
   putInt(header, "HeaderOffset", HeaderOffset);
   putDouble(header, "NullCellValue", NullCellValue);
   std::string cell(cell_type_text(CellType));
@@ -192,10 +204,7 @@ int DataFile_kelmir::writehdr_kelmir(tesv_description_section& header) {
 }
 
 int DataFile_kelmir::readhdr_kelmir(const tesv_description_section& header) {
-  take(header, "NrOfPixelsPerLine", NrOfPixelsPerLine);
-  take(header, "NrOfLinesPerImage", NrOfLinesPerImage);
-  take(header, "RowPrefix", RowPrefix);
-  take(header, "RowSuffix", RowSuffix);
+  for (const auto& [key, count] : kRasterCounts) take(header, key, this->*count);
   long long offset = HeaderOffset;
   if (take(header, "HeaderOffset", offset) == 0) HeaderOffset = offset;
   take(header, "NullCellValue", NullCellValue);
@@ -353,17 +362,28 @@ int DataSetInfo_Obj_kelmir::readhdr_kelmir(const tesv_description_section& heade
 geoCoords_Obj_kelmir::geoCoords_Obj_kelmir()
     : Service_kelmir("geoCoords_Obj_kelmir", "CartographicSystem") {}
 
-int geoCoords_Obj_kelmir::writehdr_kelmir(tesv_description_section& header) {
-  const geopoint* corners[4] = {&NW, &NE, &SE, &SW};
+namespace {
+
+// The corners and the scene centre, in header order: written and read by the
+// same walk.
+template <class Visit>
+void cornerValues(geoCoords_Obj_kelmir& g, Visit&& visit) {
+  geopoint* corners[4] = {&g.NW, &g.NE, &g.SE, &g.SW};
   for (int i = 0; i < 4; ++i) {
     std::string base = "CORNER POINT " + std::to_string(i + 1) + "  ";
-    putDouble(header, base + "X", corners[i]->lon);
-    putDouble(header, base + "Y", corners[i]->lat);
+    visit(base + "X", corners[i]->lon);
+    visit(base + "Y", corners[i]->lat);
   }
-  putDouble(header, "CENTER SCENE POINT X", center.lon);
-  putDouble(header, "CENTER SCENE POINT Y", center.lat);
-  putDouble(header, "RangeLookAngle", center.look);
-  putDouble(header, "IncidenceAngle", center.incidence);
+  visit("CENTER SCENE POINT X", g.center.lon);
+  visit("CENTER SCENE POINT Y", g.center.lat);
+  visit("RangeLookAngle", g.center.look);
+  visit("IncidenceAngle", g.center.incidence);
+}
+
+}  // namespace
+
+int geoCoords_Obj_kelmir::writehdr_kelmir(tesv_description_section& header) {
+  cornerValues(*this, [&](const std::string& key, double value) { putDouble(header, key, value); });
   putDouble(header, "LatNorthing", center.lat);
   putDouble(header, "LonEasting", center.lon);
   putString(header, "RegistrationCoordinates.Units", "DEGREES");
@@ -380,16 +400,7 @@ int geoCoords_Obj_kelmir::writehdr_kelmir(tesv_description_section& header) {
 }
 
 int geoCoords_Obj_kelmir::readhdr_kelmir(const tesv_description_section& header) {
-  geopoint* corners[4] = {&NW, &NE, &SE, &SW};
-  for (int i = 0; i < 4; ++i) {
-    std::string base = "CORNER POINT " + std::to_string(i + 1) + "  ";
-    take(header, base + "X", corners[i]->lon);
-    take(header, base + "Y", corners[i]->lat);
-  }
-  take(header, "CENTER SCENE POINT X", center.lon);
-  take(header, "CENTER SCENE POINT Y", center.lat);
-  take(header, "RangeLookAngle", center.look);
-  take(header, "IncidenceAngle", center.incidence);
+  cornerValues(*this, [&](const std::string& key, double& value) { take(header, key, value); });
   for (geopoint* p : {&NW, &NE, &SE, &SW, &center}) p->syncToPoint();
   gsmReport("result", "section", "section closed", "WARNING");
   return STATUS_OK;
@@ -484,26 +495,25 @@ int polySAR_kelmir::readhdr_kelmir(const tesv_description_section& header) {
   if (nDc < 0 || nFr < 0 || nDc > 1000000 || nFr > 1000000) return STATUS_BAD_PARAMETER;
   int st = CreatePolys(nDc, nFr);
   if (st != 0) return st;
-  std::vector<std::string> az;
-  std::vector<double> rg, coefficients;
+  // One table: reference times, range reference times and coefficients.
+  auto readTable = [&](const char* times, const char* rangeTimes, const char* values, auto& rows,
+                       int nCoeff) {
+    std::vector<std::string> az;
+    std::vector<double> rg, coefficients;
+    take(header, times, az);
+    take(header, rangeTimes, rg);
+    take(header, values, coefficients);
+    return fieldsToRows(rows, az, rg, coefficients, nCoeff);
+  };
   if (nDc > 0) {
-    take(header, "DopCenRefTime", az);
-    take(header, "DopCenRgRefTime", rg);
-    take(header, "DopCenRangeCoeff", coefficients);
-    st = fieldsToRows(DC, az, rg, coefficients, nDcCoeff);
+    st = readTable("DopCenRefTime", "DopCenRgRefTime", "DopCenRangeCoeff", DC, nDcCoeff);
     if (st != 0) {
       ORV_REPORT("Doppler centroid table of the header is inconsistent", REPORT_ERROR);
       return st;
     }
   }
   if (nFr > 0) {
-    az.clear();
-    rg.clear();
-    coefficients.clear();
-    take(header, "DopRateRefTime", az);
-    take(header, "DopRateRgRefTime", rg);
-    take(header, "DopRateRangeCoeff", coefficients);
-    st = fieldsToRows(FR, az, rg, coefficients, nFrCoeff);
+    st = readTable("DopRateRefTime", "DopRateRgRefTime", "DopRateRangeCoeff", FR, nFrCoeff);
     if (st != 0) {
       ORV_REPORT("Doppler rate table of the header is inconsistent", REPORT_ERROR);
       return st;
@@ -620,36 +630,46 @@ int OtherInfo_kelmir::compute(GeneralSAR& record, float defaultSpeed) {
   return STATUS_OK;
 }
 
+namespace {
+
+// The look and spacing values of the processing section, in header order:
+// written and read from the same table.
+using LookValue = std::variant<int OtherInfo_kelmir::*, double OtherInfo_kelmir::*>;
+const std::pair<const char*, LookValue> kLookValues[] = {
+    {"AzimuthPixelShift", &OtherInfo_kelmir::AzimuthPixelShift},
+    {"NAzimuthLooks", &OtherInfo_kelmir::NAzimuthLooks},
+    {"SuggestedAzimuthLooks", &OtherInfo_kelmir::SuggestedAzimuthLooks},
+    {"SuggestedRangeLooks", &OtherInfo_kelmir::SuggestedRangeLooks},
+    {"AzimuthGroundPixelSpaceFromSuggestLooks",
+     &OtherInfo_kelmir::AzimuthGroundPixelSpaceFromSuggestLooks},
+    {"RangeGroundPixelSpaceFromSuggestLooks",
+     &OtherInfo_kelmir::RangeGroundPixelSpaceFromSuggestLooks},
+    {"FromInImageAzimuthLooks", &OtherInfo_kelmir::FromInImageAzimuthLooks},
+    {"FromInImageRangeLooks", &OtherInfo_kelmir::FromInImageRangeLooks},
+    {"PixelSpacingAz", &OtherInfo_kelmir::PixelSpacingAz}};
+
+}  // namespace
+
 int OtherInfo_kelmir::writehdr_kelmir(tesv_description_section& header) {
   putString(header, "StateVectorSource", "SLC_DATA_PRODUCT");
   putString(header, "StateVectorReference", "EARTH_FIXED");
   putString(header, "InitialGeometry.Projection", "SLANT_RANGE");
   putString(header, "InitialGeometry.TimeDirectionPixel", "INCREASE TIME DIRECTION");
   putString(header, "InitialGeometry.TimeDirectionLines", TimeDirectionLines);
-  putDouble(header, "AzimuthPixelShift", AzimuthPixelShift);
-  putInt(header, "NAzimuthLooks", NAzimuthLooks);
-  putInt(header, "SuggestedAzimuthLooks", SuggestedAzimuthLooks);
-  putInt(header, "SuggestedRangeLooks", SuggestedRangeLooks);
-  putDouble(header, "AzimuthGroundPixelSpaceFromSuggestLooks", AzimuthGroundPixelSpaceFromSuggestLooks);
-  putDouble(header, "RangeGroundPixelSpaceFromSuggestLooks", RangeGroundPixelSpaceFromSuggestLooks);
-  putInt(header, "FromInImageAzimuthLooks", FromInImageAzimuthLooks);
-  putInt(header, "FromInImageRangeLooks", FromInImageRangeLooks);
-  putDouble(header, "PixelSpacingAz", PixelSpacingAz);
+  for (const auto& [key, member] : kLookValues) {
+    if (const auto* count = std::get_if<int OtherInfo_kelmir::*>(&member))
+      putInt(header, key, this->**count);
+    else
+      putDouble(header, key, this->*std::get<double OtherInfo_kelmir::*>(member));
+  }
   gsmReport("key", "section", "section closed", "WARNING");
   return STATUS_OK;
 }
 
 int OtherInfo_kelmir::readhdr_kelmir(const tesv_description_section& header) {
   take(header, "InitialGeometry.TimeDirectionLines", TimeDirectionLines);
-  take(header, "AzimuthPixelShift", AzimuthPixelShift);
-  take(header, "NAzimuthLooks", NAzimuthLooks);
-  take(header, "SuggestedAzimuthLooks", SuggestedAzimuthLooks);
-  take(header, "SuggestedRangeLooks", SuggestedRangeLooks);
-  take(header, "AzimuthGroundPixelSpaceFromSuggestLooks", AzimuthGroundPixelSpaceFromSuggestLooks);
-  take(header, "RangeGroundPixelSpaceFromSuggestLooks", RangeGroundPixelSpaceFromSuggestLooks);
-  take(header, "FromInImageAzimuthLooks", FromInImageAzimuthLooks);
-  take(header, "FromInImageRangeLooks", FromInImageRangeLooks);
-  take(header, "PixelSpacingAz", PixelSpacingAz);
+  for (const auto& [key, member] : kLookValues)
+    std::visit([&](auto value) { take(header, key, this->*value); }, member);
   gsmReport("result", "section", "section closed", "WARNING");
   return STATUS_OK;
 }
@@ -682,6 +702,18 @@ tesv_description_section existingHeader(const std::string& file) {
 
 }  // namespace
 
+namespace {
+
+// Writes one member of the record into the header through its export class.
+template <class Export, class Member, class... Args>
+int exportObject(Member& member, tesv_description_section& header, Args&&... args) {
+  Export k;
+  member.clone(&k);
+  return k.writehdr_kelmir(header, std::forward<Args>(args)...);
+}
+
+}  // namespace
+
 int GeneralSAR_kelmir::fillHeader(const std::string& second, float defaultSpeed, int productTag,
                                   bool bypassOrbit) {
   int st = STATUS_OK;
@@ -698,50 +730,32 @@ int GeneralSAR_kelmir::fillHeader(const std::string& second, float defaultSpeed,
     if (GSexists(GS_DATASETINFO)) k.DataUnits = dataSetInfo.UnitType;
     if (!step(k.writehdr_kelmir(header_))) return st;
   }
-  if (GSexists(GS_ROI)) {
-    ROI_Obj_kelmir k;
-    roi.roi.clone(&k);
-    if (!step(k.writehdr_kelmir(header_))) return st;
-  }
-  if (GSexists(GS_POLYNOMIALS)) {
-    polySAR_kelmir k;
-    polynomials.clone(&k);
-    if (!step(k.writehdr_kelmir(header_))) return st;
-  }
-  if (GSexists(GS_SAMPLING)) {
-    SamplingConstants_Obj_kelmir k;
-    sampling.clone(&k);
-    if (!step(k.writehdr_kelmir(header_))) return st;
-  }
+  if (GSexists(GS_ROI) && !step(exportObject<ROI_Obj_kelmir>(roi.roi, header_))) return st;
+  if (GSexists(GS_POLYNOMIALS) && !step(exportObject<polySAR_kelmir>(polynomials, header_)))
+    return st;
+  if (GSexists(GS_SAMPLING) &&
+      !step(exportObject<SamplingConstants_Obj_kelmir>(sampling, header_)))
+    return st;
   if (GSexists(GS_ORBIT) && orbit().nSV >= 5) {
     GeneralSAROrbit_kelmir k;
     if (!step(orbit().clone(&k))) return st;
     if (!step(k.writehdr_kelmir(header_, bypassOrbit))) return st;
   }
-  if (GSexists(GS_PULSE)) {
-    SARPulse_Obj_kelmir k;
-    pulse.clone(&k);
-    if (!step(k.writehdr_kelmir(header_))) return st;
-  }
-  if (GSexists(GS_DATASETINFO)) {
-    DataSetInfo_Obj_kelmir k;
-    dataSetInfo.clone(&k);
-    if (!step(k.writehdr_kelmir(header_, kelmirProductIdentifier(productTag), second))) return st;
-  }
+  if (GSexists(GS_PULSE) && !step(exportObject<SARPulse_Obj_kelmir>(pulse, header_))) return st;
+  if (GSexists(GS_DATASETINFO) &&
+      !step(exportObject<DataSetInfo_Obj_kelmir>(dataSetInfo, header_,
+                                                 kelmirProductIdentifier(productTag), second)))
+    return st;
   if (GSexists(GS_ATTITUDE)) {
-    SensorAttitude_Obj_kelmir k;
-    attitude.clone(&k);
     double lineTime = roi.roi.SlowTimeDelta;
     if (!(std::fabs(lineTime) > 0.0) && sampling.prf_hz > 0.0) lineTime = 1.0 / sampling.prf_hz;
-    if (!step(k.writehdr_kelmir(header_, lineTime, defaultSpeed))) return st;
+    if (!step(exportObject<SensorAttitude_Obj_kelmir>(attitude, header_, lineTime, defaultSpeed)))
+      return st;
   }
   if (!step(otherInfo.compute(*this, defaultSpeed))) return st;
   if (!step(otherInfo.writehdr_kelmir(header_))) return st;
-  if (GSexists(GS_GEOCOORDS)) {
-    geoCoords_Obj_kelmir k;
-    geoCoords.clone(&k);
-    if (!step(k.writehdr_kelmir(header_))) return st;
-  }
+  if (GSexists(GS_GEOCOORDS) && !step(exportObject<geoCoords_Obj_kelmir>(geoCoords, header_)))
+    return st;
   return st;
 }
 
@@ -764,59 +778,20 @@ int GeneralSAR_kelmir::writehdr_kelmir(const std::string& file, const std::strin
   return writeFiles(file);
 }
 
-namespace {
-
-// Start time (date text) and step of the state vectors in the position
-// record of a CEOS leader.
-int readLeaderOrbitTiming(const std::string& leader, std::string& stepText, double& step,
-                          std::string& firstText) {
-  constexpr long kPositionRecord = 720 + 4096;
-  std::FILE* in = std::fopen(leader.c_str(), "rb");
-  if (!in) {
-    ORV_REPORT("File not opened! " + leader, REPORT_ERROR);
-    return STATUS_NOT_OPENED;
-  }
-  char record[206] = {};
-  bool ok = std::fseek(in, kPositionRecord, SEEK_SET) == 0 &&
-            std::fread(record, 1, 204, in) == 204;
-  std::fclose(in);
-  if (!ok) {
-    ORV_REPORT("File reading failed! " + leader, REPORT_ERROR);
-    return STATUS_READ_FAILED;
-  }
-  auto field = [&record](int offset, int length) { return std::string(record + offset, static_cast<std::size_t>(length)); };
-  int year = std::atoi(field(144, 4).c_str());
-  int month = std::atoi(field(148, 4).c_str());
-  int day = std::atoi(field(152, 4).c_str());
-  double secondsOfDay = std::atof(field(160, 22).c_str());
-  stepText = field(182, 22);
-  step = std::atof(stepText.c_str());
-  if (month < 1 || month > 12 || day < 1 || day > 31 || year < 1985) {
-    ORV_REPORT("File reading failed! " + leader + " (state vector date)", REPORT_ERROR);
-    return STATUS_READ_FAILED;
-  }
-  static const char months[] = "JANFEBMARAPRMAYJUNJULAUGSEPOCTNOVDEC";
-  char date[40];
-  std::snprintf(date, sizeof date, "%02d-%.3s-%04d 00:00:00.000000", day, months + 3 * (month - 1), year);
-  firstText = timeText(ascii2sec85(date) + secondsOfDay);
-  return STATUS_OK;
-}
-
-}  // namespace
-
 int GeneralSAR_kelmir::writehdr_ersdac_kelmir(const std::string& file, const std::string& leader,
                                               float defaultSpeed, int productTag) {
   if (productTag != KT_PALSAR_ERSDAC) {
     ORV_REPORT("ONLY ERSDAC with writehdr_ersdac_kelmir function", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  std::string stepText, firstText;
-  double step = 0.0;
-  int st = readLeaderOrbitTiming(leader, stepText, step, firstText);
+  std::string stepText;
+  double step = 0.0, firstTime = 0.0;
+  int st = read_palsar_leader_timing(leader, firstTime, stepText, step);
   if (st != 0) {
     ORV_REPORT_CALLED_ERROR();
     return st;
   }
+  const std::string firstText = timeText(firstTime);
   header_ = existingHeader(file);
   st = fillHeader("", defaultSpeed, productTag, false);
   if (st != 0) return st;
@@ -885,31 +860,19 @@ int GeneralSAR_kelmir::readhdr_kelmir(const std::string& file) {
         if (sc.lambda_m > 0.0) orbit().setLambda(sc.lambda_m);
       }
     }
-    if (header.getField("Sensor.PulseDuration")) {
-      SARPulse_Obj_kelmir p;
-      p.readhdr_kelmir(header);
-      p.clone(&pulse);
-      GSenable(GS_PULSE);
-    }
-    if (header.getField("RasterInfo.SensorName")) {
-      DataSetInfo_Obj_kelmir d;
-      d.readhdr_kelmir(header);
-      d.clone(&dataSetInfo);
-      GSenable(GS_DATASETINFO);
-    }
-    if (header.getField("sar_processing.ProcessingVelocity")) {
-      SensorAttitude_Obj_kelmir a;
-      a.readhdr_kelmir(header);
-      a.clone(&attitude);
-      GSenable(GS_ATTITUDE);
-    }
+    // A member whose key field the header holds, read through its export class.
+    auto import = [&](auto&& exporter, const char* key, auto& member, GSObject object) {
+      if (!header.getField(key)) return;
+      exporter.readhdr_kelmir(header);
+      exporter.clone(&member);
+      GSenable(object);
+    };
+    import(SARPulse_Obj_kelmir{}, "Sensor.PulseDuration", pulse, GS_PULSE);
+    import(DataSetInfo_Obj_kelmir{}, "RasterInfo.SensorName", dataSetInfo, GS_DATASETINFO);
+    import(SensorAttitude_Obj_kelmir{}, "sar_processing.ProcessingVelocity", attitude, GS_ATTITUDE);
     otherInfo.readhdr_kelmir(header);
-    if (header.getField("CartographicSystem.CENTER SCENE POINT X")) {
-      geoCoords_Obj_kelmir g;
-      g.readhdr_kelmir(header);
-      g.clone(&geoCoords);
-      GSenable(GS_GEOCOORDS);
-    }
+    import(geoCoords_Obj_kelmir{}, "CartographicSystem.CENTER SCENE POINT X", geoCoords,
+           GS_GEOCOORDS);
   } catch (const orvaneException& e) {
     ORV_REPORT(e.getMessage() + " in " + file, REPORT_ERROR);
     return STATUS_BAD_PARAMETER;

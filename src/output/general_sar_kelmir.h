@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "orbit/general_sar_orbit.h"
 #include "output/description_section.h"
 #include "product/general_sar.h"
 

@@ -8,6 +8,7 @@
 #include <new>
 
 #include "base/constants.h"
+#include "base/status.h"
 #include "diag/report.h"
 #include "product/buffer_io.h"
 #include "product/byte_order.h"
@@ -34,13 +35,13 @@ int readAsarAuxRecord(const std::string& file, std::size_t length,
   std::ifstream in(file, std::ios::binary);
   if (!in) {
     ORV_REPORT("File not opened! " + file, REPORT_ERROR);
-    return 9;
+    return STATUS_NOT_OPENED;
   }
   char sph[379] = {};
   in.seekg(1247);
   if (!in.read(sph, 378)) {
     ORV_REPORT("File reading failed! " + file, REPORT_ERROR);
-    return 4;
+    return STATUS_READ_FAILED;
   }
   long offset = -1;
   if (std::sscanf(sph + 231, "%ld", &offset) != 1 || offset < 0) {
@@ -49,14 +50,14 @@ int readAsarAuxRecord(const std::string& file, std::size_t length,
     while (*p && (*p < '0' || *p > '9') && *p != '+' && *p != '-') ++p;
     if (std::sscanf(p, "%ld", &offset) != 1 || offset < 0) {
       ORV_REPORT("File reading failed! no data offset in " + file, REPORT_ERROR);
-      return 4;
+      return STATUS_READ_FAILED;
     }
   }
   record.assign(length, 0);
   in.seekg(offset);
   if (!in.read(reinterpret_cast<char*>(record.data()), static_cast<std::streamsize>(length))) {
     ORV_REPORT("File reading failed! " + file, REPORT_ERROR);
-    return 4;
+    return STATUS_READ_FAILED;
   }
   return 0;
 }
@@ -172,7 +173,7 @@ int SARPulse_Obj::chirpSamples() const {
 
 int SARPulse_Obj::generateChirp(fcomplex* buffer) const {
   const int n = chirpSamples();
-  if (n <= 0 || buffer == nullptr) return 1;
+  if (n <= 0 || buffer == nullptr) return STATUS_BAD_CONDITION;
   const double fs = PulseSamplingRate;
   const double B = Bandwidth;
   const double T = PulseLength;
@@ -192,12 +193,12 @@ int SARPulse_Obj::generateChirp(fcomplex* buffer) const {
 
 int SARPulse_Obj::generateChirp(std::vector<fcomplex>& buffer) const {
   const int n = chirpSamples();
-  if (n <= 0) return 1;
+  if (n <= 0) return STATUS_BAD_CONDITION;
   try {
     buffer.assign(static_cast<std::size_t>(n), fcomplex(0.0f, 0.0f));
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Memory allocation failed for the replica", REPORT_ERROR);
-    return 7;
+    return STATUS_NO_MEMORY;
   }
   return generateChirp(buffer.data());
 }
@@ -205,10 +206,10 @@ int SARPulse_Obj::generateChirp(std::vector<fcomplex>& buffer) const {
 int SARPulse_Obj::writeChirp(const std::string& file) const {
   std::vector<fcomplex> chirp;
   const int made = generateChirp(chirp);
-  if (made == 7) return 7;
+  if (made == 7) return STATUS_NO_MEMORY;
   if (made != 0) {
     ORV_REPORT("Bad pulse parameters for the replica of " + file, REPORT_ERROR);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   DataFile raster(file);
   raster.NrOfPixelsPerLine = static_cast<int>(chirp.size());
@@ -216,13 +217,8 @@ int SARPulse_Obj::writeChirp(const std::string& file) const {
   raster.RowPrefix = 0;
   raster.HeaderOffset = 0;
   raster.CellType = FLOAT_COMPLEX;
-  BufferIO io;
-  io.file = &raster;
-  io.first_column = 0;
-  io.columns = raster.NrOfPixelsPerLine;
-  io.first_row = 0;
-  io.rows = 1;
-  io.memory_type = FLOAT_COMPLEX;
+  BufferIO io{.file = &raster, .first_column = 0, .columns = raster.NrOfPixelsPerLine,
+               .first_row = 0, .rows = 1};
   int status = io.writebuffer(chirp.data());
   const int closeStatus = raster.close();
   if (status == 0) status = closeStatus;
@@ -362,7 +358,7 @@ int SwathInfo::createBuffers() {
       Swst_changes_bursts.assign(static_cast<std::size_t>(Swst_changes), 0);
     } catch (const std::bad_alloc&) {
       ORV_REPORT("Memory allocation failed for the window change list", REPORT_ERROR);
-      return 7;
+      return STATUS_NO_MEMORY;
     }
   }
   refreshParameters();
@@ -409,13 +405,13 @@ int SwathInfo::readhdr(const std::string& file) {
   r.optional("ProcessorGain", &ProcessorGain);
   r.optional("NoisePower", &NoisePower);
   r.optional("ChirpPower", &ChirpPower);
-  if (r.failed()) return 1;
+  if (r.failed()) return STATUS_BAD_CONDITION;
   const int status = createBuffers();
   if (status != 0) return status;
   if (Swst_changes > 0 &&
       GetMyProfileIntArray("SwathInfo", "Swst_changes_bursts", Swst_changes_bursts.data(),
                            Swst_changes, file) != 0)
-    return 1;
+    return STATUS_BAD_CONDITION;
   return 0;
 }
 
@@ -442,7 +438,7 @@ int SwathInfo::clone(SwathInfo* t) const {
     t->Swst_changes_bursts = Swst_changes_bursts;
     t->BurstTimes = BurstTimes;
   } catch (const std::bad_alloc&) {
-    return 7;
+    return STATUS_NO_MEMORY;
   }
   t->refreshParameters();
   return 0;
@@ -452,21 +448,21 @@ int SwathInfo::readBurstTimes(const std::string& raster) {
   DataFile layout;
   if (layout.read_hdr(raster) != 0) {
     ORV_REPORT_CALLED_ERROR();
-    return 4;
+    return STATUS_READ_FAILED;
   }
   std::ifstream in(raster, std::ios::binary);
   if (!in) {
     ORV_REPORT("File not opened! " + raster, REPORT_ERROR);
-    return 9;
+    return STATUS_NOT_OPENED;
   }
   if (Bursts <= 0 || Lines_per_burst <= 0) {
     ORV_REPORT("No bursts to read in " + raster, REPORT_ERROR);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   try {
     BurstTimes.assign(static_cast<std::size_t>(Bursts), 0.0);
   } catch (const std::bad_alloc&) {
-    return 7;
+    return STATUS_NO_MEMORY;
   }
   const long long rowLength =
       static_cast<long long>(layout.element_sizeof()) * layout.NrOfPixelsPerLine + 17;
@@ -477,7 +473,7 @@ int SwathInfo::readBurstTimes(const std::string& raster) {
     in.seekg(position);
     if (!in.read(reinterpret_cast<char*>(prefix), 17)) {
       ORV_REPORT("File reading failed! " + raster, REPORT_ERROR);
-      return 4;
+      return STATUS_READ_FAILED;
     }
     mjd date;
     std::memcpy(&date.days, prefix, 4);

@@ -3,6 +3,7 @@
 #include <cmath>
 #include <new>
 
+#include "base/status.h"
 #include "diag/report.h"
 #include "product/acquisition_objects.h"
 #include "product/buffer_io.h"
@@ -36,7 +37,7 @@ int AntennaPattern_Obj::createBuffers() {
     Pattern.assign(static_cast<std::size_t>(PatternSamples), 0.0f);
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Memory allocation failed for the antenna pattern", REPORT_ERROR);
-    return 7;
+    return STATUS_NO_MEMORY;
   }
   refreshParameters();
   setAllocationFlag(true);
@@ -67,7 +68,7 @@ int AntennaPattern_Obj::writehdr() {
   patternFile.CellType = FLOAT32;
   if (patternFile.write_hdr() != 0) {
     ORV_REPORT_CALLED_ERROR();
-    return 5;
+    return STATUS_WRITE_FAILED;
   }
   writeAuxiliaryFile(patternFile.filename + ".hdr", 1, "AntennaPattern");
   return 0;
@@ -117,10 +118,10 @@ int AntennaPattern_Obj::getPatternENVI(const std::string& file, int swath, int p
   if (swath < 0 || polarisation < 0 ||
       kPatternTable + kPatternEntry * static_cast<std::size_t>(entry + 1) > kXcaRecordSize) {
     ORV_REPORT("Antenna pattern entry outside the table of " + file, REPORT_ERROR);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   PatternSamples = kPatternPoints;
-  if (createBuffers() != 0) return 7;
+  if (createBuffers() != 0) return STATUS_NO_MEMORY;
   const unsigned char* values = &record[kPatternTable + kPatternEntry * static_cast<std::size_t>(entry)];
   for (int i = 0; i < kPatternPoints; ++i)
     Pattern[static_cast<std::size_t>(i)] =
@@ -131,19 +132,14 @@ int AntennaPattern_Obj::getPatternENVI(const std::string& file, int swath, int p
 }
 
 int AntennaPattern_Obj::getPatternArray(float* buffer) {
-  if (buffer == nullptr) return 10;
+  if (buffer == nullptr) return STATUS_BAD_PARAMETER;
   if (Pattern.empty() || Pattern[0] == 0.0f) {
     if (PatternSamples <= 0) {
       ORV_REPORT("No antenna pattern samples", REPORT_ERROR);
-      return 10;
+      return STATUS_BAD_PARAMETER;
     }
-    BufferIO io;
-    io.file = &patternFile;
-    io.first_column = 0;
-    io.columns = PatternSamples;
-    io.first_row = 0;
-    io.rows = 1;
-    io.memory_type = FLOAT32;
+    BufferIO io{.file = &patternFile, .first_column = 0, .columns = PatternSamples, .first_row = 0,
+                 .rows = 1, .memory_type = FLOAT32};
     int status = io.readbuffer(buffer);
     patternFile.close();
     if (status != 0) {
@@ -160,20 +156,15 @@ int AntennaPattern_Obj::getPatternArray(float* buffer) {
 int AntennaPattern_Obj::WritePatternArray() {
   if (PatternSamples <= 0 || static_cast<int>(Pattern.size()) < PatternSamples) {
     ORV_REPORT("No antenna pattern samples to write", REPORT_ERROR);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   patternFile.NrOfPixelsPerLine = PatternSamples;
   patternFile.NrOfLinesPerImage = 1;
   patternFile.RowPrefix = 0;
   patternFile.HeaderOffset = 0;
   patternFile.CellType = FLOAT32;
-  BufferIO io;
-  io.file = &patternFile;
-  io.first_column = 0;
-  io.columns = PatternSamples;
-  io.first_row = 0;
-  io.rows = 1;
-  io.memory_type = FLOAT32;
+  BufferIO io{.file = &patternFile, .first_column = 0, .columns = PatternSamples, .first_row = 0,
+               .rows = 1, .memory_type = FLOAT32};
   int status = io.writebuffer(Pattern.data());
   const int closeStatus = patternFile.close();
   if (status == 0) status = closeStatus;

@@ -6,6 +6,7 @@
 #include <cstring>
 #include <new>
 
+#include "base/status.h"
 #include "product/buffer_io.h"
 
 BufferFile::BufferFile() { createElementsVector(6); }
@@ -30,7 +31,7 @@ int BufferFile::readhdr() { return readhdr(filename_ + ".hdr"); }
 
 int BufferFile::readhdr(const std::string& file) {
   hdrOffset_ = int(HeaderOffset_);
-  if (!readAuxiliaryFile(file, 1, "RasterInfo")) return 1;
+  if (!readAuxiliaryFile(file, 1, "RasterInfo")) return STATUS_BAD_CONDITION;
   HeaderOffset_ = hdrOffset_;
   return 0;
 }
@@ -38,7 +39,7 @@ int BufferFile::readhdr(const std::string& file) {
 int BufferFile::writehdr() { return writehdr(filename_ + ".hdr"); }
 
 int BufferFile::writehdr(const std::string& file) {
-  if (HeaderOffset_ < 0 || HeaderOffset_ > 2147483647) return 1;
+  if (HeaderOffset_ < 0 || HeaderOffset_ > 2147483647) return STATUS_BAD_CONDITION;
   hdrOffset_ = int(HeaderOffset_);
   return writeAuxiliaryFile(file, 1, "RasterInfo");
 }

@@ -487,3 +487,13 @@ int DataFile::readRows(char* dst, int64_t pitch, int rows, int64_t lead, int64_t
   }
   return STATUS_OK;
 }
+
+void setComplexRasterLayout(DataFile& file, const std::string& name, int samples, int lines) {
+  file.filename = name;
+  file.NrOfPixelsPerLine = samples;
+  file.NrOfLinesPerImage = lines;
+  file.RowPrefix = 0;
+  file.HeaderOffset = 0;
+  file.CellType = FLOAT_COMPLEX;
+  file.ByteOrder = 0;
+}

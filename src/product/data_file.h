@@ -139,3 +139,8 @@ class DataFile : public GeneralSAR_Base {
   RasterStream stream_;
   int hdrOffset_ = 0;  // 32-bit view of HeaderOffset for the element table
 };
+
+// Layout of a focused or range-focused raster: complex floats in host
+// little-endian order, no header block, no row prefixes; `name`, `samples`
+// per line, `lines`.
+void setComplexRasterLayout(DataFile& file, const std::string& name, int samples, int lines);

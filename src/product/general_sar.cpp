@@ -1,18 +1,17 @@
-// The record itself never touches the orbit classes (see the header).
-#define TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
 #include "product/general_sar.h"
 
 #include <cstdio>
 
+#include "base/status.h"
 #include "diag/report.h"
 
 int GSDataFile_Obj::readhdr(const std::string& file) {
-  if (file.size() < 4) return 1;
+  if (file.size() < 4) return STATUS_BAD_CONDITION;
   return read_hdr(file.substr(0, file.size() - 4));
 }
 
 int GSDataFile_Obj::writehdr(const std::string& file) {
-  if (file.size() < 4) return 1;
+  if (file.size() < 4) return STATUS_BAD_CONDITION;
   const std::string kept = filename;
   filename = file.substr(0, file.size() - 4);
   const int status = write_hdr();
@@ -44,7 +43,7 @@ int GeneralSAR::GSread(const std::string& file) {
   std::FILE* probe = std::fopen(file.c_str(), "r");
   if (probe == nullptr) {
     ORV_REPORT("File : " + file + " DOES NOT EXIST!", REPORT_ERROR);
-    return 9;
+    return STATUS_NOT_OPENED;
   }
   std::fclose(probe);
   GSdestroy();

@@ -37,8 +37,9 @@ class GSDataFile_Obj : public DataFile {
 
 // The state-vector and orbit members are classes of the orbit library, which
 // is built on top of this one. The record reaches them only through this
-// seam; standardOrbitSlots() (end of this header, compiled into the users of
-// the record, never into this library) makes the real ones.
+// seam; the orbit library makes the real ones (orbit/record_orbit_slots.h)
+// and defines the record's default constructors and typed orbit views, so
+// this library never includes an orbit header.
 class GeneralSAROrbitSlots {
  public:
   virtual ~GeneralSAROrbitSlots() = default;
@@ -74,7 +75,7 @@ class GeneralSAR {
   };
   static constexpr int kObjects = 14;
 
-  // With the real orbit members (standardOrbitSlots()).
+  // With the real orbit members (defined in the orbit library).
   GeneralSAR();
   explicit GeneralSAR(const GeneralSAROrbitSlots& slots);
   ~GeneralSAR();
@@ -95,7 +96,8 @@ class GeneralSAR {
   // antenna members.
   int GSdestroy();
 
-  // Typed views of the orbit members (record made with the standard slots).
+  // Typed views of the orbit members (record made with the real orbit
+  // members; defined in the orbit library).
   GeneralSAROrbit& orbit();
   SAROrbitStateVectors_Obj& stateVectors();
 
@@ -119,44 +121,3 @@ class GeneralSAR {
   GeneralSAR_Base* objects_[kObjects] = {};
   unsigned char exists_[kObjects] = {};
 };
-
-// The real orbit members. Left out of the record's own implementation, so
-// that this library holds no reference to the orbit library.
-#ifndef TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
-#include "orbit/general_sar_orbit.h"
-
-class StandardOrbitSlots final : public GeneralSAROrbitSlots {
- public:
-  std::unique_ptr<GeneralSAR_Base> makeStateVectors() const override {
-    return std::make_unique<SAROrbitStateVectors_Obj>();
-  }
-  std::unique_ptr<GeneralSAR_Base> makeOrbit() const override {
-    return std::make_unique<GeneralSAROrbit>();
-  }
-  void setLambda(GeneralSAR_Base& orbit, double lambda) const override {
-    static_cast<GeneralSAROrbit&>(orbit).setLambda(lambda);
-  }
-  void setOrbitLookSign(GeneralSAR_Base& orbit, int sign) const override {
-    static_cast<GeneralSAROrbit&>(orbit).setLookSign(sign);
-  }
-  void setStateVectorsLookSign(GeneralSAR_Base& sv, int sign) const override {
-    static_cast<SAROrbitStateVectors_Obj&>(sv).lookSign = sign;
-  }
-  void destroyOrbit(GeneralSAR_Base& orbit) const override {
-    static_cast<GeneralSAROrbit&>(orbit).SVDestroy();
-  }
-  void destroyStateVectors(GeneralSAR_Base& sv) const override { sv.destroyBuffers(); }
-};
-
-inline const GeneralSAROrbitSlots& standardOrbitSlots() {
-  static const StandardOrbitSlots slots;
-  return slots;
-}
-
-
-inline GeneralSAR::GeneralSAR() : GeneralSAR(standardOrbitSlots()) {}
-inline GeneralSAROrbit& GeneralSAR::orbit() { return static_cast<GeneralSAROrbit&>(*orbit_); }
-inline SAROrbitStateVectors_Obj& GeneralSAR::stateVectors() {
-  return static_cast<SAROrbitStateVectors_Obj&>(*stateVectors_);
-}
-#endif

@@ -1,5 +1,6 @@
 #include "product/general_sar_base.h"
 
+#include "base/status.h"
 #include "diag/report.h"
 
 // ---- GeneralSAR_BaseXML -------------------------------------------------------
@@ -12,7 +13,7 @@ int GeneralSAR_BaseXML::destroyBuffers() { return 0; }
 void GeneralSAR_BaseXML::refreshParameters() {}
 
 int GeneralSAR_BaseXML::createElementsVector(int n) {
-  if (n < 0) return 1;
+  if (n < 0) return STATUS_BAD_CONDITION;
   elements.assign(size_t(n), parElement());
   numberOfElements = n;
   nextElement = 0;
@@ -42,7 +43,7 @@ int GeneralSAR_BaseXML::createBuffersDefault() {
 int GeneralSAR_BaseXML::addElement(const std::string& name, void* ptr,
                                    parElement::ParameterType type, int size, double min,
                                    double max, bool mandatory) {
-  if (numberOfElements <= 0 || nextElement >= numberOfElements) return 1;
+  if (numberOfElements <= 0 || nextElement >= numberOfElements) return STATUS_BAD_CONDITION;
   elements[size_t(nextElement)].setElement(name, ptr, type, size, min, max, mandatory);
   if (++nextElement == numberOfElements) nextElement = 0;
   return 0;
@@ -89,14 +90,14 @@ int GeneralSAR_BaseXML::unsetAuxiliaryFile() {
 }
 
 int GeneralSAR_BaseXML::cleanAuxiliaryFile() {
-  if (!xml.isOpen() || auxClass.empty()) return 1;
+  if (!xml.isOpen() || auxClass.empty()) return STATUS_BAD_CONDITION;
   if (xml.countNodes(auxChannel, auxClass) > 0) xml.removeNodes(auxChannel, auxClass);
   return 0;
 }
 
 int GeneralSAR_BaseXML::readElement(const parElement& e, int size) {
   if (size <= 0) return 0;
-  if (e.pointer == nullptr) return 1;
+  if (e.pointer == nullptr) return STATUS_BAD_CONDITION;
   const std::string path = auxClass + "/" + e.name;
   switch (e.type) {
     case parElement::PT_INT:
@@ -108,13 +109,13 @@ int GeneralSAR_BaseXML::readElement(const parElement& e, int size) {
     case parElement::PT_STRING:
       return xml.readString(auxChannel, path, static_cast<std::string*>(e.pointer), size);
     default:
-      return 1;
+      return STATUS_BAD_CONDITION;
   }
 }
 
 int GeneralSAR_BaseXML::writeElement(const parElement& e) {
   if (e.size <= 0) return 0;
-  if (e.pointer == nullptr) return 1;
+  if (e.pointer == nullptr) return STATUS_BAD_CONDITION;
   const std::string path = auxClass + "/" + e.name;
   switch (e.type) {
     case parElement::PT_INT:
@@ -127,35 +128,35 @@ int GeneralSAR_BaseXML::writeElement(const parElement& e) {
       return xml.writeString(auxChannel, path, static_cast<const std::string*>(e.pointer),
                              e.size);
     default:
-      return 1;
+      return STATUS_BAD_CONDITION;
   }
 }
 
 int GeneralSAR_BaseXML::readAuxiliaryFile() {
-  if (!xml.isOpen()) return 1;
+  if (!xml.isOpen()) return STATUS_BAD_CONDITION;
   // 1: scalar numbers first, so that sizes are known before allocation.
   for (const auto& e : elements) {
     if (!e.scalar || e.type == parElement::PT_STRING || e.type == parElement::PT_UNSET) continue;
-    if (readElement(e, 1) != 0 && e.mandatory) return 1;
+    if (readElement(e, 1) != 0 && e.mandatory) return STATUS_BAD_CONDITION;
   }
   // 2: allocation from those sizes; the table is re-aimed here.
-  if (createBuffers() != 0) return 1;
-  if (!allocated) return 1;
+  if (createBuffers() != 0) return STATUS_BAD_CONDITION;
+  if (!allocated) return STATUS_BAD_CONDITION;
   // 3: every persisted element with its present size.
   for (const auto& e : elements) {
     if (e.size <= 0) continue;
-    if (readElement(e, e.size) != 0 && e.mandatory) return 1;
+    if (readElement(e, e.size) != 0 && e.mandatory) return STATUS_BAD_CONDITION;
   }
   return 0;
 }
 
 int GeneralSAR_BaseXML::writeAuxiliaryFile() {
   cleanAuxiliaryFile();
-  if (!allocated) return 1;
-  if (!xml.isOpen()) return 1;
+  if (!allocated) return STATUS_BAD_CONDITION;
+  if (!xml.isOpen()) return STATUS_BAD_CONDITION;
   for (const auto& e : elements) {
     if (e.size <= 0) continue;
-    if (writeElement(e) != 0) return 1;
+    if (writeElement(e) != 0) return STATUS_BAD_CONDITION;
   }
   return xml.write();
 }
@@ -200,7 +201,7 @@ int GeneralSAR_Base::readhdr(const std::string&) { return 0; }
 int GeneralSAR_BaseConfiguration::readConf(const std::string& file, int channel,
                                            const std::string& group) {
   orvanexml doc(file);
-  if (!doc.isRecognised()) return 1;
+  if (!doc.isRecognised()) return STATUS_BAD_CONDITION;
   doc.readInt(channel, group + "/Memory", &Memory, 1);
   doc.readInt(channel, group + "/Incore", &Incore, 1);
   doc.readInt(channel, group + "/Verbose", &Verbose, 1);
@@ -212,14 +213,14 @@ int GeneralSAR_BaseConfiguration::readConf(const std::string& file, int channel,
 int GeneralSAR_BaseConfiguration::writeConf(const std::string& file, int channel,
                                             const std::string& group) {
   orvanexml doc(file);
-  if (!doc.isOpen()) return 1;
+  if (!doc.isOpen()) return STATUS_BAD_CONDITION;
   int rc = 0;
   rc |= doc.writeInt(channel, group + "/Memory", &Memory, 1);
   rc |= doc.writeInt(channel, group + "/Incore", &Incore, 1);
   rc |= doc.writeInt(channel, group + "/Verbose", &Verbose, 1);
   rc |= doc.writeInt(channel, group + "/ReportLevel", &ReportLevel, 1);
   rc |= doc.writeString(channel, group + "/ReportFilename", &ReportFilename, 1);
-  if (rc != 0) return 1;
+  if (rc != 0) return STATUS_BAD_CONDITION;
   return doc.write();
 }
 

@@ -1,9 +1,8 @@
-// Configuration never touches the orbit classes directly (see general_sar.h).
-#define TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
 #include "product/general_sar_configuration.h"
 
 #include <cstdio>
 
+#include "base/status.h"
 #include "diag/orvane_exception.h"
 #include "diag/report.h"
 
@@ -20,10 +19,10 @@ constexpr const char* kCommonGroup = "generalProcessingConf";
 
 int ConfigurationBlock::readConf(const std::string& file, int channel, const std::string& group,
                                  const std::string& className) {
-  if (GeneralSAR_BaseConfiguration::readConf(file, channel, group) != 0) return 1;
+  if (GeneralSAR_BaseConfiguration::readConf(file, channel, group) != 0) return STATUS_BAD_CONDITION;
   if (setAuxiliaryFile(file, channel, className) != 0) {
     unsetAuxiliaryFile();
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   const bool present = getXml().countNodes(channel, className) > 0;
   const int status = present ? readAuxiliaryFile() : 1;
@@ -35,7 +34,7 @@ int ConfigurationBlock::writeConf(const std::string& file, int channel, const st
                                   const std::string& className) {
   // The class block first: for the common group's own class it would
   // otherwise remove the common values again.
-  if (writeAuxiliaryFile(file, channel, className) != 0) return 1;
+  if (writeAuxiliaryFile(file, channel, className) != 0) return STATUS_BAD_CONDITION;
   return GeneralSAR_BaseConfiguration::writeConf(file, channel, group) != 0 ? 1 : 0;
 }
 
@@ -330,18 +329,18 @@ int EnvisatCalibrationFactors::writepar(const std::string& file, int channel) {
 }
 
 int EnvisatCalibrationFactors::writeFactor(GeneralSAR* product) const {
-  if (product == nullptr) return 1;
+  if (product == nullptr) return STATUS_BAD_CONDITION;
   DataSetInfo_Obj& info = product->dataSetInfo;
-  if (!info.IsSensorType(DataSetInfo_Obj::ST_ASAR)) return 1;
+  if (!info.IsSensorType(DataSetInfo_Obj::ST_ASAR)) return STATUS_BAD_CONDITION;
   const bool stripmap = info.IsAcqMode(DataSetInfo_Obj::AM_STRIPMAP);
   const bool dual = info.IsAcqMode(DataSetInfo_Obj::AM_DOUBLE_POLARIZATION);
   const bool focused = info.IsImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
   const bool multilooked = info.IsImageType(DataSetInfo_Obj::IT_MULTILOOK);
-  if (!((stripmap && focused) || (dual && (focused || multilooked)))) return 1;
+  if (!((stripmap && focused) || (dual && (focused || multilooked)))) return STATUS_BAD_CONDITION;
   // Only the digit of "IS3", "SS1", ... counts.
-  if (info.Swath.size() < 3) return 1;
+  if (info.Swath.size() < 3) return STATUS_BAD_CONDITION;
   const int index = info.Swath[2] - '1';
-  if (index < 0 || index > 6) return 1;
+  if (index < 0 || index > 6) return STATUS_BAD_CONDITION;
   const std::string& pol = info.Polarization;
   const double* table = nullptr;
   if (stripmap) {
@@ -353,7 +352,7 @@ int EnvisatCalibrationFactors::writeFactor(GeneralSAR* product) const {
     else if (pol == "V/H") table = AP_VH;
     else if (pol == "V/V") table = AP_VV;
   }
-  if (table == nullptr) return 1;
+  if (table == nullptr) return STATUS_BAD_CONDITION;
   info.ExternalCalibrationFactor = table[index];
   return 0;
 }
@@ -363,7 +362,7 @@ int EnvisatCalibrationFactors::writeFactor(const std::string& file,
   GeneralSAR product(slots);
   if (product.GSread(file) != 0) {
     ORV_REPORT_CALLED_ERROR();
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   const int status = writeFactor(&product);
   if (status == 0) product.GSwrite(file);
@@ -380,7 +379,7 @@ int GeneralSAR_configuration::GSread(const std::string& file, int channel) {
   std::FILE* probe = std::fopen(file.c_str(), "r");
   if (probe == nullptr) {
     ORV_REPORT("File : " + file + " DOES NOT EXIST!", REPORT_ERROR);
-    return 9;
+    return STATUS_NOT_OPENED;
   }
   std::fclose(probe);
   for (int i = 0; i < kObjects; ++i) {

@@ -227,9 +227,3 @@ class GeneralSAR_configuration {
   ConfigurationBlock* objects_[kObjects];
   unsigned char exists_[kObjects] = {};
 };
-
-#ifndef TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
-inline int EnvisatCalibrationFactors::writeFactor(const std::string& file) const {
-  return writeFactor(file, standardOrbitSlots());
-}
-#endif

@@ -15,6 +15,7 @@
 #include <type_traits>
 #include <vector>
 
+#include "base/status.h"
 #include "diag/report.h"
 
 namespace {
@@ -106,12 +107,12 @@ template <typename T>
 int scanFlat(const std::string& text, T* dst, int n) {
   size_t pos = 0;
   for (int i = 0; i < n; ++i) {
-    if (pos > text.size()) return 1;
+    if (pos > text.size()) return STATUS_BAD_CONDITION;
     size_t comma = text.find(',', pos);
     std::string item = text.substr(pos, comma == std::string::npos ? std::string::npos : comma - pos);
-    if (!scanItem(item, dst[i])) return 1;
+    if (!scanItem(item, dst[i])) return STATUS_BAD_CONDITION;
     if (comma == std::string::npos) {
-      if (i + 1 < n) return 1;
+      if (i + 1 < n) return STATUS_BAD_CONDITION;
       break;
     }
     pos = comma + 1;
@@ -196,7 +197,7 @@ bool orvanexml::recognise() {
 int orvanexml::newDocument() {
   silenceLibxml();
   doc = xmlNewDoc(X("1.0"));
-  if (doc == nullptr) return 1;
+  if (doc == nullptr) return STATUS_BAD_CONDITION;
   root = xmlNewDocNode(doc, nullptr, X("OrvaneXmlDoc"), nullptr);
   xmlDocSetRootElement(doc, root);
   xmlNewTextChild(root, nullptr, X("NumberOfChannels"), X("0"));
@@ -213,13 +214,13 @@ int orvanexml::evalXPath(const std::string& expr) {
     xmlXPathFreeObject(result);
     result = nullptr;
   }
-  if (context == nullptr) return 1;
+  if (context == nullptr) return STATUS_BAD_CONDITION;
   result = xmlXPathEvalExpression(X(expr.c_str()), context);
-  if (result == nullptr) return 1;
+  if (result == nullptr) return STATUS_BAD_CONDITION;
   if (result->type != XPATH_NODESET) {
     xmlXPathFreeObject(result);
     result = nullptr;
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   return 0;
 }
@@ -273,9 +274,9 @@ _xmlNode* orvanexml::createNode(const std::string& absolutePath) {
 }
 
 int orvanexml::createPath(int channel, const std::string& path, int n) {
-  if (!plainPath(path)) return 1;
+  if (!plainPath(path)) return STATUS_BAD_CONDITION;
   const std::string chan = channelPath(channel);
-  if (evalXPath(chan) != 0) return 1;
+  if (evalXPath(chan) != 0) return STATUS_BAD_CONDITION;
   if (nodeCount() == 0) {
     xmlNodePtr node = xmlNewTextChild(root, nullptr, X("Channel"), nullptr);
     xmlNewProp(node, X("Number"), X(std::to_string(channel).c_str()));
@@ -285,9 +286,9 @@ int orvanexml::createPath(int channel, const std::string& path, int n) {
   }
   const std::string full = chan + "/" + path;
   xmlNodePtr first = createNode(full);
-  if (first == nullptr) return 1;
+  if (first == nullptr) return STATUS_BAD_CONDITION;
   if (n > 1) {
-    if (evalXPath(full) != 0) return 1;
+    if (evalXPath(full) != 0) return STATUS_BAD_CONDITION;
     int have = nodeCount();
     std::string name = C(first->name);
     for (int i = have; i < n; ++i) xmlNewTextChild(first->parent, nullptr, X(name.c_str()), nullptr);
@@ -296,19 +297,19 @@ int orvanexml::createPath(int channel, const std::string& path, int n) {
 }
 
 int orvanexml::prepareWrite(int channel, const std::string& path, int n, std::string& valuePath) {
-  if (!documentOpen || path.empty()) return 1;
+  if (!documentOpen || path.empty()) return STATUS_BAD_CONDITION;
   valuePath = n < 2 ? path : path + "/val";
-  if (countNodes(channel, valuePath) < n && createPath(channel, valuePath, n) != 0) return 1;
-  if (evalXPath(channelPath(channel) + "/" + valuePath) != 0 || nodeCount() < n) return 1;
+  if (countNodes(channel, valuePath) < n && createPath(channel, valuePath, n) != 0) return STATUS_BAD_CONDITION;
+  if (evalXPath(channelPath(channel) + "/" + valuePath) != 0 || nodeCount() < n) return STATUS_BAD_CONDITION;
   return 0;
 }
 
 template <typename T>
 int orvanexml::writeNumbers(int channel, const std::string& path, const T* src, int n) {
   if (n <= 0) return 0;
-  if (src == nullptr) return 1;
+  if (src == nullptr) return STATUS_BAD_CONDITION;
   std::string valuePath;
-  if (prepareWrite(channel, path, n, valuePath) != 0) return 1;
+  if (prepareWrite(channel, path, n, valuePath) != 0) return STATUS_BAD_CONDITION;
   for (int i = 0; i < n; ++i) {
     xmlNodePtr node = nodeAt(i);
     setNodeText(node, formatValue(src[i]));
@@ -320,13 +321,13 @@ int orvanexml::writeNumbers(int channel, const std::string& path, const T* src, 
 template <typename T>
 int orvanexml::readNumbers(int channel, const std::string& path, T* dst, int n, const char* word) {
   if (n <= 0) return 0;
-  if (dst == nullptr || !documentOpen || path.empty()) return 1;
+  if (dst == nullptr || !documentOpen || path.empty()) return STATUS_BAD_CONDITION;
   if (countNodes(channel, path) == 0) {
     if (debug)
       ORV_REPORT("Cannot read " + std::string(word) + " '" + path + "' in channel " +
                      std::to_string(channel) + ", from XML file " + docPath,
                  REPORT_WARNING);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   const std::string element = channelPath(channel) + "/" + path;
   const std::string valuePath = n < 2 ? element : element + "/val";
@@ -336,12 +337,12 @@ int orvanexml::readNumbers(int channel, const std::string& path, T* dst, int n, 
     if (have < n) {
       if (debug)
         std::fprintf(stderr, "File not recognized: %s does not exist\n", valuePath.c_str());
-      return 1;
+      return STATUS_BAD_CONDITION;
     }
     return 0;
   }
   // Legacy flat form: one text, items separated by a comma and a blank.
-  if (evalXPath(element) != 0 || nodeCount() < 1) return 1;
+  if (evalXPath(element) != 0 || nodeCount() < 1) return STATUS_BAD_CONDITION;
   const std::string text = nodeText(nodeAt(0));
   if constexpr (std::is_same_v<T, float>) {
     std::vector<double> tmp(size_t(n), 0.0);
@@ -374,13 +375,13 @@ int orvanexml::writeDouble(int channel, const std::string& path, const double* s
 
 int orvanexml::readString(int channel, const std::string& path, std::string* dst, int n) {
   if (n <= 0) return 0;
-  if (dst == nullptr || !documentOpen || path.empty()) return 1;
+  if (dst == nullptr || !documentOpen || path.empty()) return STATUS_BAD_CONDITION;
   if (countNodes(channel, path) < n) {
     if (debug)
       ORV_REPORT("Cannot read string '" + path + "' in channel " + std::to_string(channel) +
                      ", from XML file " + docPath,
                  REPORT_WARNING);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   for (int i = 0; i < n; ++i) dst[i] = nodeText(nodeAt(i));
   return 0;
@@ -388,12 +389,12 @@ int orvanexml::readString(int channel, const std::string& path, std::string* dst
 
 int orvanexml::writeString(int channel, const std::string& path, const std::string* src, int n) {
   if (n <= 0) return 0;
-  if (src == nullptr) return 1;
+  if (src == nullptr) return STATUS_BAD_CONDITION;
   std::string valuePath;
   // Strings have no "val" form: an array is a run of same-named siblings.
-  if (!documentOpen || path.empty()) return 1;
-  if (countNodes(channel, path) < n && createPath(channel, path, n) != 0) return 1;
-  if (evalXPath(channelPath(channel) + "/" + path) != 0 || nodeCount() < n) return 1;
+  if (!documentOpen || path.empty()) return STATUS_BAD_CONDITION;
+  if (countNodes(channel, path) < n && createPath(channel, path, n) != 0) return STATUS_BAD_CONDITION;
+  if (evalXPath(channelPath(channel) + "/" + path) != 0 || nodeCount() < n) return STATUS_BAD_CONDITION;
   for (int i = 0; i < n; ++i) {
     xmlNodePtr node = nodeAt(i);
     setNodeText(node, src[i]);
@@ -403,26 +404,26 @@ int orvanexml::writeString(int channel, const std::string& path, const std::stri
 }
 
 int orvanexml::write() {
-  if (!documentOpen || doc == nullptr) return 1;
-  if (xmlSaveFormatFileEnc(docPath.c_str(), doc, "UTF-8", 1) < 0) return 1;
+  if (!documentOpen || doc == nullptr) return STATUS_BAD_CONDITION;
+  if (xmlSaveFormatFileEnc(docPath.c_str(), doc, "UTF-8", 1) < 0) return STATUS_BAD_CONDITION;
   clean();
   // Parsed again with blanks dropped, the second save gets clean indentation.
   doc = parseDocument(docPath);
   if (doc == nullptr) {
     newDocument();
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   root = xmlDocGetRootElement(doc);
   context = xmlXPathNewContext(doc);
   documentOpen = context != nullptr;
-  if (xmlSaveFormatFileEnc(docPath.c_str(), doc, "UTF-8", 1) < 0) return 1;
+  if (xmlSaveFormatFileEnc(docPath.c_str(), doc, "UTF-8", 1) < 0) return STATUS_BAD_CONDITION;
   return 0;
 }
 
 int orvanexml::setDescription(const std::string& path, const std::string& text) {
   initXmlFile(path);
-  if (!documentOpen) return 1;
-  if (evalXPath("/OrvaneXmlDoc/Description") != 0 || nodeCount() < 1) return 1;
+  if (!documentOpen) return STATUS_BAD_CONDITION;
+  if (evalXPath("/OrvaneXmlDoc/Description") != 0 || nodeCount() < 1) return STATUS_BAD_CONDITION;
   setNodeText(nodeAt(0), text);
   description = text;
   int rc = write();

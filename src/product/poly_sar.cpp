@@ -3,6 +3,7 @@
 #include <cstdio>
 #include <string>
 
+#include "base/status.h"
 #include "diag/report.h"
 #include "product/profile.h"
 
@@ -88,7 +89,7 @@ int evaluateRow(const std::vector<T>& rows, double rg, double az, double* out, c
                 int line, const char* function) {
   if (rows.empty()) {
     orv_add_report(missing, REPORT_ERROR, line, function, __FILE__);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   return rows[static_cast<size_t>(selectRow(rows, az))].EvaluatePoly(rg, az, out);
 }
@@ -100,7 +101,7 @@ int evaluateInterp(const std::vector<T>& rows, double rg, double az, double* out
                    bool keepAzimuth, const char* missing, int line, const char* function) {
   if (rows.empty()) {
     orv_add_report(missing, REPORT_ERROR, line, function, __FILE__);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   poly p;
   interpolateRows(rows, az, extrapolate, p.c);
@@ -183,11 +184,11 @@ void poly::clone(poly* target) const {
 
 int poly::readpar(const std::string& file, const std::string& section) {
   if (readAuxiliaryFile(file, 1, rowClass(section))) return 0;
-  if (*coefficientKey() == '\0') return 1;
+  if (*coefficientKey() == '\0') return STATUS_BAD_CONDITION;
   if (GetProfileDoubleArray(section, coefficientKey(), c, 7, file) != 0 ||
       GetProfileDoubleArray(section, rangeReferenceKey(), &trg0, 1, file) != 0 ||
       GetProfileDoubleArray(section, azimuthReferenceKey(), &taz0, 1, file) != 0)
-    return 1;
+    return STATUS_BAD_CONDITION;
   return 0;
 }
 
@@ -238,13 +239,13 @@ void extended_poly::clone(extended_poly* target) const {
 
 int polyDC::readparold(const std::string& file, const std::string& section) {
   int n = 0;
-  if (GetMyProfileIntArray(section, "DopCenPol_nCoeff", &n, 1, file) != 0) return 1;
+  if (GetMyProfileIntArray(section, "DopCenPol_nCoeff", &n, 1, file) != 0) return STATUS_BAD_CONDITION;
   int status = 0;
   if (GetProfileDoubleArray(section, "DopCenRgRefTimes", &trg0, 1, file) != 0) status = 1;
   if (GetProfileDoubleArray(section, "DopCenAzRefSec85Times", &taz0, 1, file) != 0) status = 1;
   if (n == 5) {
     double v[5];
-    if (GetProfileDoubleArray(section, "DopCenRangeCoeffs", v, 5, file) != 0) return 1;
+    if (GetProfileDoubleArray(section, "DopCenRangeCoeffs", v, 5, file) != 0) return STATUS_BAD_CONDITION;
     c[0] = v[0];
     c[1] = v[1];
     c[2] = c[3] = 0.0;
@@ -252,7 +253,7 @@ int polyDC::readparold(const std::string& file, const std::string& section) {
     c[5] = v[3];
     c[6] = v[4];
   } else if (n == 7) {
-    if (GetProfileDoubleArray(section, "DopCenRangeCoeffs", c, 7, file) != 0) return 1;
+    if (GetProfileDoubleArray(section, "DopCenRangeCoeffs", c, 7, file) != 0) return STATUS_BAD_CONDITION;
   }
   return status;
 }
@@ -260,7 +261,7 @@ int polyDC::readparold(const std::string& file, const std::string& section) {
 int polyFR::readparold(const std::string& file, const std::string& section, int n) {
   if (n == 5) {
     double v[5];
-    if (GetProfileDoubleArray(section, "AzimuthCoeff", v, 5, file) != 0) return 1;
+    if (GetProfileDoubleArray(section, "AzimuthCoeff", v, 5, file) != 0) return STATUS_BAD_CONDITION;
     c[0] = v[0];
     c[1] = v[1];
     c[2] = c[3] = 0.0;
@@ -269,12 +270,12 @@ int polyFR::readparold(const std::string& file, const std::string& section, int 
     c[6] = v[4];
   } else if (n == 3) {
     double v[3];
-    if (GetProfileDoubleArray(section, "AzimuthCoeff", v, 3, file) != 0) return 1;
+    if (GetProfileDoubleArray(section, "AzimuthCoeff", v, 3, file) != 0) return STATUS_BAD_CONDITION;
     c[0] = v[0];
     c[1] = v[1];
     c[3] = v[2];
   } else if (n == 7) {
-    if (GetProfileDoubleArray(section, "DopRatRangeCoeff", c, 7, file) != 0) return 1;
+    if (GetProfileDoubleArray(section, "DopRatRangeCoeff", c, 7, file) != 0) return STATUS_BAD_CONDITION;
   }
   return 0;
 }
@@ -380,7 +381,7 @@ int polySAR::writehdr(const std::string& file) {
   // the file is saved once for all of them.
   if (setAuxiliaryFile(file, 1, kPolySAR) != 0 || writeAuxiliaryFile() != 0) {
     unsetAuxiliaryFile();
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   orvanexml& doc = getXml();
   int status = 0;
@@ -424,7 +425,7 @@ int polySAR::readhdr(const std::string& file) {
       counts[k] = n > 0 ? n : 0;
       any = any || counts[k] > 0;
     }
-    if (!any) return 1;
+    if (!any) return STATUS_BAD_CONDITION;
   }
   ndc = nfr = nsl2gr = ngr2sl = nsl2theta = nsl2phi = ndcExt = nfrExt = 0;
   CreatePolys(counts[0], counts[1], counts[2], counts[3], counts[4], counts[5], counts[6],
@@ -462,7 +463,7 @@ int polySAR::readhdr(const std::string& file) {
   if (status != 0) {
     ORV_REPORT("Polynomial rows missing in file : " + file, REPORT_WARNING);
     DestroyPolys();
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   return 0;
 }

@@ -1,11 +1,10 @@
-// The aggregates never touch the orbit classes directly (see general_sar.h).
-#define TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
 #include "product/product_aggregates.h"
 
 #include <algorithm>
 #include <cmath>
 
 #include "base/constants.h"
+#include "base/status.h"
 #include "diag/report.h"
 
 namespace {
@@ -81,7 +80,7 @@ int ImageSARData_Obj::destroyAll() {
 int ImageSARData_Obj::compute_eqspeed() {
   if (polynomials.FR.empty() || polynomials.DC.empty()) {
     ORV_REPORT("NO FR poly available", REPORT_ERROR);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   const double c = consts::kSpeedOfLight;
   const double lambda = c / sampling.fc_hz;

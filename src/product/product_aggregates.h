@@ -122,12 +122,3 @@ int GetProcessedBandwidth(const SamplingConstants_Obj& sampling, const SpectralW
                           double* range, double* azimuth);
 int GetProcessedBandwidth(const SamplingConstants_Obj* sampling,
                           const SpectralWindows_Obj* windows, double* range, double* azimuth);
-
-#ifndef TESSIVOR_RECORD_WITHOUT_ORBIT_CLASSES
-inline ImageSARData_Obj::ImageSARData_Obj() : ImageSARData_Obj(standardOrbitSlots()) {}
-inline GeneralSLCData::GeneralSLCData() : GeneralSLCData(standardOrbitSlots()) {}
-inline GeneralSAROrbit& GeneralSLCData::orbit() { return static_cast<GeneralSAROrbit&>(*orbit_); }
-inline RawSARData_Obj::RawSARData_Obj() : RawSARData_Obj(standardOrbitSlots()) {}
-inline GeneralRAWData::GeneralRAWData() : GeneralRAWData(standardOrbitSlots()) {}
-inline GeneralSAROrbit& GeneralRAWData::orbit() { return static_cast<GeneralSAROrbit&>(*orbit_); }
-#endif

@@ -148,8 +148,9 @@ ProfileFile& loadFile(const std::string& path) {
       try {
         parseProfile(fp, *pf);
       } catch (const std::bad_alloc&) {
-        std::fputs("Memory re-allocation failure\n", stderr);
-        std::exit(1);
+        std::fclose(fp);
+        cache().pop_back();
+        throw ProfileMemoryError("Memory re-allocation failure\n");
       }
       std::fclose(fp);
     }

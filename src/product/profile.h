@@ -13,8 +13,17 @@
 // that is grown to n items if it is shorter. Array writers take a pointer and
 // n, or a whole vector.
 #include <cstdint>
+#include <stdexcept>
 #include <string>
 #include <vector>
+
+// A profile file that cannot be held in memory. The message is the text the
+// program prints on the error stream before it ends with status 1; the job
+// driver does both.
+class ProfileMemoryError : public std::runtime_error {
+ public:
+  using std::runtime_error::runtime_error;
+};
 
 // ---- core ----------------------------------------------------------------
 

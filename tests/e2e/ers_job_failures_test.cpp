@@ -8,7 +8,7 @@
 #include "support/files.h"
 #include "support/host_run.h"
 #include "support/point_targets.h"
-#include "focus/level0_focusers.h"
+#include "focus/sensors/ers.h"
 #include "focus/multiplatform_focuser.h"
 #include "job/focuser_handover.h"
 

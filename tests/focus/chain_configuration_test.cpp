@@ -1,6 +1,6 @@
 #include <string>
 
-#include "focus/level0_focusers.h"
+#include "focus/sensors/level0_chain.h"
 #include "focus/sar_focuser.h"
 #include "focus_fixture.h"
 

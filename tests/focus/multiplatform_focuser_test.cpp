@@ -10,7 +10,10 @@
 #include <string>
 #include <vector>
 
-#include "focus/level0_focusers.h"
+#include "focus/sensors/envisat.h"
+#include "focus/sensors/ers.h"
+#include "focus/sensors/palsar.h"
+#include "focus/sensors/radarsat.h"
 #include "focus/sar_focuser.h"
 #include "product/par_element.h"
 #include "support/files.h"

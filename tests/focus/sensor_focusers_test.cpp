@@ -1,9 +1,11 @@
 #include <string>
 
-#include "focus/level0_focusers.h"
+#include "focus/sensors/envisat.h"
+#include "focus/sensors/ers.h"
+#include "focus/sensors/radarsat.h"
 #include "focus/sar_focuser.h"
 #include "focus_fixture.h"
-#include "ingest/ers_extractor.h"
+#include "ingest/ers/ers_extractor.h"
 #include "product/data_set_info.h"
 
 namespace {

@@ -14,7 +14,7 @@
 #include <vector>
 
 #include "diag/report.h"
-#include "focus/level0_focusers.h"
+#include "focus/sensors/ers.h"
 #include "focus/sar_focuser.h"
 #include "product/data_set_info.h"
 #include "product/general_sar.h"

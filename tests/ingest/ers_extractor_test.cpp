@@ -1,4 +1,4 @@
-#include "ingest/ers_extractor.h"
+#include "ingest/ers/ers_extractor.h"
 
 #include <gtest/gtest.h>
 

@@ -1,4 +1,6 @@
 #include "ingest/product_types.h"
+#include "ingest/ers/ers_types.h"
+#include "ingest/palsar/palsar_types.h"
 
 #include <gtest/gtest.h>
 

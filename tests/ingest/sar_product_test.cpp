@@ -1,4 +1,5 @@
 #include "ingest/sar_product.h"
+#include "ingest/ers/ers_level0.h"
 
 #include <gtest/gtest.h>
 

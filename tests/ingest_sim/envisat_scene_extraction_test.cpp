@@ -13,6 +13,7 @@
 #include <vector>
 
 #include "ingest/envisat/asar_aux.h"
+#include "orbit/general_sar_orbit.h"
 #include "ingest/envisat/enviextractor.h"
 #include "ingest/product_types.h"
 #include "product/product_aggregates.h"

@@ -9,8 +9,8 @@
 #include <string>
 #include <vector>
 
-#include "ingest/ers_extractor.h"
-#include "ingest/sar_product.h"
+#include "ingest/ers/ers_extractor.h"
+#include "ingest/ers/ers_level0.h"
 #include "orbit/general_sar_orbit.h"
 #include "product/product_aggregates.h"
 #include "product/time_base.h"

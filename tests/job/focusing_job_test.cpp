@@ -3,6 +3,7 @@
 #include <filesystem>
 
 #include "ingest/product_types.h"
+#include "ingest/ers/ers_types.h"
 #include "job/focusing_job.h"
 #include "support/files.h"
 #include "support/host_run.h"

@@ -9,6 +9,7 @@
 
 #include "orbit/general_sar_orbit.h"
 #include "orbit/ground_geometry.h"
+#include "orbit/doris_orbit.h"
 #include "orbit/orbit_files.h"
 #include "product/profile.h"
 #include "product/time_base.h"

@@ -12,6 +12,8 @@
 #include <string>
 #include <vector>
 
+#include "orbit/deos_orbit.h"
+#include "orbit/doris_orbit.h"
 #include "orbit/orbit_files.h"
 #include "product/time_base.h"
 

@@ -14,6 +14,8 @@
 
 #include "orbit/general_sar_orbit.h"
 #include "orbit/orbit_files.h"
+#include "orbit/palsar_orbit.h"
+#include "orbit/radarsat_orbit.h"
 #include "product/time_base.h"
 
 namespace fs = std::filesystem;

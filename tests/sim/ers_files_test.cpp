@@ -13,6 +13,7 @@
 #include <unistd.h>
 
 #include "orbit/general_sar_orbit.h"
+#include "orbit/deos_orbit.h"
 #include "orbit/orbit_files.h"
 #include "product/profile.h"
 #include "product/time_base.h"

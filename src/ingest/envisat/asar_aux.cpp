@@ -12,7 +12,7 @@
 #include "base/constants.h"
 #include "base/status.h"
 #include "diag/report.h"
-#include "orbit/orbit_files.h"
+#include "orbit/doris_orbit.h"
 #include "product/acquisition_objects.h"
 #include "product/byte_order.h"
 

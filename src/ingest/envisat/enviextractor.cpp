@@ -7,6 +7,7 @@
 #include "base/status.h"
 #include "diag/report.h"
 #include "ingest/envisat/asar_aux.h"
+#include "orbit/general_sar_orbit.h"
 #include "product/antenna_pattern.h"
 #include "product/product_aggregates.h"
 #include "product/profile.h"

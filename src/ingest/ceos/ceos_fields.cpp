@@ -1,4 +1,4 @@
-#include "ingest/ceos_fields.h"
+#include "ingest/ceos/ceos_fields.h"
 
 #include <cmath>
 

@@ -1,5 +1,5 @@
 // ERS-1/2 level-0 extraction from the CEOS leader and image file.
-#include "ingest/ers_extractor.h"
+#include "ingest/ers/ers_extractor.h"
 
 #include <algorithm>
 #include <climits>
@@ -11,25 +11,25 @@
 #include <fstream>
 #include <new>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/ckerr.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
-#include "ingest/ceos_fields.h"
+#include "ingest/ceos/ceos_record.h"
+#include "ingest/ers/ers_ceos_layout.h"
 #include "orbit/general_sar_orbit.h"
 #include "product/time_base.h"
 
 namespace {
 
-constexpr double kSpeedOfLight = 299792458.0;
 // Sampling window start of a line from its window code, seconds.
 constexpr double kSwstStep = 2.10943e-07;
 constexpr double kSwstOffset = 0.005357529;
 constexpr double kRangeGateBias = -6.627e-06;
-constexpr int kImageDescriptor = 11644;
-constexpr int kRecordPrefix = 412;
+constexpr int kImageDescriptor = ers_image::kDescriptorLength;
+constexpr int kRecordPrefix = ers_image::kDataPrefix;
 constexpr int kMaxSwstJump = 200;
-constexpr int kVectorBytes = 132;
 constexpr double kAbsentBias = -100.0;
 constexpr const char* kMonths[12] = {"JAN", "FEB", "MAR", "APR", "MAY", "JUN",
                                      "JUL", "AUG", "SEP", "OCT", "NOV", "DEC"};
@@ -51,30 +51,6 @@ std::string trimmed(const std::string& s) {
   if (first == std::string::npos) return {};
   return s.substr(first, s.find_last_not_of(' ') - first + 1);
 }
-
-std::uint32_t be32(const unsigned char* p) {
-  return (std::uint32_t(p[0]) << 24) | (std::uint32_t(p[1]) << 16) | (std::uint32_t(p[2]) << 8) |
-         std::uint32_t(p[3]);
-}
-
-int be16(const unsigned char* p) { return (int(p[0]) << 8) | int(p[1]); }
-
-// Fixed fields of a file held in memory; a field past the end is a short read.
-class FieldReader {
- public:
-  explicit FieldReader(const std::vector<char>& bytes) : bytes_(bytes) {}
-  bool has(long offset, int length) const {
-    return offset >= 0 && offset + length <= static_cast<long>(bytes_.size());
-  }
-  const char* at(long offset) const { return bytes_.data() + offset; }
-  std::string text(long offset, int length) const { return ceosText(at(offset), length); }
-  double real(long offset, int length) const { return FtoDouble(at(offset), length); }
-  double real2(long offset, int length) const { return FtoDouble2(at(offset), length); }
-  int integer(long offset, int length) const { return ch2int(at(offset), length); }
-
- private:
-  const std::vector<char>& bytes_;
-};
 
 // Text date of the first state vector: "DD-MMM-YYYY hh:mm:ss.mmm000".
 std::string vectorStartText(int day, int month, const std::string& year, double secondsOfDay) {
@@ -143,7 +119,7 @@ int ATERSExtractor::runall(const std::string& file, int channel) {
   std::string target = ReportFilename;
   if (getConfigurationFile(file, channel, "ATERSExtractor", target)) {
     ReportFilename = target;
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (int st = InitProcessing(file, channel); st != 0) return ERS_CALLED(st);
   if (int st = run(); st != 0) return ERS_CALLED(st);
@@ -178,9 +154,12 @@ int ATERSExtractor::readLeader() {
     if (LeaFilename.empty() || !in) return ERS_FAIL("File not opened! " + LeaFilename, STATUS_NOT_OPENED);
     bytes.assign(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
   }
-  const FieldReader f(bytes);
+  namespace dss = ers_leader::dss;
+  namespace ppr = ers_leader::ppr;
+  const CeosRecord summary(bytes, ers_leader::kDataSetSummary);
+  const CeosRecord position(bytes, ers_leader::kPlatformPosition);
   // Data set summary, then the head of the platform position record.
-  if (!f.has(0, 2788 + 22))
+  if (!summary.has(dss::kLastLineTime) || !position.has(ppr::kInterval))
     return ERS_FAIL("File reading failed! " + LeaFilename, STATUS_READ_FAILED);
   auto bad = [this](const char* what) {
     return std::string("Bad ") + what + " in the leader file " + LeaFilename;
@@ -191,56 +170,55 @@ int ATERSExtractor::readLeader() {
   DataSetInfo_Obj& info = rawData.dataSetInfo;
   ROI_Obj& roi = rawData.roi;
 
-  info.SceneID = trimmed(f.text(740, 32));
-  info.Description = f.text(1116, 4);
-  info.Polarization = std::string(1, f.at(1148)[0]) + "/" + std::string(1, f.at(1148)[1]);
-  info.OrbitNumber = trimmed(f.text(1164, 8));
+  info.SceneID = trimmed(summary.text(dss::kSceneId));
+  info.Description = summary.text(dss::kMissionTag);
+  const char* polarisation = summary.at(dss::kPolarisation);
+  info.Polarization = std::string(1, polarisation[0]) + "/" + std::string(1, polarisation[1]);
+  info.OrbitNumber = trimmed(summary.text(dss::kOrbitNumber));
 
-  smp.fc_hz = f.real(1212, 8) * 1000000000.0;
+  smp.fc_hz = summary.real(dss::kRadarFrequencyGHz) * 1000000000.0;
   if (!(smp.fc_hz > 0.0)) return ERS_FAIL(bad("radar frequency"), STATUS_BAD_PARAMETER);
-  smp.lambda_m = kSpeedOfLight / smp.fc_hz;
-  chirpCoefficient_ = f.real2(1366, 16);
+  smp.lambda_m = consts::kSpeedOfLight / smp.fc_hz;
+  chirpCoefficient_ = summary.realExp(dss::kChirpCoefficient);
   smp.Brg_hz = chirpCoefficient_;
-  const double rateMHz = f.real(1430, 16);
+  const double rateMHz = summary.real(dss::kSamplingRateMHz);
   if (!(rateMHz > 0.0)) return ERS_FAIL(bad("range sampling rate"), STATUS_BAD_PARAMETER);
   smp.frg_hz = rateMHz * 1000000.0;
   pulse.PulseSamplingRate = smp.frg_hz;
   smp.Trg_s = 1.0 / smp.frg_hz;
   roi.FastTimeDelta = smp.Trg_s;
-  (void)f.real(2486, 16);  // range time of the first pixel: not used
-  (void)f.real(1446, 16);
-  pulse.PulseLength = f.real(1462, 16) / 1000000.0;
+  pulse.PulseLength = summary.real(dss::kPulseLengthUs) / 1000000.0;
   if (!(pulse.PulseLength > 0.0)) return ERS_FAIL(bad("pulse length"), STATUS_BAD_PARAMETER);
   smp.Brg_hz = 2.0 * pulse.PulseLength * chirpCoefficient_;
   pulse.Bandwidth = smp.Brg_hz;
-  biasI_ = f.real(1538, 16);
-  biasQ_ = f.real(1554, 16);
+  biasI_ = summary.real(dss::kBiasI);
+  biasQ_ = summary.real(dss::kBiasQ);
   if (biasI_ < kAbsentBias) biasI_ = 0.0;
   if (biasQ_ < kAbsentBias) biasQ_ = 0.0;
-  const double prf = f.real(1654, 16);
+  const double prf = summary.real(dss::kPrf);
   if (!(prf > 0.0)) return ERS_FAIL(bad("PRF"), STATUS_BAD_PARAMETER);
   smp.prf_hz = prf;
   smp.brf_hz = prf;
   smp.pri_s = 1.0 / prf;
   roi.SlowTimeDelta = smp.pri_s;
-  info.AcquisitionStation = trimmed(f.text(1766, 16));
-  roi.FastTimeLength = f.real(2518, 16);  // provisional, replaced by the image pass
-  const double first = ascii2sec85(f.text(2534, 24));
-  const double last = ascii2sec85(f.text(2582, 24));
+  info.AcquisitionStation = trimmed(summary.text(dss::kFacility));
+  roi.FastTimeLength = summary.real(dss::kLastRangeTimeMs);  // provisional, replaced by the image pass
+  const double first = ascii2sec85(summary.text(dss::kFirstLineTime));
+  const double last = ascii2sec85(summary.text(dss::kLastLineTime));
   if (!(first > 0.0)) return ERS_FAIL(bad("time of the first line"), STATUS_BAD_PARAMETER);
   roi.SlowStartTime = first;
   rawData.swath.Acquisition_Start_Time = first;
   roi.SlowTimeLength = last - first;
 
   // State vectors of the platform position record.
-  const int count = f.integer(2746, 4);
-  const std::string year = f.text(2750, 4);
-  const int month = f.integer(2754, 4);
-  const int day = std::atoi(f.text(2760, 2).c_str());
-  const double secondsOfDay = f.real2(2766, 22);
-  const double interval = f.real2(2788, 22);
+  const int count = position.integer(ppr::kVectorCount);
+  const std::string year = position.text(ppr::kYear);
+  const int month = position.integer(ppr::kMonth);
+  const int day = std::atoi(position.text(ppr::kDayDigits).c_str());
+  const double secondsOfDay = position.realExp(ppr::kSecondsOfDay);
+  const double interval = position.realExp(ppr::kInterval);
   if (count < 1) return ERS_FAIL(bad("number of state vectors"), STATUS_BAD_PARAMETER);
-  if (!f.has(2992, count * kVectorBytes))
+  if (!position.has({ppr::kVectorComponent.offset, count * ppr::kVectorStride}))
     return ERS_FAIL("File reading failed! " + LeaFilename, STATUS_READ_FAILED);
   if (month < 1 || month > 12) return ERS_FAIL(bad("state vector month"), STATUS_BAD_PARAMETER);
   const double t0 = ascii2sec85(vectorStartText(day, month, year, secondsOfDay));
@@ -248,10 +226,12 @@ int ATERSExtractor::readLeader() {
   orbit.setLambda(smp.lambda_m);
   if (int st = orbit.SVCreate(t0, interval, count); st != 0) return ERS_CALLED(st);
   for (int k = 0; k < count; ++k) {
-    const long base = 2992 + long(k) * kVectorBytes;
+    const CeosField vector = ppr::kVectorComponent.element(k, ppr::kVectorStride);
     for (int j = 0; j < 3; ++j) {
-      orbit.pos[3 * std::size_t(k) + std::size_t(j)] = f.real2(base + 22 * j, 22);
-      orbit.vel[3 * std::size_t(k) + std::size_t(j)] = f.real2(base + 66 + 22 * j, 22);
+      orbit.pos[3 * std::size_t(k) + std::size_t(j)] =
+          position.realExp(vector.element(j, ppr::kComponentStride));
+      orbit.vel[3 * std::size_t(k) + std::size_t(j)] = position.realExp(
+          vector.element(j, ppr::kComponentStride).part(ppr::kVelocityOffset, ppr::kComponentStride));
     }
   }
   return 0;
@@ -266,8 +246,9 @@ int ATERSExtractor::readImage() {
   std::vector<char> descriptor(kImageDescriptor);
   if (!in.read(descriptor.data(), kImageDescriptor))
     return ERS_FAIL("File reading failed! " + ImgFilename, STATUS_READ_FAILED);
-  const int records = ch2int(descriptor.data() + 180, 6);
-  const int samples = ch2int(descriptor.data() + 248, 8);
+  const CeosRecord head(descriptor, 0);
+  const int records = head.integer(ers_image::descriptor::kRecordCount);
+  const int samples = head.integer(ers_image::descriptor::kSamples);
   if (records < 1 || samples < 1)
     return ERS_FAIL("Bad record count or line length in the image file " + ImgFilename,
                     STATUS_BAD_PARAMETER);
@@ -328,10 +309,10 @@ int ATERSExtractor::readImage() {
                         STATUS_READ_FAILED);
       break;
     }
-    const int number = static_cast<int>(be32(record.data() + 12));
+    const int number = static_cast<int>(ceosBE32(record.data(), ers_image::data::kLineNumber));
     const int missing = number != pos + 1 ? 1 : 0;
     missingLines_ += missing;
-    int code = be16(record.data() + 214);
+    int code = ceosBE16(record.data(), ers_image::data::kWindowStartCode);
     if (pos > 0 && std::abs(code - previousCode) > kMaxSwstJump) code = previousCode;
     previousCode = code;
     const float swst = static_cast<float>(code * kSwstStep + kSwstOffset + kRangeGateBias);

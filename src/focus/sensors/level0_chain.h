@@ -1,0 +1,21 @@
+#pragma once
+// Chain set-up shared by the focusers of single level-0 scenes.
+#include <string>
+
+struct SARFocuser_conf;
+struct FocuserWork;
+
+// Profile Memory of section "sarfocuserConfiguration" (256 when absent) and
+// the chain's configuration read from the profile with the fixed values of
+// single scenes. `announceDefault` reports the default at level 1.
+int configureLevel0Chain(SARFocuser_conf& conf, const std::string& profile, bool announceDefault);
+
+// Records of the extracted rasters into the work object (the antenna's only
+// with `withAntenna`).
+int readWorkRecords(FocuserWork& work, bool withAntenna);
+
+// True when the file opens for reading.
+bool fileOpens(const std::string& name);
+
+// The call-tree report; returns status.
+int level0CalledError(int status);

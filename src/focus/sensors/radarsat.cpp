@@ -1,0 +1,106 @@
+#include "focus/sensors/radarsat.h"
+
+#include "base/status.h"
+#include "diag/report.h"
+#include "focus/sensors/level0_chain.h"
+#include "focus/sensors/sensor_job.h"
+#include "output/general_sar_kelmir.h"
+
+namespace {
+
+constexpr char kRadarsatProfile[] = "parameters_RS.hdr";
+
+std::unique_ptr<stripmapGeneralFocuser> makeRadarsatFocuser() {
+  return std::make_unique<radarsatLevel0Focuser>();
+}
+
+// Scene, leader (optional) and orbit (required).
+int fillRadarsat(FocuserJobFields& job, stripmapGeneralFocuser* generic) {
+  auto& focuser = static_cast<radarsatLevel0Focuser&>(*generic);
+  fillScene(job, focuser);
+  focuser.leaderFilename = job.auxFile2;
+  if (job.auxFile1.empty())
+    return SENSOR_FAIL("Error in defining RADARSAT orbit file", STATUS_BAD_PARAMETER);
+  focuser.orbitFilename = job.auxFile1;
+  return 0;
+}
+
+int checkRadarsat(const FocuserJobFields&, const stripmapGeneralFocuser*) { return 0; }
+
+FinishingTag radarsatFinishingTag(const FocuserJobFields&, const std::vector<std::string>&) {
+  return {KT_RADARSAT, ""};
+}
+
+}  // namespace
+
+const SensorDriver kRadarsatSensor = {.platform = "RADARSAT",
+                                      .profile = fixedProfile<kRadarsatProfile>,
+                                      .makeFocuser = makeRadarsatFocuser,
+                                      .fill = fillRadarsat,
+                                      .check = checkRadarsat,
+                                      .eraseTemporary = eraseSingleSceneTemporaries,
+                                      .finishingTag = radarsatFinishingTag,
+                                      .family = "RADARSAT",
+                                      .auxiliaryInDescriptionFiles = false,
+                                      .multiFileProducts = false,
+                                      .multiFileGeoTiff = false};
+
+radarsatLevel0Focuser::radarsatLevel0Focuser() = default;
+radarsatLevel0Focuser::~radarsatLevel0Focuser() = default;
+
+int radarsatLevel0Focuser::nameStages() {
+  if (leaderFilename.empty()) {
+    ORV_REPORT("LEA filename not selected!", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  // The RADARSAT extractor is not part of this build.
+  ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
+  return STATUS_BAD_CONDITION;
+}
+
+int radarsatLevel0Focuser::initialize() {
+  if (int st = stripmapGeneralFocuser::initialize(); st != 0) return st;
+  if (int st = nameStages(); st != 0) return st;
+  if (int st = configureLevel0Chain(conf(), configurationFilename, false); st != 0) return st;
+  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
+  return 0;
+}
+
+int radarsatLevel0Focuser::initialize_modular() {
+  if (int st = stripmapGeneralFocuserModular::initialize_modular(); st != 0) return st;
+  if (int st = nameStages(); st != 0) return st;
+  if (int st = setConfFile(configurationFilename, 0); st != 0) return level0CalledError(st);
+  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
+  return 0;
+}
+
+int radarsatLevel0Focuser::ingestion(const std::string&, const std::string&,
+                                     const std::string&) {
+  if (outputSelected_) return STATUS_BAD_CONDITION;
+  return ingestion();
+}
+
+int radarsatLevel0Focuser::ingestion() {
+  ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
+  ORV_REPORT("RADARSAT extraction not available in this build", REPORT_ERROR);
+  return STATUS_BAD_CONDITION;
+}
+
+int radarsatLevel0Focuser::preprocessing() {
+  ORV_REPORT("RADARSAT focuser doesn't do anything in the preprocessor module",
+             REPORT_CHECKPOINT);
+  return 0;
+}
+
+int radarsatLevel0Focuser::postprocessing() {
+  ORV_REPORT("RADARSAT focuser doesn't do anything in the postprocessor module",
+             REPORT_CHECKPOINT);
+  return 0;
+}
+
+int radarsatLevel0Focuser::finalize() {
+  ORV_REPORT("finalized...", REPORT_CHECKPOINT);
+  return 0;
+}
+
+int radarsatLevel0Focuser::finalize_modular() { return finalize(); }

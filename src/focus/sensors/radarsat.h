@@ -1,0 +1,32 @@
+#pragma once
+// RADARSAT-1: the focuser of a level-0 scene and the sensor's line of the
+// registry. The RADARSAT extractor is not part of this build, so the focuser
+// stops at its stages with a report.
+#include <string>
+
+#include "focus/sensor_registry.h"
+#include "focus/stripmap_general_focuser.h"
+
+class radarsatLevel0Focuser : public stripmapGeneralFocuserModular {
+ public:
+  radarsatLevel0Focuser();
+  ~radarsatLevel0Focuser() override;
+
+  int initialize() override;
+  int finalize() override;
+  int ingestion(const std::string& raw, const std::string& chirp,
+                const std::string& antenna) override;
+  int ingestion() override;
+  int preprocessing() override;
+  int postprocessing() override;
+  int initialize_modular() override;
+  int finalize_modular() override;
+
+  std::string leaderFilename;
+
+ private:
+  int nameStages();
+};
+
+// The registry line of "RADARSAT".
+extern const SensorDriver kRadarsatSensor;

@@ -1,0 +1,40 @@
+#include "focus/sensors/sensor_job.h"
+
+#include <cstdio>
+
+#include "diag/report.h"
+#include "focus/stripmap_general_focuser.h"
+
+void fillScene(const FocuserJobFields& job, stripmapGeneralFocuser& focuser) {
+  focuser.level0Filename = job.level0Filename;
+  focuser.skipLines = job.skipLines;
+  focuser.extractLines = job.extractLines;
+  if (auto* modular = dynamic_cast<stripmapGeneralFocuserModular*>(&focuser))
+    modular->Memory = job.Memory;
+}
+
+int sensorFail(const std::string& message, int status, int line, const char* function) {
+  orv_add_report(message, REPORT_ERROR, line, function, __FILE__);
+  return status;
+}
+
+int sensorCalled(int status, int line, const char* function) {
+  orv_add_report("Called function returned ERROR", REPORT_ERROR_CALL_TREE, line, function,
+                 __FILE__);
+  return status;
+}
+
+bool removeTemporaryFile(const std::string& name) {
+  if (std::remove(name.c_str()) == 0) return true;
+  ORV_REPORT("Cannot remove file", REPORT_WARNING);
+  return false;
+}
+
+void removeTemporaryFiles(const std::string& root, std::initializer_list<const char*> suffixes) {
+  for (const char* suffix : suffixes) removeTemporaryFile(root + suffix);
+}
+
+void eraseSingleSceneTemporaries(const FocuserJobFields& job) {
+  removeTemporaryFiles(job.outputFilename, {".chirp", ".extracted", ".chirp.hdr", ".extracted.hdr",
+                                            ".rgfoc", ".rgfoc.hdr"});
+}
