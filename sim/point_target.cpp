@@ -4,6 +4,8 @@
 #include <cmath>
 #include <cstring>
 
+#include "base/constants.h"
+
 namespace {
 
 double toDb(double ratio) { return ratio > 0.0 ? 10.0 * std::log10(ratio) : -999.0; }
@@ -82,9 +84,9 @@ PtaResult measure(const std::vector<cdouble>& win, int n, double expectedPhase, 
   const double p0 = std::arg(at(bi, bj));
   const double si = std::arg(at(bi + 1, bj) * std::conj(at(bi - 1, bj))) / 2.0;
   const double sj = std::arg(at(bi, bj + 1) * std::conj(at(bi, bj - 1))) / 2.0;
-  r.phase = std::remainder(p0 + di * si + dj * sj, 2.0 * M_PI);
+  r.phase = std::remainder(p0 + di * si + dj * sj, 2.0 * consts::kPi);
   r.expectedPhase = expectedPhase;
-  r.phaseError = std::remainder(r.phase - expectedPhase, 2.0 * M_PI);
+  r.phaseError = std::remainder(r.phase - expectedPhase, 2.0 * consts::kPi);
   std::vector<double> az(nu), rg(nu);
   for (int k = 0; k < nu; ++k) {
     az[k] = std::norm(at(k, bj));
@@ -129,7 +131,7 @@ IrMetrics profileMetrics(const std::vector<double>& p, double step, int peak) {
   return m;
 }
 
-double WindowSpec::weight(double u) const { return alpha + (1.0 - alpha) * std::cos(2.0 * M_PI * u); }
+double WindowSpec::weight(double u) const { return alpha + (1.0 - alpha) * std::cos(2.0 * consts::kPi * u); }
 
 IrMetrics theoreticalMetrics(const WindowSpec& w, int extent, int upsample) {
   const int n = extent * upsample;
@@ -142,8 +144,8 @@ IrMetrics theoreticalMetrics(const WindowSpec& w, int extent, int upsample) {
     double re = 0.0, im = 0.0;
     for (int k = 0; k <= q; ++k) {
       const double u = -0.5 + static_cast<double>(k) / q;
-      re += wt[k] * std::cos(2.0 * M_PI * u * x);
-      im += wt[k] * std::sin(2.0 * M_PI * u * x);
+      re += wt[k] * std::cos(2.0 * consts::kPi * u * x);
+      im += wt[k] * std::sin(2.0 * consts::kPi * u * x);
     }
     p[i] = re * re + im * im;
   }

@@ -4,6 +4,8 @@
 #include <stdexcept>
 #include <utility>
 
+#include "base/constants.h"
+
 bool isPowerOfTwo(int n) { return n > 0 && (n & (n - 1)) == 0; }
 
 int nextPowerOfTwo(int n) {
@@ -21,7 +23,7 @@ void simFft(cdouble* a, int n, int sign) {
     if (i < j) std::swap(a[i], a[j]);
   }
   for (int len = 2; len <= n; len <<= 1) {
-    const double ang = sign * 2.0 * M_PI / len;
+    const double ang = sign * 2.0 * consts::kPi / len;
     const int half = len / 2;
     for (int k = 0; k < half; ++k) {
       const cdouble w(std::cos(ang * k), std::sin(ang * k));

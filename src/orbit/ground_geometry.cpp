@@ -534,7 +534,7 @@ void xyz2geo(const double xyz[3], double latlon[2], double a, double b) {
   const double th = std::atan(z * a / (p * b));
   const double ct = std::cos(th), st = std::sin(th);
   // The fixed equatorial radius (not a) is part of the formula.
-  double d = p - ct * ct * ct * (1.0 - b * b / (a * a)) * 6378137.0;
+  double d = p - ct * ct * ct * (1.0 - b * b / (a * a)) * consts::kWgs84A;
   if (p == 0.0) d = 0.0;  // polar axis
   if (d == 0.0)
     latlon[0] = (z > 0.0) ? consts::kPi / 2.0 : -consts::kPi / 2.0;
@@ -568,7 +568,7 @@ void geo2cart(double xyz[3], const double llh[3]) {
   const double e2 = 0.006739496742276434;
   const double lat = llh[0], lon = llh[1], h = llh[2];
   const double cl = std::cos(lat);
-  const double N = 6378137.0 * std::sqrt(1.0067394967422765) / std::sqrt(1.0 + e2 * cl * cl);
+  const double N = consts::kWgs84A * std::sqrt(1.0067394967422765) / std::sqrt(1.0 + e2 * cl * cl);
   xyz[0] = (N + h) * cl * std::cos(lon);
   xyz[1] = (N + h) * cl * std::sin(lon);
   xyz[2] = (0.9933056200098587 * N + h) * std::sin(lat);
