@@ -4,16 +4,19 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cmath>
+#include <cstdlib>
 
-#include "e2e_support.h"
 #include "product/general_sar.h"
+#include "sim/raw_scene.h"
+#include "support/files.h"
 
-using namespace e2e;
+using namespace support;
 
 TEST(Demo, QuicklookShowsTheFiveTargetsOnClutter) {
   if (std::system("command -v gdal_translate > /dev/null 2>&1") != 0)
     GTEST_SKIP() << "gdal_translate not installed (scripts/install-deps.sh installs gdal-bin)";
-  Folder dir("demo");
+  TempFolder dir("demo");
   const std::string demo = dir / "demo";
   const std::string command = "bash '" TESSIVOR_SOURCE_DIR "/scripts/demo.sh' '" TESSIVOR_BINARY_DIR "' '" +
                               demo + "' > '" + (dir / "demo.txt") + "' 2>&1";

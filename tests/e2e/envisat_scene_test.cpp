@@ -4,12 +4,16 @@
 // simulator's truth; and a folder without a valid instrument file.
 #include <gtest/gtest.h>
 
-#include "e2e_support.h"
+#include <algorithm>
+#include <fstream>
+
 #include "product/general_sar.h"
 #include "sim/envisat_aux_writer.h"
-#include "sim/envisat_level0_writer.h"
+#include "support/files.h"
+#include "support/host_run.h"
+#include "support/point_targets.h"
 
-using namespace e2e;
+using namespace support;
 
 namespace {
 
@@ -17,28 +21,13 @@ constexpr int kLines = 4608;
 constexpr int kSamples = 5600;  // a full IS2 window
 constexpr double kDoppler = 300.0;
 
-// The example orbit with the ASAR instrument in swath IS2.
+// The example orbit with the ASAR instrument in swath IS2, targets across
+// the window and along the lines that the azimuth overlap keeps.
 SceneDescription asarScene(const AsarSimConfig& cfg, int lines, int samples) {
-  SceneDescription s = ersScene(lines, samples, kDoppler);
-  s.orbitNumber = cfg.absoluteOrbit;
-  applyAsarInstrument(cfg, s);
-  // Across the window and along the lines that the azimuth overlap keeps.
+  SceneDescription s = envisatScene(cfg, lines, samples, kDoppler);
   s.pixelTargets = {{1800.5, 350.25, 0.0, 4.0},   {2450.0, 1500.5, 80.0, 4.0}, {2050.25, 2700.0, 0.0, 4.0},
                     {2750.75, 3800.5, 150.0, 4.0}, {2250.0, 4700.75, 0.0, 4.0}};
   return s;
-}
-
-// The 24 parameters of an ENVISAT job whose auxiliary files are searched
-// in folders (orbit; ASA_INS, ASA_XCA, ASA_XCH).
-std::vector<std::string> envisatJob(const AsarSceneFiles& f, const std::string& outputRoot) {
-  std::vector<std::string> p(24, "NotOK");
-  p[0] = "ENVISAT";
-  p[1] = f.level0;
-  p[5] = outputRoot;
-  p[11] = f.orbitDir;
-  p[12] = p[13] = p[14] = f.auxDir;
-  p[16] = p[17] = p[20] = p[21] = p[23] = "0";
-  return p;
 }
 
 // A file that the type tests and the validity search take for `prefix`
@@ -51,20 +40,19 @@ void decoy(const std::string& folder, const std::string& prefix, double generati
 }  // namespace
 
 TEST(EnvisatEndToEnd, ImageModeSceneWithLostPacketsFocusedWithinTheImageQualityBounds) {
-  Folder dir("asar_im");
+  TempFolder dir("asar_im");
   AsarSimConfig cfg;
   SceneDescription scene = asarScene(cfg, kLines, kSamples);
   for (int k = 0; k < 20; ++k) scene.dropLines.push_back(300 + 210 * k);  // 20 lost packets
-  const RawSceneSimulator sim(scene);
-  AsarSceneFiles files;
+  SensorScene files;
   std::string error;
-  ASSERT_EQ(writeEnvisatScene(sim, cfg, dir / "sim", &files, error), 0) << error;
+  ASSERT_TRUE(simulateEnvisat(scene, cfg, dir.str(), files, error)) << error;
   // Other generations in the same folders: an older one valid at the
   // sensing time and a later one that is not valid yet; neither may win.
   const double t = scene.startTime, day = 86400.0;
   for (const char* prefix : {"ASA_INS_AXVIEC", "ASA_XCA_AXVIEC", "ASA_XCH_AXVIEC"}) {
-    decoy(files.auxDir, prefix, t - 90 * day, t - 400 * day, t + 400 * day);
-    decoy(files.auxDir, prefix, t - 5 * day, t + 2 * day, t + 400 * day);
+    decoy(files["aux_dir"], prefix, t - 90 * day, t - 400 * day, t + 400 * day);
+    decoy(files["aux_dir"], prefix, t - 5 * day, t + 2 * day, t + 400 * day);
   }
 
   writeJob(dir / "job.txt", envisatJob(files, dir / "out"));
@@ -82,23 +70,22 @@ TEST(EnvisatEndToEnd, ImageModeSceneWithLostPacketsFocusedWithinTheImageQualityB
   ASSERT_GT(record.roi.roi.Samples, 4500);
   EXPECT_EQ(record.dataSetInfo.Swath, "IS2");
 
-  const PtaReport pta = analyseProduct(dir.str(), product, store, dir / "sim/truth.txt");
+  const PtaReport pta = analyseProduct(dir.str(), product, store, files.truth);
   ASSERT_EQ(pta.exitStatus, 0) << pta.table;
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
-  expectTargetsAtTruth(pta);
-  expectCornersOnTheGround(record, sim, dir / "sim/truth.txt");
+  expectTruthPositions(pta);
+  expectCornersOnTheGround(record, RawSceneSimulator(scene), files.truth);
 }
 
 TEST(EnvisatEndToEnd, FolderWithoutAValidInstrumentFileEndsWithItsCode) {
-  Folder dir("asar_noins");
+  TempFolder dir("asar_noins");
   AsarSimConfig cfg;
   const SceneDescription scene = asarScene(cfg, 600, 1024);
-  const RawSceneSimulator sim(scene);
-  AsarSceneFiles files;
+  SensorScene files;
   std::string error;
-  ASSERT_EQ(writeEnvisatScene(sim, cfg, dir / "sim", &files, error), 0) << error;
-  fs::remove(files.ins);
-  decoy(files.auxDir, "ASA_INS_AXVIEC", scene.startTime, scene.startTime + 86400.0, scene.startTime + 9e6);
+  ASSERT_TRUE(simulateEnvisat(scene, cfg, dir.str(), files, error)) << error;
+  fs::remove(files["ins"]);
+  decoy(files["aux_dir"], "ASA_INS_AXVIEC", scene.startTime, scene.startTime + 86400.0, scene.startTime + 9e6);
   writeJob(dir / "job.txt", envisatJob(files, dir / "out"));
   const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   EXPECT_EQ(run.errorCode, EC_INS_MISSING) << run.errorFile << run.log;
@@ -125,17 +112,16 @@ std::vector<double> clutterProfileDb(const std::string& product, int lines, int 
 }
 
 TEST(EnvisatEndToEnd, AlternatingPolarisationSceneGivesBothChannelsDescalloped) {
-  Folder dir("asar_ap");
+  TempFolder dir("asar_ap");
   AsarSimConfig cfg;
   cfg.mode = "APH";
   SceneDescription scene = asarScene(cfg, kLines, 2048);
   // Targets in the near half; the far half holds clutter only.
   scene.pixelTargets = {{2100.25, 300.5, 0.0, 4.0}, {2300.0, 500.25, 60.0, 4.0}};
   scene.clutterSigma = 2.0;
-  const RawSceneSimulator sim(scene);
-  AsarSceneFiles files;
+  SensorScene files;
   std::string error;
-  ASSERT_EQ(writeEnvisatScene(sim, cfg, dir / "sim", &files, error), 0) << error;
+  ASSERT_TRUE(simulateEnvisat(scene, cfg, dir.str(), files, error)) << error;
   writeJob(dir / "job.txt", envisatJob(files, dir / "out"));
   const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   ASSERT_EQ(run.exitStatus, 0) << run.log << run.stderrText;
@@ -149,12 +135,12 @@ TEST(EnvisatEndToEnd, AlternatingPolarisationSceneGivesBothChannelsDescalloped) 
     GeneralSAR record;
     ASSERT_EQ(record.GSread(store), 0) << run.trace;
     const ROI_Obj& roi = record.roi.roi;
-    const PtaReport pta = analyseProduct(dir.str(), product, store, dir / "sim/truth.txt");
+    const PtaReport pta = analyseProduct(dir.str(), product, store, files.truth);
     ASSERT_EQ(pta.exitStatus, 0) << pta.table;
     int found = 0;
     for (const PtaTarget& t : pta.targets) found += t.found ? 1 : 0;
     EXPECT_GE(found, 1) << pta.table;
-    expectTargetsAtTruth(pta);
+    expectTruthPositions(pta);
     // De-scalloped: the clutter power does not follow the bursts.
     ASSERT_GT(roi.Samples, 1100);
     const std::vector<double> profile = clutterProfileDb(product, roi.Lines, roi.Samples, 800);

@@ -5,14 +5,17 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cmath>
 #include <cstdio>
+#include <fstream>
 #include <memory>
 
 #include "core/stripmlook.h"
-#include "e2e_support.h"
 #include "product/general_sar.h"
+#include "support/files.h"
+#include "support/host_run.h"
 
-using namespace e2e;
+using namespace support;
 
 namespace {
 
@@ -50,10 +53,10 @@ double dB(double ratio) { return 10.0 * std::log10(ratio); }
 
 TEST(ErsProducts, GeoTiffKmlEnviAndMultilookOfAFocusedScene) {
   if (!haveGdal()) GTEST_SKIP() << "gdalinfo not installed (scripts/install-deps.sh installs gdal-bin)";
-  Folder dir("mlgeo");
-  SceneFiles files;
+  TempFolder dir("mlgeo");
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(pointScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(pointScene(), dir.str(), files, error)) << error;
   std::vector<std::string> p = ersJob(files, dir / "out");
   p[18] = "1";
   p[22] = "OK";
@@ -189,21 +192,23 @@ TEST(ErsProducts, GeoTiffKmlEnviAndMultilookOfAFocusedScene) {
 }
 
 TEST(ErsProducts, HostStopDuringGeoTiffStepEndsWith326400) {
-  Folder dir("tiffstop");
-  SceneFiles files;
+  TempFolder dir("tiffstop");
+  SensorScene files;
   std::string error;
-  ASSERT_TRUE(simulate(pointScene(), dir.str(), files, error)) << error;
+  ASSERT_TRUE(simulateErs(pointScene(), dir.str(), files, error)) << error;
   std::vector<std::string> p = ersJob(files, dir / "out");
   p[22] = "OK";
   writeJob(dir / "job.txt", p);
   bool written = false;
   // The description header is exported just before the GeoTIFF step; the
   // host stops the run as soon as it is there.
-  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt", [&](const std::string& file, const std::string&) {
+  RunOptions host;
+  host.hook = [&](const RunningFocuser& running) {
     if (written || !fs::exists(dir / "out_slc_hdr")) return;
-    writeText(file, "101\nstop\n");
+    writeText(running.folder + "progress.txt", "101\nstop\n");
     written = true;
-  });
+  };
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt", host);
   ASSERT_TRUE(written) << run.trace;
   EXPECT_EQ(run.exitStatus, EC_INTERRUPTED & 0xFF);
   EXPECT_EQ(run.errorCode, 326400) << run.errorFile;

@@ -4,8 +4,6 @@
 // corners), and a host stop during azimuth focusing ends the run.
 #include <gtest/gtest.h>
 
-#include <set>
-
 #include "support/files.h"
 #include "support/host_run.h"
 #include "support/point_targets.h"
@@ -29,19 +27,6 @@ SceneDescription fullSwathScene(double doppler = kDoppler) {
                     {1900.5, 3600.75, 50.0, 4.0},
                     {2700.0, 4600.5, 0.0, 4.0}};
   return s;
-}
-
-// Value of a key of the truth file's [Scene] section.
-double truthValue(const std::string& truthFile, const std::string& key) {
-  SimIni ini;
-  std::string error;
-  if (!ini.load(truthFile, error)) return std::nan("");
-  return ini.getDouble("Scene", key, std::nan(""));
-}
-
-// Distance between two points on the ellipsoid, metres.
-double groundDistance(double lat1, double lon1, double lat2, double lon2) {
-  return norm(geodeticToEcef(lat1, lon1, 0.0) - geodeticToEcef(lat2, lon2, 0.0));
 }
 
 }  // namespace
@@ -99,40 +84,8 @@ TEST(ErsEndToEnd, FullSwathSceneFocusedWithinTheImageQualityBounds) {
   EXPECT_NEAR(centroid, kDoppler, 0.02 * prf);
   EXPECT_EQ(std::lround((centroid - kDoppler) / prf), 0);
 
-  // Corners: each within 30 m of the ground point that the corner pixel
-  // shows (zero Doppler, on the ellipsoid).
-  const double offset = truthValue(files.truth, "range_peak_offset_samples");
-  const double c = 299792458.0;
-  const double t0 = roi.SlowStartTime, t1 = t0 + roi.SlowTimeDelta * roi.Lines;
-  const double r0 = roi.FastStartTime - offset * roi.FastTimeDelta;
-  const double r1 = r0 + roi.FastTimeDelta * roi.Samples;
-  struct Corner {
-    double lat, lon;
-  };
-  std::vector<Corner> truth;
-  for (double t : {t0, t1})
-    for (double r : {r0, r1}) {
-      Corner k{};
-      ASSERT_TRUE(zeroDopplerPoint(sim.orbit(), t, r * c / 2.0, 0.0, scene.lookSign, k.lat, k.lon));
-      truth.push_back(k);
-    }
-  const geoCoords_Obj& corners = record.geoCoords;
-  std::set<int> matched;
-  for (const geopoint* g : {&corners.NW, &corners.NE, &corners.SW, &corners.SE}) {
-    int best = -1;
-    double bestDistance = 1e30;
-    for (int k = 0; k < 4; ++k) {
-      const double d = groundDistance(g->lat, g->lon, truth[k].lat, truth[k].lon);
-      if (d < bestDistance) bestDistance = d, best = k;
-    }
-    EXPECT_LT(bestDistance, 30.0) << g->lat << " " << g->lon;
-    matched.insert(best);
-  }
-  EXPECT_EQ(matched.size(), 4u);
-  Corner centre{};
-  ASSERT_TRUE(zeroDopplerPoint(sim.orbit(), 0.5 * (t0 + t1), 0.5 * (r0 + r1) * c / 2.0, 0.0,
-                               scene.lookSign, centre.lat, centre.lon));
-  EXPECT_LT(groundDistance(corners.center.lat, corners.center.lon, centre.lat, centre.lon), 30.0);
+  // Corners and centre on the ground that their pixels show.
+  expectCornersOnTheGround(record, sim, files.truth);
 }
 
 TEST(ErsEndToEnd, HostStopDuringAzimuthFocusingEndsWith326400) {

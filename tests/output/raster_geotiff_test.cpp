@@ -62,7 +62,7 @@ bool contains(const std::string& text, const std::string& part) { return text.fi
 }  // namespace
 
 TEST(RasterFile, BigEndianLayoutAndStatisticsWithoutNullAndDummyCells) {
-  const std::string dir = support::scratchDir("raster");
+  const std::string dir = support::scratchDir("output");
   const std::string name = dir + "cplx";
   // 3 lines of 4 short-complex cells, big-endian, 10 header bytes, rows with
   // 3 prefix and 5 suffix bytes, a 7-byte footer.
@@ -128,7 +128,7 @@ TEST(RasterFile, BigEndianLayoutAndStatisticsWithoutNullAndDummyCells) {
 }
 
 TEST(RasterFile, OnlyNullCellsFailWithTheStatisticsMessage) {
-  const std::string dir = support::scratchDir("raster");
+  const std::string dir = support::scratchDir("output");
   const std::string name = dir + "empty";
   writeFloatRaster(name, 6, 5, [](int, int) { return 0.0f; });
   auto h = rasterHeader(6, 5, "FLOAT32");
@@ -144,7 +144,7 @@ TEST(RasterFile, OnlyNullCellsFailWithTheStatisticsMessage) {
 TEST(RasterFile, TiffProductsAsGdalReadsThem) {
   if (std::system("command -v gdalinfo > /dev/null 2>&1") != 0)
     GTEST_SKIP() << "gdalinfo not installed (scripts/install-deps.sh installs gdal-bin)";
-  const std::string dir = support::scratchDir("raster");
+  const std::string dir = support::scratchDir("output");
   const std::string name = dir + "geo";
   writeFloatRaster(name, 20, 30, [](int l, int s) { return 1.0f + l + 0.5f * s; }, true);
   auto h = rasterHeader(20, 30, "FLOAT32");
@@ -238,7 +238,7 @@ TEST(RasterFile, MapKeyFailuresNameTheField) {
   ASSERT_EQ(ReadMapKeys(h, keys, error), 0);
   EXPECT_EQ(keys.Zone, 31);
   // A projected state needs the map list of the map folder.
-  const std::string dir = support::scratchDir("raster");
+  const std::string dir = support::scratchDir("output");
   setenv("TESSIVOR_MAP_FILES_DIR", dir.c_str(), 1);
   h.getField("CartographicSystem.State")->setString("LAMBERT72");
   EXPECT_EQ(ReadMapKeys(h, keys, error), 9);

@@ -35,6 +35,14 @@ Job ersJob(const SensorScene& scene, const std::string& outputRoot) {
   return p;
 }
 
+Job envisatJob(const SensorScene& scene, const std::string& outputRoot) {
+  Job p = basicJob("ENVISAT", scene["image"], outputRoot);
+  p[11] = scene["orbit_dir"];
+  p[12] = p[13] = p[14] = scene["aux_dir"];
+  p[20] = p[21] = p[23] = "0";
+  return p;
+}
+
 void writeJob(const std::string& file, const Job& job) {
   std::string text = "stripmap focusing job\n";
   for (const auto& p : job) text += p + "\n";

@@ -22,6 +22,9 @@ using Job = std::vector<std::string>;
 Job basicJob(const std::string& platform, const std::string& scene, const std::string& outputRoot);
 // The job of a simulated ERS scene with its orbit arc and leader given.
 Job ersJob(const SensorScene& scene, const std::string& outputRoot);
+// The job of a simulated ENVISAT scene whose orbit and auxiliary files
+// (ASA_INS, ASA_XCA, ASA_XCH) are searched in their folders.
+Job envisatJob(const SensorScene& scene, const std::string& outputRoot);
 // A job file: an ignored first line, then one parameter a line.
 void writeJob(const std::string& file, const Job& job);
 

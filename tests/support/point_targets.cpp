@@ -7,9 +7,13 @@
 #include <cstdlib>
 #include <numbers>
 #include <regex>
+#include <set>
 #include <sstream>
 
 #include "files.h"
+#include "product/general_sar.h"
+#include "scenes.h"
+#include "sim/sim_geometry.h"
 
 namespace support {
 
@@ -105,6 +109,50 @@ void expectTruthPositions(const PtaReport& pta, double lineShift, bool phases) {
   if (phases) {
     EXPECT_LT(phaseSpread(errors) * 180.0 / std::numbers::pi, bars::kPhaseDeg) << pta.table;
   }
+}
+
+double groundDistance(double lat1, double lon1, double lat2, double lon2) {
+  return norm(geodeticToEcef(lat1, lon1, 0.0) - geodeticToEcef(lat2, lon2, 0.0));
+}
+
+void expectCornersOnTheGround(const GeneralSAR& record, const RawSceneSimulator& sim, const std::string& truthFile) {
+  const ROI_Obj& roi = record.roi.roi;
+  // The record's first range time is that of the compressed peak; the
+  // ground a pixel shows lies at the two-way delay before the peak offset.
+  const double offset = truthValue(truthFile, "range_peak_offset_samples");
+  ASSERT_FALSE(std::isnan(offset)) << "no range peak offset in " << truthFile;
+  const double c = 299792458.0;
+  const double t0 = roi.SlowStartTime, t1 = t0 + roi.SlowTimeDelta * roi.Lines;
+  const double r0 = roi.FastStartTime - offset * roi.FastTimeDelta;
+  const double r1 = r0 + roi.FastTimeDelta * roi.Samples;
+  const int lookSign = sim.scene().lookSign;
+  struct Corner {
+    double lat, lon;
+  };
+  std::vector<Corner> truth;
+  for (double t : {t0, t1})
+    for (double r : {r0, r1}) {
+      Corner k{};
+      ASSERT_TRUE(zeroDopplerPoint(sim.orbit(), t, r * c / 2.0, 0.0, lookSign, k.lat, k.lon));
+      truth.push_back(k);
+    }
+  const geoCoords_Obj& corners = record.geoCoords;
+  std::set<int> matched;
+  for (const geopoint* g : {&corners.NW, &corners.NE, &corners.SW, &corners.SE}) {
+    int best = -1;
+    double bestDistance = 1e30;
+    for (int k = 0; k < 4; ++k) {
+      const double d = groundDistance(g->lat, g->lon, truth[k].lat, truth[k].lon);
+      if (d < bestDistance) bestDistance = d, best = k;
+    }
+    EXPECT_LT(bestDistance, bars::kCornerMetres) << g->lat << " " << g->lon;
+    matched.insert(best);
+  }
+  EXPECT_EQ(matched.size(), 4u);
+  Corner centre{};
+  ASSERT_TRUE(zeroDopplerPoint(sim.orbit(), 0.5 * (t0 + t1), 0.5 * (r0 + r1) * c / 2.0, 0.0, lookSign, centre.lat,
+                               centre.lon));
+  EXPECT_LT(groundDistance(corners.center.lat, corners.center.lon, centre.lat, centre.lon), bars::kCornerMetres);
 }
 
 double phaseSpread(const std::vector<double>& phases) {

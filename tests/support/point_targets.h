@@ -9,6 +9,9 @@
 #include "base/fcomplex.h"
 #include "sim/point_target.h"
 
+class GeneralSAR;
+class RawSceneSimulator;
+
 namespace support {
 
 // Bars of a focused point target against the theory of the product's windows.
@@ -19,6 +22,7 @@ constexpr double kIslrDb = 1.0;           // |ISLR - theory|
 constexpr double kPositionPixels = 0.05;  // peak against the zero-Doppler truth
 constexpr double kPhaseDeg = 5.0;         // peak phases about their common value
 constexpr double kProductPixels = 0.1;    // product peak against the simulator's truth
+constexpr double kCornerMetres = 30.0;    // product corners against the ground they show
 }  // namespace bars
 
 struct PtaTarget {
@@ -47,6 +51,14 @@ void expectTheoreticalResponses(const PtaReport& pta, std::size_t targets);
 // `lineShift` lines); with `phases`, the peak phase errors within kPhaseDeg
 // of their common value.
 void expectTruthPositions(const PtaReport& pta, double lineShift = 0.0, bool phases = true);
+
+// Corners and centre of a focused product's record: each within kCornerMetres
+// of the ground point that its pixel shows (zero Doppler, on the ellipsoid,
+// seen from the simulator's orbit), the four corners matched one to one.
+void expectCornersOnTheGround(const GeneralSAR& record, const RawSceneSimulator& sim, const std::string& truthFile);
+
+// Distance between two points on the ellipsoid, metres.
+double groundDistance(double lat1, double lon1, double lat2, double lon2);
 
 // Spread of angles around their circular mean, radians.
 double phaseSpread(const std::vector<double>& phases);

@@ -57,6 +57,39 @@ bool simulateErs(const SceneDescription& scene, const std::string& folder, Senso
   }
 }
 
+SceneDescription envisatScene(const AsarSimConfig& cfg, int lines, int samples, double dopplerHz) {
+  SceneDescription s = ersScene(lines, samples, dopplerHz);
+  s.orbitNumber = cfg.absoluteOrbit;
+  applyAsarInstrument(cfg, s);
+  return s;
+}
+
+bool simulateEnvisat(const SceneDescription& scene, const AsarSimConfig& cfg, const std::string& folder,
+                     SensorScene& out, std::string& error) {
+  try {
+    const RawSceneSimulator sim(scene);
+    AsarSceneFiles files;
+    out = SensorScene{};
+    out.root = folder + "sim";
+    out.truth = out.root + "/truth.txt";
+    if (writeEnvisatScene(sim, cfg, out.root, &files, error) != 0) return false;
+    out.files = {{"image", files.level0}, {"ins", files.ins},         {"xca", files.xca},
+                 {"xch", files.xch},      {"orbit", files.orbit},     {"aux_dir", files.auxDir},
+                 {"orbit_dir", files.orbitDir}};
+    return true;
+  } catch (const std::exception& e) {
+    error = e.what();
+    return false;
+  }
+}
+
+double truthValue(const std::string& truthFile, const std::string& key) {
+  SimIni ini;
+  std::string error;
+  if (!ini.load(truthFile, error)) return std::nan("");
+  return ini.getDouble("Scene", key, std::nan(""));
+}
+
 namespace clutter {
 
 namespace {

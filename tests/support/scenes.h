@@ -21,6 +21,7 @@
 #include "core/fft.h"
 #include "core/range_focus.h"
 #include "doppler/dc_state.h"
+#include "sim/envisat_level0_writer.h"
 #include "sim/raw_scene.h"
 
 namespace support {
@@ -46,6 +47,20 @@ SensorScene ersSceneFiles(const RawSceneSimulator& sim, const std::string& folde
 // folder) under folder/sim. false with the message on failure.
 bool simulateErs(const SceneDescription& scene, const std::string& folder, SensorScene& out,
                  std::string& error);
+
+// The example orbit with the ASAR instrument of `cfg` (mode, swath, codes,
+// absolute orbit).
+SceneDescription envisatScene(const AsarSimConfig& cfg, int lines, int samples, double dopplerHz);
+// Writes an ENVISAT scene under folder/sim: the level-0 product, the
+// instrument and calibration files in one folder, the DORIS orbit in
+// another. Roles: "image", "ins", "xca", "xch", "orbit", "aux_dir",
+// "orbit_dir". false with the message on failure.
+bool simulateEnvisat(const SceneDescription& scene, const AsarSimConfig& cfg, const std::string& folder,
+                     SensorScene& out, std::string& error);
+
+// Value of a key of the [Scene] section of a truth file; NaN when the file
+// or the key is missing.
+double truthValue(const std::string& truthFile, const std::string& key);
 
 // ---- raw range lines ----------------------------------------------------
 
