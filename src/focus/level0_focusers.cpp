@@ -6,6 +6,7 @@
 #include "base/status.h"
 #include "diag/report.h"
 #include "ingest/ers_extractor.h"
+#include "ingest/radarsat/radarextract.h"
 #include "product/profile.h"
 
 namespace {
@@ -209,7 +210,7 @@ int envisatLevel0Focuser::postprocessing() {
 
 // ---- RADARSAT --------------------------------------------------------------------
 
-radarsatLevel0Focuser::radarsatLevel0Focuser() = default;
+radarsatLevel0Focuser::radarsatLevel0Focuser() : extractor_(std::make_unique<radarextract>()) {}
 radarsatLevel0Focuser::~radarsatLevel0Focuser() = default;
 
 int radarsatLevel0Focuser::nameStages() {
@@ -217,9 +218,33 @@ int radarsatLevel0Focuser::nameStages() {
     ORV_REPORT("LEA filename not selected!", REPORT_ERROR);
     return 1;
   }
-  // The RADARSAT extractor is not part of this build.
-  ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
-  return 1;
+  if (!extractor_) {
+    ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
+    return 1;
+  }
+  if (!opens(leaderFilename)) {
+    ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
+    return 1;
+  }
+  work.rawFile = outputFilename + ".extracted";
+  work.chirpFile = outputFilename + ".chirp";
+  work.antennaFile.clear();
+  work.rgfocFile = outputFilename + ".rgfoc";
+  work.outputFile = outputFilename;
+  radarextract& x = *extractor_;
+  x.DataFile = level0Filename;
+  x.LeaderFile = leaderFilename;
+  x.OrbitFile = orbitFilename;
+  x.OutputRawFile = work.rawFile;
+  x.OutputChirpFile = work.chirpFile;
+  x.LinesToExtract = extractLines;
+  x.LinesToSkip = skipLines;
+  SARFocuser& f = focuser();
+  f.RawDataFile = work.rawFile;
+  f.ChirpFile = work.chirpFile;
+  f.AntennaFile = "antenna not exist";
+  f.OutputFilename = outputFilename;
+  return 0;
 }
 
 int radarsatLevel0Focuser::initialize() {
@@ -238,16 +263,26 @@ int radarsatLevel0Focuser::initialize_modular() {
   return 0;
 }
 
-int radarsatLevel0Focuser::ingestion(const std::string&, const std::string&,
+int radarsatLevel0Focuser::ingestion(const std::string& raw, const std::string& chirp,
                                      const std::string&) {
   if (outputSelected_) return 1;
+  work.rawFile = raw;
+  work.chirpFile = chirp;
+  extractor_->OutputRawFile = raw;
+  extractor_->OutputChirpFile = chirp;
   return ingestion();
 }
 
 int radarsatLevel0Focuser::ingestion() {
   ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
-  ORV_REPORT("RADARSAT extraction not available in this build", REPORT_ERROR);
-  return 1;
+  if (!extractor_) {
+    ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
+    return 1;
+  }
+  if (int st = extractor_->run(); st != 0) return calledError(st);
+  if (int st = readWorkRecords(work, false); st != 0) return st;
+  ORV_REPORT("RADARSAT image extracted", REPORT_CHECKPOINT);
+  return 0;
 }
 
 int radarsatLevel0Focuser::preprocessing() {

@@ -7,6 +7,7 @@
 #include "focus/stripmap_general_focuser.h"
 
 class ATERSExtractor;
+class radarextract;
 
 class ersLevel0Focuser : public stripmapGeneralFocuserModular {
  public:
@@ -56,8 +57,7 @@ class envisatLevel0Focuser : public stripmapGeneralFocuserModular {
   int nameStages();
 };
 
-// RADARSAT-1 level 0; its extractor is not part of this build, so ingestion
-// fails with a report.
+// RADARSAT-1 level 0: CEOS leader and signal data file.
 class radarsatLevel0Focuser : public stripmapGeneralFocuserModular {
  public:
   radarsatLevel0Focuser();
@@ -74,9 +74,11 @@ class radarsatLevel0Focuser : public stripmapGeneralFocuserModular {
   int finalize_modular() override;
 
   std::string leaderFilename;
+  radarextract* extractor() { return extractor_.get(); }
 
  private:
   int nameStages();
+  std::unique_ptr<radarextract> extractor_;
 };
 
 // Profile Memory of section "sarfocuserConfiguration" (256 when absent) and

@@ -96,7 +96,7 @@ TEST_F(SensorFocusers, ErsStagesReportAndFinalizePrints) {
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "- finalize \n");
 }
 
-TEST_F(SensorFocusers, EnvisatAndRadarsatFailCleanlyWithoutExtractor) {
+TEST_F(SensorFocusers, EnvisatWithoutExtractorAndRadarsatWithoutLeaderFailCleanly) {
   envisatLevel0Focuser e;
   fill(e);
   EXPECT_EQ(e.initialize(), 1);
@@ -112,11 +112,11 @@ TEST_F(SensorFocusers, EnvisatAndRadarsatFailCleanlyWithoutExtractor) {
 
   radarsatLevel0Focuser r;
   fill(r);
-  r.leaderFilename = path("scene.lea");
+  r.leaderFilename = path("none.lea");
   EXPECT_EQ(r.run(), 1);
-  EXPECT_TRUE(traced("radarextract object not allocated!"));
-  EXPECT_EQ(r.ingestion(), 1);
-  EXPECT_TRUE(traced("RADARSAT extraction not available in this build"));
+  EXPECT_TRUE(traced("LEA file does not exist!"));
+  EXPECT_EQ(r.ingestion(), 9);  // no leader to read
+  EXPECT_TRUE(traced("File not opened!"));
   EXPECT_EQ(r.finalize(), 0);
   EXPECT_TRUE(traced("finalized..."));
   EXPECT_EQ(r.postprocessing(), 0);
