@@ -125,6 +125,17 @@ TEST_F(RadarsatSceneTest, FineBeamWithWindowGainChangesReplicaAndMissingLine) {
   const double ph = M_PI * sim.chirpRate() * u0 * u0;
   EXPECT_EQ(chirp[0], std::floor(static_cast<float>(6.0 * std::cos(ph))) + 0.5f);
 
+  // A part of the scene: the record time and first window follow the skip.
+  radarextract part;
+  aim(part, *w);
+  part.LinesToSkip = 10;
+  part.LinesToExtract = 50;
+  ASSERT_EQ(part.run(), 0);
+  EXPECT_EQ(part.rawData.roi.Lines, 50);
+  EXPECT_EQ(part.getSequenceVector().front(), 11);
+  EXPECT_NEAR(part.rawData.roi.SlowStartTime, sim.lineTime(10), 1e-6);
+  EXPECT_EQ(floats(path("scene.extracted")).size(), row * 50);
+
   const std::string t = trace();
   EXPECT_TRUE(e2e::contains(t, "Missing line detected at line 121"));
   EXPECT_TRUE(e2e::contains(t, "Replica samples detected at line 101"));
@@ -159,4 +170,20 @@ TEST_F(RadarsatSceneTest, DamagedFilesEndWithTheirReport) {
     EXPECT_EQ(x.run(), c.status);
     EXPECT_TRUE(e2e::contains(trace(), c.message)) << trace().substr(0, 2000);
   }
+}
+
+TEST_F(RadarsatSceneTest, OrbitSourceOfTheJob) {
+  const auto w = write(scene(16), RadarsatOptions{});
+  radarextract x;
+  aim(x, *w);
+  int source = -1;
+  EXPECT_EQ(x.orbit_source(&source), 0);
+  EXPECT_EQ(source, 1);
+  x.OrbitFile = path("orbit.txt");
+  writeText(x.OrbitFile, "neither a leader nor an orbit file");
+  EXPECT_EQ(x.orbit_source(&source), 1);
+  EXPECT_TRUE(e2e::contains(trace(), "Orbit filename is wrong!"));
+  x.OrbitFile.clear();  // the leader serves
+  EXPECT_EQ(x.orbit_source(&source), 0);
+  EXPECT_TRUE(e2e::contains(trace(), "No Orbit file is present!"));
 }
