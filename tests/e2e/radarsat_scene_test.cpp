@@ -37,6 +37,20 @@ SceneDescription rsatScene(const BeamCase& c) {
   return s;
 }
 
+// The job of a simulated product: the leader is orbit source and leader;
+// temporary files erased.
+std::vector<std::string> rsatJob(const RadarsatSceneWriter& writer, const Folder& dir) {
+  std::vector<std::string> p(24, "NotOK");
+  p[0] = "RADARSAT";
+  p[1] = writer.dataPath(dir / "sim");
+  p[5] = dir / "out";
+  p[6] = writer.leaderPath(dir / "sim");
+  p[7] = p[6];
+  p[16] = p[17] = p[20] = p[21] = p[23] = "0";
+  p[18] = "1";
+  return p;
+}
+
 void focusAndMeasure(const BeamCase& c) {
   Folder dir(c.beam);
   const SceneDescription scene = rsatScene(c);
@@ -53,19 +67,7 @@ void focusAndMeasure(const BeamCase& c) {
   const RadarsatSceneWriter writer(scene, o);
   ASSERT_EQ(writer.write(dir / "sim", error), 0) << error;
 
-  std::vector<std::string> p(24, "NotOK");
-  p[0] = "RADARSAT";
-  p[1] = writer.dataPath(dir / "sim");
-  p[5] = dir / "out";
-  p[6] = writer.leaderPath(dir / "sim");
-  p[7] = p[6];
-  p[16] = "0";
-  p[17] = "0";
-  p[18] = "1";
-  p[20] = "0";
-  p[21] = "0";
-  p[23] = "0";
-  writeJob(dir / "job.txt", p);
+  writeJob(dir / "job.txt", rsatJob(writer, dir));
   const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
   ASSERT_EQ(run.exitStatus, 0) << run.log << run.stderrText << run.trace.substr(0, 3000);
   EXPECT_TRUE(contains(run.log, "SUCCESSFUL")) << run.log;
@@ -95,4 +97,23 @@ TEST(RadarsatEndToEnd, FineBeamWithWindowAndGainSteps) {
 
 TEST(RadarsatEndToEnd, StandardBeamWithWindowAndGainSteps) {
   focusAndMeasure({"S3", 1, 1, 2400, 8.0 / 1300.0 + 0.0004});
+}
+
+TEST(RadarsatEndToEnd, BeamCodeOutsideTheTableEndsTheJobWithTheStageFailure) {
+  Folder dir("badbeam");
+  SceneDescription scene = rsatScene({"S3", 1, 1, 2400, 8.0 / 1300.0 + 0.0004});
+  scene.lines = 64;
+  scene.pixelTargets.clear();
+  RadarsatOptions o;
+  o.beam = "S3";
+  o.badBeamCode = 23;
+  std::string error;
+  const RadarsatSceneWriter writer(scene, o);
+  ASSERT_EQ(writer.write(dir / "sim", error), 0) << error;
+  writeJob(dir / "job.txt", rsatJob(writer, dir));
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  EXPECT_FALSE(run.signalled);
+  EXPECT_EQ(run.errorCode, 130560) << run.errorFile << run.log;
+  EXPECT_TRUE(contains(run.log, "Beam code 23 outside 1 to 20")) << run.log;
+  EXPECT_FALSE(fs::exists(dir / "out_slc"));
 }
