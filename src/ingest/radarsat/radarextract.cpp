@@ -387,7 +387,9 @@ int radarextract::RADARExtract() {
       ORV_REPORT("Packet length error", REPORT_FILE_IO);
     const AuxHead h = decodeAux(aux.data());
     const int number = static_cast<int>(be32(head.data() + 12));
-    if (pos > 0 && number <= previousNumber) {
+    // A counter going back, or jumping further than the file has records,
+    // is a broken head rather than lost lines.
+    if (pos > 0 && (number <= previousNumber || number - previousNumber > records)) {
       status = RS_FAIL(lineMessage("Line index is wrong at line %d, extraction ended", lineNo), STATUS_BAD_CONDITION);
       break;
     }
@@ -448,6 +450,8 @@ int radarextract::RADARExtract() {
       getTime(day, &firstTime);
       ORV_REPORT("First Azimuth time read", REPORT_CHECKPOINT);
     }
+    // The receiver setting is an attenuation in dB: a line attenuated d dB
+    // more than the first one is raised by 10^(d / 20).
     const float factor = static_cast<float>(std::pow(10.0, (h.gainCode - ref.gainCode) / 20.0));
     for (int s = 0; s < 2 * echo; ++s) row[1 + std::size_t(s)] = sampleValue(bytes[std::size_t(s)]) * factor;
     std::fill(row.begin() + 1 + 2 * echo, row.end(), 0.0f);

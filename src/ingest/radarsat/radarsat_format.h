@@ -40,7 +40,8 @@ struct AuxHead {
   int day = 0;          // (byte 43 << 3) + (byte 44 >> 5), day of the year
   int seconds = 0;      // ((byte 44 & 31) << 12) + (byte 45 << 4) + (byte 46 >> 4)
   int milliseconds = 0; // ((byte 46 & 15) << 6) + (byte 47 >> 2)
-  int fraction = 0;     // ((byte 47 & 3) << 8) + byte 48, in 1/1024 ms
+  int fraction = 0;     // ((byte 47 & 3) << 8) + byte 48, in 1/1024 ms: the field
+                        // refines the milliseconds, so its unit is a millisecond's
   bool replica = false; // byte 49, bit 6
   int gainCode = 0;     // byte 49, low 6 bits: receiver attenuation, dB
 };
@@ -62,6 +63,8 @@ struct BeamEntry {
 const BeamEntry* beamEntry(int code);
 
 // Chirp bandwidth of a waveform selector (30, 17.28, 11.58 MHz); 0 if unknown.
+// These are the bandwidths of the transmitted pulse; the sampling rate of a
+// line is the ADC rate of its rate code (one second unit per sample).
 double waveformBandwidth(int code);
 
 // Seconds of the day of a head: seconds + (milliseconds + fraction / 1024) / 1000.
@@ -72,7 +75,9 @@ double windowStart(int windowCode, int priCode, const RateEntry& rate, int pulse
 inline int rxSamples(int rxCode) { return 6 * (rxCode + 1); }
 
 // A sample byte holds a 4-bit two's complement value v in its low nibble,
-// standing for v + 0.5.
+// standing for v + 0.5: the converter's levels are symmetric about zero.
+// Archive products store the signed nibble, not an offset byte with a zero
+// level of 15.5 as the 5-bit ERS converter does.
 inline float sampleValue(unsigned char byte) {
   const int v = (byte & 0x0F) >= 8 ? int(byte & 0x0F) - 16 : int(byte & 0x0F);
   return static_cast<float>(v) + 0.5f;
