@@ -87,6 +87,29 @@ void focusAndMeasure(const BeamCase& c) {
     if (t.found) phases.push_back(t.phaseError);
   }
   EXPECT_LT(phaseSpread(phases) * 180.0 / M_PI, 5.0) << pta.table;
+
+  // Corners of the record: each within 30 m of the zero-Doppler ground
+  // point of the product's first or last line and first or last sample.
+  GeneralSAR record;
+  ASSERT_EQ(record.GSread(store), 0);
+  const ROI_Obj& roi = record.roi.roi;
+  SimIni truth;
+  ASSERT_TRUE(truth.load(dir / "sim/truth.txt", error)) << error;
+  const double offset = truth.getDouble("Scene", "range_peak_offset_samples", std::nan(""));
+  const double r0 = (roi.FastStartTime - offset * roi.FastTimeDelta) * 299792458.0 / 2.0;
+  const double r1 = r0 + roi.Samples * roi.FastTimeDelta * 299792458.0 / 2.0;
+  const double t0 = roi.SlowStartTime, t1 = t0 + roi.Lines * roi.SlowTimeDelta;
+  const geoCoords_Obj& g = record.geoCoords;
+  for (const geopoint* corner : {&g.NW, &g.NE, &g.SW, &g.SE}) {
+    double nearest = 1e30;
+    for (double t : {t0, t1})
+      for (double r : {r0, r1}) {
+        double lat = 0.0, lon = 0.0;
+        ASSERT_TRUE(zeroDopplerPoint(writer.simulator().orbit(), t, r, 0.0, scene.lookSign, lat, lon));
+        nearest = std::min(nearest, norm(geodeticToEcef(lat, lon, 0.0) - geodeticToEcef(corner->lat, corner->lon, 0.0)));
+      }
+    EXPECT_LT(nearest, 30.0) << corner->lat << " " << corner->lon;
+  }
 }
 
 }  // namespace
