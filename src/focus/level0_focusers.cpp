@@ -279,6 +279,7 @@ int radarsatLevel0Focuser::ingestion() {
     ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
     return 1;
   }
+  if (int st = extractor_->checkpar(); st != 0) return calledError(st);
   if (int st = extractor_->run(); st != 0) return calledError(st);
   if (int st = readWorkRecords(work, false); st != 0) return st;
   ORV_REPORT("RADARSAT image extracted", REPORT_CHECKPOINT);

@@ -115,8 +115,8 @@ TEST_F(SensorFocusers, EnvisatWithoutExtractorAndRadarsatWithoutLeaderFailCleanl
   r.leaderFilename = path("none.lea");
   EXPECT_EQ(r.run(), 1);
   EXPECT_TRUE(traced("LEA file does not exist!"));
-  EXPECT_EQ(r.ingestion(), 9);  // no leader to read
-  EXPECT_TRUE(traced("File not opened!"));
+  EXPECT_EQ(r.ingestion(), 10);  // the extractor was given no leader
+  EXPECT_TRUE(traced("Missing LeaderFile in section radarextractInput"));
   EXPECT_EQ(r.finalize(), 0);
   EXPECT_TRUE(traced("finalized..."));
   EXPECT_EQ(r.postprocessing(), 0);

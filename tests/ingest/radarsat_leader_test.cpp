@@ -9,6 +9,7 @@
 
 #include "ingest/radarsat/radarextract.h"
 #include "ingest/radarsat/radarsat_format.h"
+#include "ingest_test_util.h"
 #include "orbit/general_sar_orbit.h"
 
 namespace {
@@ -83,4 +84,30 @@ TEST(RadarsatAuxHead, FieldsAtTheirBitsAndSamples) {
   EXPECT_FALSE(radarsat::decodeAux(a).syncOk);
   EXPECT_EQ(radarsat::beamEntry(21), nullptr);
   EXPECT_EQ(radarsat::beamEntry(20)->pulsesInFlight, 9);
+}
+
+TEST(RadarsatProfile, SectionsIntoTheExtractorAndMissingKeysRefused) {
+  ingest_test::TempFolder dir;
+  const std::string profile = dir / "radarextract.hdr";
+  ingest_test::writeBytes(profile,
+                          "[radarextractInput]\nLinesToSkip = 100\nLinesToExtract = 4096\n"
+                          "LeaderFile = /d/LEA_01.001\nDataFile = /d/DAT_01.001\n"
+                          "[radarextractOutput]\nOutputRawFile = /o/raw\nOutputChirpFile = /o/chirp\n");
+  radarextract x;
+  ASSERT_EQ(x.readpar(profile), 0);
+  EXPECT_EQ(x.ReportFilename, "RadarExtract.txt");
+  EXPECT_EQ(x.LinesToSkip, 100);
+  EXPECT_EQ(x.LinesToExtract, 4096);
+  EXPECT_EQ(x.LeaderFile, "/d/LEA_01.001");
+  EXPECT_EQ(x.DataFile, "/d/DAT_01.001");
+  EXPECT_EQ(x.OrbitFile, "");
+  EXPECT_EQ(x.OutputRawFile, "/o/raw");
+  EXPECT_EQ(x.OutputChirpFile, "/o/chirp");
+  EXPECT_EQ(x.checkpar(), 0);
+
+  const std::string partial = dir / "partial.hdr";
+  ingest_test::writeBytes(partial, "[radarextractInput]\nLeaderFile = /d/LEA_01.001\n");
+  radarextract y;
+  EXPECT_EQ(y.readpar(partial), 10);  // no DataFile
+  EXPECT_TRUE(y.LeaderFile.empty());  // nothing taken over from a refused profile
 }

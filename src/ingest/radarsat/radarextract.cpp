@@ -17,6 +17,7 @@
 #include "diag/report.h"
 #include "diag/waitbar.h"
 #include "ingest/ceos_fields.h"
+#include "ingest/radarsat/radarextract_params.h"
 #include "ingest/radarsat/radarsat_format.h"
 #include "orbit/general_sar_orbit.h"
 #include "product/buffer_io.h"
@@ -101,6 +102,39 @@ double greenwichAngle(double sec85) {
 }
 
 }  // namespace
+
+int radarextract::readpar(const std::string& file) {
+  radarextract_conf conf;
+  radarextract_input input;
+  radarextract_output output;
+  conf.readpar(file);
+  input.readpar(file);
+  output.readpar(file);
+  if (int st = conf.checkpar(); st != 0) return RS_CALLED(st);
+  if (int st = input.checkpar(); st != 0) return RS_CALLED(st);
+  if (int st = output.checkpar(); st != 0) return RS_CALLED(st);
+  ReportFilename = conf.ReportFilename;
+  LinesToSkip = input.LinesToSkip;
+  LinesToExtract = input.LinesToExtract;
+  LeaderFile = input.LeaderFile;
+  DataFile = input.DataFile;
+  OrbitFile = input.OrbitFile;
+  OutputRawFile = output.OutputRawFile;
+  OutputChirpFile = output.OutputChirpFile;
+  return 0;
+}
+
+int radarextract::checkpar() const {
+  radarextract_input input;
+  input.LinesToSkip = LinesToSkip;
+  input.LinesToExtract = LinesToExtract;
+  input.LeaderFile = LeaderFile;
+  input.DataFile = DataFile;
+  radarextract_output output;
+  output.OutputRawFile = OutputRawFile;
+  if (int st = input.checkpar(); st != 0) return st;
+  return output.checkpar();
+}
 
 int radarextract::run() {
   CheckedCall cc("radarextract::run()");

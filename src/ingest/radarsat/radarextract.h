@@ -12,6 +12,10 @@
 
 class radarextract {
  public:
+  // The three profile sections into the fields; 10 when a required key is
+  // missing.
+  int readpar(const std::string& file);
+  int checkpar() const;
   // raw data: RADARExtract(); SLC product: extractSLC().
   int run();
   // 1 for an SLC product, 0 for raw; 9 or 4 when the leader cannot be read.
