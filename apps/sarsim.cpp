@@ -8,6 +8,7 @@
 #include <string>
 
 #include "sim/envisat_level0_writer.h"
+#include "sim/radarsat_ceos_writer.h"
 #include "sim/raw_scene.h"
 
 int main(int argc, char** argv) {
@@ -32,6 +33,27 @@ int main(int argc, char** argv) {
     applyAsarInstrument(asar, scene);
   }
   try {
+    if (scene.mission == "RSAT1") {
+      // RADARSAT-1: the [Radarsat] section chooses beam, rates and codes.
+      SimIni ini;
+      RadarsatOptions options;
+      if (!ini.load(argv[1], error) || !RadarsatOptions::fromIni(ini, options, error)) {
+        std::fprintf(stderr, "sarsim: %s\n", error.c_str());
+        return 10;
+      }
+      const RadarsatSceneWriter writer(scene, options);
+      const RawSceneSimulator& sim = writer.simulator();
+      std::fprintf(stderr, "sarsim: RSAT1 %s, %d lines x %d samples, window code %d, %zu targets\n",
+                   writer.options().beam.c_str(), sim.scene().lines, sim.scene().samples, writer.windowCodeOf(0),
+                   sim.truth().size());
+      if (const int status = writer.write(argv[2], error); status != 0) {
+        std::fprintf(stderr, "sarsim: %s\n", error.c_str());
+        return status;
+      }
+      std::printf("leader %s\ndata   %s\ntruth  %s/truth.txt\n", writer.leaderPath(argv[2]).c_str(),
+                  writer.dataPath(argv[2]).c_str(), argv[2]);
+      return 0;
+    }
     const RawSceneSimulator sim(scene);
     std::fprintf(stderr, "sarsim: %s, %d lines x %d samples, window code %d, %zu targets\n", sim.scene().mission.c_str(),
                  sim.scene().lines, sim.scene().samples, sim.swstCode(), sim.truth().size());

@@ -272,29 +272,35 @@ bool SceneDescription::fromIni(const SimIni& ini, SceneDescription& s, std::stri
 
 RawSceneSimulator::RawSceneSimulator(SceneDescription s) : scene_(std::move(s)) {
   SceneDescription& d = scene_;
-  if (d.mission != "ERS1" && d.mission != "ERS2" && d.mission != "ENVISAT")
-    throw std::runtime_error("mission must be ERS1, ERS2 or ENVISAT, not " + d.mission);
+  if (d.mission != "ERS1" && d.mission != "ERS2" && d.mission != "ENVISAT" && d.mission != "RSAT1")
+    throw std::runtime_error("mission must be ERS1, ERS2, ENVISAT or RSAT1, not " + d.mission);
   if (d.lines <= 0 || d.samples <= 0 || d.samples > 100000)
     throw std::runtime_error("lines and samples must be positive (samples at most 100000)");
   if (!(d.prfHz > 0) || !(d.samplingRateHz > 0) || !(d.pulseLength > 0) || !(d.carrierHz > 0) || !(d.antennaLength > 0))
     throw std::runtime_error("PRF, sampling rate, pulse length, carrier and antenna length must be positive");
   if (!(d.patternExtent > 0)) throw std::runtime_error("pattern extent must be positive");
-  // Keep every value as the leader records it.
+  // Keep every value as the leader records it (RADARSAT values come from
+  // the line codes and stand as given).
+  if (d.mission != "RSAT1") {
   d.carrierHz = roundTrip("%8.3f", d.carrierHz / 1e9) * 1000000000.0;
   d.samplingRateHz = roundTrip("%16.7f", d.samplingRateHz / 1e6) * 1000000.0;
   d.prfHz = roundTrip("%16.7f", d.prfHz);
   d.pulseLength = roundTrip("%16.7f", d.pulseLength * 1e6) / 1000000.0;
   d.chirpCoefficient = roundTrip("%16.7e", d.chirpCoefficient);
+  }
   d.startTime = std::round(d.startTime * 1000.0) / 1000.0;
   orbit_ = SimOrbit(d.orbit);
 
   swstCode_ = d.swstStep > 0.0
                   ? static_cast<int>(std::lround((d.nearRangeTime - d.swstOffset) / d.swstStep))
                   : static_cast<int>(std::lround((d.nearRangeTime - 0.005357529 + 6.627e-06) / 2.10943e-07));
-  if (swstCode_ < 0 || swstCode_ + d.swstChangeCodes < 0 || swstCode_ + d.swstChangeCodes + d.corruptSwstDelta > 65535 ||
-      swstCode_ + d.corruptSwstDelta > 65535)
+  if (!d.lineWindowStarts.empty() && static_cast<int>(d.lineWindowStarts.size()) != d.lines)
+    throw std::runtime_error("one window start per line is needed");
+  if (d.lineWindowStarts.empty() && (swstCode_ < 0 || swstCode_ + d.swstChangeCodes < 0 ||
+                                     swstCode_ + d.swstChangeCodes + d.corruptSwstDelta > 65535 ||
+                                     swstCode_ + d.corruptSwstDelta > 65535))
     throw std::runtime_error("near range time gives a window code outside 0..65535");
-  swst_ = swstSeconds(swstCode_);
+  swst_ = d.lineWindowStarts.empty() ? swstSeconds(swstCode_) : d.lineWindowStarts.front();
   if (replicaLength() >= d.samples) throw std::runtime_error("the window is shorter than the pulse");
   if (d.attitudeGiven) d.dopplerCentroidHz = attitudeDoppler(d.yawDeg, d.pitchDeg);
 
@@ -433,7 +439,8 @@ void RawSceneSimulator::addTargets(int line, fcomplex* row) const {
   const double lambda = wavelength();
   const double fs = d.samplingRateHz, T = d.pulseLength, K = chirpRate();
   const double dt = 1.0 / fs;
-  const double swst = swstSeconds(swstCodeOf(line));
+  const double swst = d.lineWindowStarts.empty() ? swstSeconds(swstCodeOf(line))
+                                                 : d.lineWindowStarts[static_cast<std::size_t>(line)];
   StateVector sv{};
   bool haveSv = false;
   for (const TargetTruth& t : truth_) {

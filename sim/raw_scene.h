@@ -106,6 +106,9 @@ struct SceneDescription {
   int corruptSwstDelta = 1000;
   long long truncateImageBytes = 0;      // > 0: image file cut to this size
   std::vector<std::pair<int, std::string>> leaderPatches;  // file offset, text written over the leader
+  // Window start of every line, two-way seconds, for a mission whose writer
+  // codes the window by its own rule ("RSAT1"); empty: the ERS code rule.
+  std::vector<double> lineWindowStarts;
 
   // Reads a scene file; false with a message on a bad or missing value.
   static bool load(const std::string& path, SceneDescription& out, std::string& error);

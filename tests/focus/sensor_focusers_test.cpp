@@ -29,7 +29,7 @@ class SensorFocusers : public FocusTest {
   }
 };
 
-TEST_F(SensorFocusers, EnvisatWithoutItsFilesAndRadarsatWithoutExtractorFailCleanly) {
+TEST_F(SensorFocusers, EnvisatWithoutItsFilesAndRadarsatWithoutLeaderFailCleanly) {
   envisatLevel0Focuser e;
   fill(e);
   EXPECT_EQ(e.initialize(), 1);
@@ -41,11 +41,11 @@ TEST_F(SensorFocusers, EnvisatWithoutItsFilesAndRadarsatWithoutExtractorFailClea
 
   radarsatLevel0Focuser r;
   fill(r);
-  r.leaderFilename = path("scene.lea");
+  r.leaderFilename = path("none.lea");
   EXPECT_EQ(r.run(), 1);
-  EXPECT_TRUE(traced("radarextract object not allocated!"));
-  EXPECT_EQ(r.ingestion(), 1);
-  EXPECT_TRUE(traced("RADARSAT extraction not available in this build"));
+  EXPECT_TRUE(traced("LEA file does not exist!"));
+  EXPECT_EQ(r.ingestion(), 10);  // the extractor was given no leader
+  EXPECT_TRUE(traced("Missing LeaderFile in section radarextractInput"));
   EXPECT_EQ(r.finalize(), 0);
   EXPECT_TRUE(traced("finalized..."));
   EXPECT_EQ(r.postprocessing(), 0);

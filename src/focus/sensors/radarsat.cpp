@@ -4,6 +4,7 @@
 #include "diag/report.h"
 #include "focus/sensors/level0_chain.h"
 #include "focus/sensors/sensor_job.h"
+#include "ingest/radarsat/radarextract.h"
 #include "output/general_sar_kelmir.h"
 
 namespace {
@@ -45,7 +46,7 @@ const SensorDriver kRadarsatSensor = {.platform = "RADARSAT",
                                       .multiFileProducts = false,
                                       .multiFileGeoTiff = false};
 
-radarsatLevel0Focuser::radarsatLevel0Focuser() = default;
+radarsatLevel0Focuser::radarsatLevel0Focuser() : extractor_(std::make_unique<radarextract>()) {}
 radarsatLevel0Focuser::~radarsatLevel0Focuser() = default;
 
 int radarsatLevel0Focuser::nameStages() {
@@ -53,9 +54,33 @@ int radarsatLevel0Focuser::nameStages() {
     ORV_REPORT("LEA filename not selected!", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  // The RADARSAT extractor is not part of this build.
-  ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
-  return STATUS_BAD_CONDITION;
+  if (!extractor_) {
+    ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  if (!fileOpens(leaderFilename)) {
+    ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  work.rawFile = outputFilename + ".extracted";
+  work.chirpFile = outputFilename + ".chirp";
+  work.antennaFile.clear();
+  work.rgfocFile = outputFilename + ".rgfoc";
+  work.outputFile = outputFilename;
+  radarextract& x = *extractor_;
+  x.DataFile = level0Filename;
+  x.LeaderFile = leaderFilename;
+  x.OrbitFile = orbitFilename;
+  x.OutputRawFile = work.rawFile;
+  x.OutputChirpFile = work.chirpFile;
+  x.LinesToExtract = extractLines;
+  x.LinesToSkip = skipLines;
+  SARFocuser& f = focuser();
+  f.RawDataFile = work.rawFile;
+  f.ChirpFile = work.chirpFile;
+  f.AntennaFile = "antenna not exist";
+  f.OutputFilename = outputFilename;
+  return 0;
 }
 
 int radarsatLevel0Focuser::initialize() {
@@ -74,16 +99,27 @@ int radarsatLevel0Focuser::initialize_modular() {
   return 0;
 }
 
-int radarsatLevel0Focuser::ingestion(const std::string&, const std::string&,
+int radarsatLevel0Focuser::ingestion(const std::string& raw, const std::string& chirp,
                                      const std::string&) {
   if (outputSelected_) return STATUS_BAD_CONDITION;
+  work.rawFile = raw;
+  work.chirpFile = chirp;
+  extractor_->OutputRawFile = raw;
+  extractor_->OutputChirpFile = chirp;
   return ingestion();
 }
 
 int radarsatLevel0Focuser::ingestion() {
   ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
-  ORV_REPORT("RADARSAT extraction not available in this build", REPORT_ERROR);
-  return STATUS_BAD_CONDITION;
+  if (!extractor_) {
+    ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  if (int st = extractor_->checkpar(); st != 0) return level0CalledError(st);
+  if (int st = extractor_->run(); st != 0) return level0CalledError(st);
+  if (int st = readWorkRecords(work, false); st != 0) return st;
+  ORV_REPORT("RADARSAT image extracted", REPORT_CHECKPOINT);
+  return 0;
 }
 
 int radarsatLevel0Focuser::preprocessing() {

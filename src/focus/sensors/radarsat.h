@@ -1,11 +1,13 @@
 #pragma once
-// RADARSAT-1: the focuser of a level-0 scene and the sensor's line of the
-// registry. The RADARSAT extractor is not part of this build, so the focuser
-// stops at its stages with a report.
+// RADARSAT-1: the focuser of a level-0 scene (CEOS leader and signal data
+// file) through radarextract, and the sensor's line of the registry.
+#include <memory>
 #include <string>
 
 #include "focus/sensor_registry.h"
 #include "focus/stripmap_general_focuser.h"
+
+class radarextract;
 
 class radarsatLevel0Focuser : public stripmapGeneralFocuserModular {
  public:
@@ -23,9 +25,11 @@ class radarsatLevel0Focuser : public stripmapGeneralFocuserModular {
   int finalize_modular() override;
 
   std::string leaderFilename;
+  radarextract* extractor() { return extractor_.get(); }
 
  private:
   int nameStages();
+  std::unique_ptr<radarextract> extractor_;
 };
 
 // The registry line of "RADARSAT".
