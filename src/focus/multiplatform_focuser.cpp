@@ -9,6 +9,7 @@
 #include "base/status.h"
 #include "diag/report.h"
 #include "focus/level0_focusers.h"
+#include "focus/palsar_focusers.h"
 #include "focus/stripmap_general_focuser.h"
 #include "ingest/product_types.h"
 #include "ingest/sar_product.h"
@@ -219,6 +220,25 @@ int ATmultiplatformFocuser::fillPalsarFiles() {
   return 0;
 }
 
+std::unique_ptr<stripmapGeneralFocuser> ATmultiplatformFocuser::makePalsarFocuser() {
+  std::unique_ptr<palsarLevel0Focuser> f;
+  if (platform == "PALSAR_ERSDAC")
+    f = std::make_unique<palsarErsDacLevel0Focuser>();
+  else if (!level0FilenameSecondPol.empty())
+    f = std::make_unique<palsarMultiPolLevel0Focuser>();
+  else
+    f = std::make_unique<palsarLevel0Focuser>();
+  fillScene(*f);
+  fillCommon(*f);
+  f->orbitFilename = auxFile1;
+  f->leaderFilename = auxFile2;
+  f->secondScene = level0FilenameSecondPol;
+  f->thirdScene = level0FilenameThirdPol;
+  f->fourthScene = level0FilenameFourthPol;
+  f->sceneCount = palsarSceneCount();
+  return f;
+}
+
 int ATmultiplatformFocuser::palsarSceneCount() const {
   int count = 1;
   if (!level0FilenameSecondPol.empty()) count = 2;
@@ -294,10 +314,7 @@ int ATmultiplatformFocuser::InitProcessing() {
     status = fillPalsarFiles();
     if (status == 0 && platform == "PALSAR" && !level0FilenameSecondPol.empty())
       status = checkMultiPolPalsar(palsarSceneCount());
-    if (status == 0)
-      status = MP_FAIL("No PALSAR focuser in this build: the " + platform +
-                           " scene cannot be focused",
-                       STATUS_BAD_PARAMETER);
+    if (status == 0) focuser_ = makePalsarFocuser();
   } else {
     return MP_FAIL("Invalid name for platform", STATUS_BAD_PARAMETER);
   }

@@ -56,6 +56,8 @@ class ATmultiplatformFocuser : public GeneralSAR_Base {
   int fillPalsarFiles();
   // Scenes of a PALSAR job: 1, or 2, 3, 4 for the last further scene given.
   int palsarSceneCount() const;
+  // The PALSAR focuser of the job: one scene, several polarisations or ERSDAC.
+  std::unique_ptr<stripmapGeneralFocuser> makePalsarFocuser();
   // Leader, scene and orbit must be given; a single-polarisation product
   // takes one scene, a double-polarisation one at most two (10 with the
   // report otherwise).
