@@ -7,6 +7,7 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <sstream>
 #include <stdexcept>
 
 #include "product/time_base.h"
@@ -151,6 +152,22 @@ std::vector<char> buildImageDescriptor(const PalsarSimConfig& cfg, int records, 
   return D;
 }
 
+// Tones and the bursts of a line, with a phase that changes from line to line;
+// a burst is a tone at 0.17 fs on its line.
+void addInterference(const PalsarSimConfig& cfg, int line, double clutterPower, double fs, fcomplex* row, int samples) {
+  auto add = [&](double freq, double db, double phase0) {
+    // Power in its own range-frequency bin over the clutter's power per bin.
+    const double a = std::sqrt(clutterPower * std::pow(10.0, db / 10.0) / samples);
+    for (int j = 0; j < samples; ++j) {
+      const double phase = 2.0 * 3.14159265358979323846 * freq * j / fs + phase0;
+      row[j] += fcomplex(static_cast<float>(a * std::cos(phase)), static_cast<float>(a * std::sin(phase)));
+    }
+  };
+  for (std::size_t k = 0; k < cfg.tones.size(); ++k) add(cfg.tones[k].first, cfg.tones[k].second, 1.3 * line + 0.7 * double(k));
+  for (const auto& [burstLine, db] : cfg.bursts)
+    if (burstLine == line) add(0.17 * fs, db, 0.4);
+}
+
 }  // namespace
 
 bool PalsarSimConfig::fromIni(const SimIni& ini, PalsarSimConfig& c, std::string& error) {
@@ -160,6 +177,24 @@ bool PalsarSimConfig::fromIni(const SimIni& ini, PalsarSimConfig& c, std::string
   c.maxMissingLines = ini.getInt("PALSAR", "max_missing_lines", c.maxMissingLines);
   c.beam = ini.getInt("PALSAR", "beam", c.beam);
   c.offNadirDeg = ini.getDouble("PALSAR", "off_nadir_deg", c.offNadirDeg);
+  std::istringstream tones(ini.getString("PALSAR", "tones", "")), bursts(ini.getString("PALSAR", "bursts", ""));
+  std::string item;
+  while (tones >> item) {
+    const auto colon = item.find(':');
+    if (colon == std::string::npos) {
+      error = "[PALSAR] tones: expected freq_hz:db, not " + item;
+      return false;
+    }
+    c.tones.emplace_back(std::stod(item.substr(0, colon)), std::stod(item.substr(colon + 1)));
+  }
+  while (bursts >> item) {
+    const auto colon = item.find(':');
+    if (colon == std::string::npos) {
+      error = "[PALSAR] bursts: expected line:db, not " + item;
+      return false;
+    }
+    c.bursts.emplace_back(std::stoi(item.substr(0, colon)), std::stod(item.substr(colon + 1)));
+  }
   if (c.layout != "JAXA" && c.layout != "ERSDAC") {
     error = "[PALSAR] layout must be JAXA or ERSDAC, not " + c.layout;
     return false;
@@ -243,9 +278,13 @@ int writePalsarScene(const SceneDescription& scene, const PalsarSimConfig& cfg, 
       std::vector<unsigned char> iq(2 * std::size_t(d.samples));
       std::uint32_t sequence = 2;
       const int chunk = 256;
+      const double clutterPower = 2.0 * sims[std::size_t(ch)].scene().clutterSigma * sims[std::size_t(ch)].scene().clutterSigma;
       for (int first = 0; first < d.lines; first += chunk) {
         const int count = std::min(chunk, d.lines - first);
         sims[std::size_t(ch)].renderLines(first, count, block);
+        for (int i = first; i < first + count; ++i)
+          addInterference(cfg, i, clutterPower, d.samplingRateHz, block.data() + std::size_t(i - first) * std::size_t(d.samples),
+                          d.samples);
         for (int i = first; i < first + count; ++i) {
           if (dropped[std::size_t(i)]) continue;
           std::fill(rec.begin(), rec.end(), 0);

@@ -7,6 +7,7 @@
 // polarisation with its own scattering; the first polarisation's truth is the
 // truth of the scene.
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "sim/raw_scene.h"
@@ -20,7 +21,16 @@ struct PalsarSimConfig {
   // Amplitude of the targets and clutter of each polarisation, relative to HH.
   std::vector<double> channelScale = {1.0, 0.45, 0.45, 0.8};
 
-  // [PALSAR] layout, mode, max_missing_lines, beam, off_nadir_deg.
+  // Radio interference added to every polarisation before quantisation:
+  // persistent tones (frequency from the band centre in Hz, power in dB
+  // over the clutter in the tone's range-frequency bin) across the whole
+  // scene, and bursts (raw line, dB over the clutter in the burst's bin) of
+  // one line each.
+  std::vector<std::pair<double, double>> tones;
+  std::vector<std::pair<int, double>> bursts;
+
+  // [PALSAR] layout, mode, max_missing_lines, beam, off_nadir_deg,
+  // tones ("freq_hz:db ..."), bursts ("line:db ...").
   static bool fromIni(const SimIni& ini, PalsarSimConfig& out, std::string& error);
   int channels() const { return mode == "PLR" ? 4 : mode == "FBD" ? 2 : 1; }
   bool ersdac() const { return layout == "ERSDAC"; }

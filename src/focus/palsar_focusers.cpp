@@ -4,6 +4,7 @@
 #include <cstdio>
 
 #include "base/status.h"
+#include "core/palsar_rfi.h"
 #include "diag/report.h"
 #include "focus/level0_focusers.h"
 #include "ingest/palsar/palsar_extractor.h"
@@ -134,10 +135,14 @@ int palsarLevel0Focuser::ingestion() {
 int palsarLevel0Focuser::preprocessing() {
   if (Remove_interferences == 1) {
     ORV_REPORT("Palsar preprocessing has to be performed.", REPORT_CHECKPOINT);
-    // The interference filter is not part of this build: the raw data are
-    // focused as extracted.
-    ORV_REPORT("Interference removal is not available in this build: " + work.rawFile + " is focused unfiltered",
-               REPORT_WARNING);
+    ATPalsarRFIRemoval rfi;
+    rfi.RawData = work.rawFile;
+    rfi.OutputFile = work.rawFile + ".interf";
+    rfi.Memory = Memory;
+    focuser().RawDataFile = rfi.OutputFile;
+    if (int st = rfi.checkpar(); st != 0) return calledError(st);
+    if (int st = rfi.run(); st != 0) return calledError(st);
+    ORV_REPORT("Palsar preprocessing finished.", REPORT_CHECKPOINT);
     return 0;
   }
   ORV_REPORT("Palsar preprocessing skipped.", REPORT_CHECKPOINT);
