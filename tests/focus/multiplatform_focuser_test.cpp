@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "focus/level0_focusers.h"
+#include "focus/palsar_focusers.h"
 #include "focus/sar_focuser.h"
 #include "product/par_element.h"
 
@@ -227,7 +228,7 @@ TEST(MultiplatformFocuser, EnvisatFillsFourAuxiliaryFiles) {
   }
 }
 
-TEST(MultiplatformFocuser, RadarsatNeedsOnlyTheOrbitAndPalsarIsRefused) {
+TEST(MultiplatformFocuser, RadarsatNeedsOnlyTheOrbitAndPalsarTheOrbitAndTheLeader) {
   Scratch s;
   ATmultiplatformFocuser f;
   f.platform = "RADARSAT";
@@ -249,8 +250,13 @@ TEST(MultiplatformFocuser, RadarsatNeedsOnlyTheOrbitAndPalsarIsRefused) {
     p.auxFile1 = "orbit";
     EXPECT_EQ(p.InitProcessing(), 10) << name;
     p.auxFile2 = "LED";
-    EXPECT_EQ(p.InitProcessing(), 10) << name;
-    EXPECT_EQ(p.sensorFocuser(), nullptr);
+    ASSERT_EQ(p.InitProcessing(), 0) << name;
+    auto* pal = dynamic_cast<palsarLevel0Focuser*>(p.sensorFocuser());
+    ASSERT_NE(pal, nullptr) << name;
+    EXPECT_EQ(pal->orbitFilename, "orbit");
+    EXPECT_EQ(pal->leaderFilename, "LED");
+    EXPECT_EQ(pal->sceneCount, 1);
+    EXPECT_EQ(dynamic_cast<palsarErsDacLevel0Focuser*>(pal) != nullptr, std::string(name) == "PALSAR_ERSDAC");
   }
 }
 
