@@ -1,7 +1,8 @@
 // sarsim: simulates a raw scene from a scene description and writes the
 // mission's files, the orbit archive and the truth of the targets. An
 // ENVISAT scene gives an ASAR level-0 product with its auxiliary files and
-// DORIS orbit, as its [ASAR] section says.
+// DORIS orbit, as its [ASAR] section says; a PALSAR scene gives the CEOS
+// leader and one image file per polarisation, as its [PALSAR] section says.
 //   sarsim SCENE_FILE OUTPUT_DIR
 #include <cstdio>
 #include <exception>
@@ -9,6 +10,7 @@
 
 #include "sim/envisat_level0_writer.h"
 #include "sim/radarsat_ceos_writer.h"
+#include "sim/palsar_writer.h"
 #include "sim/raw_scene.h"
 
 int main(int argc, char** argv) {
@@ -31,6 +33,16 @@ int main(int argc, char** argv) {
       return 10;
     }
     applyAsarInstrument(asar, scene);
+  }
+  PalsarSimConfig palsar;
+  const bool alos = scene.mission == "PALSAR";
+  if (alos) {
+    SimIni ini;
+    if (!ini.load(argv[1], error) || !PalsarSimConfig::fromIni(ini, palsar, error)) {
+      std::fprintf(stderr, "sarsim: %s: %s\n", argv[1], error.c_str());
+      return 10;
+    }
+    applyPalsarInstrument(palsar, scene);
   }
   try {
     if (scene.mission == "RSAT1") {
@@ -58,7 +70,10 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "sarsim: %s, %d lines x %d samples, window code %d, %zu targets\n", sim.scene().mission.c_str(),
                  sim.scene().lines, sim.scene().samples, sim.swstCode(), sim.truth().size());
     AsarSceneFiles asarFiles;
-    const int status = envisat ? writeEnvisatScene(sim, asar, argv[2], &asarFiles, error) : sim.writeErsScene(argv[2], error);
+    PalsarSceneFiles palsarFiles;
+    const int status = envisat ? writeEnvisatScene(sim, asar, argv[2], &asarFiles, error)
+                       : alos  ? writePalsarScene(scene, palsar, argv[2], &palsarFiles, error)
+                               : sim.writeErsScene(argv[2], error);
     if (status != 0) {
       std::fprintf(stderr, "sarsim: %s\n", error.c_str());
       return status;
@@ -72,7 +87,12 @@ int main(int argc, char** argv) {
       std::printf("level0 %s\nins    %s\nxca    %s\nxch    %s\norbit  %s\ntruth  %s/truth.txt\n",
                   asarFiles.level0.c_str(), asarFiles.ins.c_str(), asarFiles.xca.c_str(), asarFiles.xch.c_str(),
                   asarFiles.orbit.c_str(), argv[2]);
-    else
+    else if (alos) {
+      std::printf("leader %s\n", palsarFiles.leader.c_str());
+      for (std::size_t k = 0; k < palsarFiles.images.size(); ++k)
+        std::printf("image  %s %s\n", palsarFiles.labels[k].c_str(), palsarFiles.images[k].c_str());
+      std::printf("truth  %s/truth.txt\n", argv[2]);
+    } else
       std::printf("leader %s\nimage  %s\norbit  %s\ntruth  %s/truth.txt\n", sim.leaderPath(argv[2]).c_str(),
                   sim.imagePath(argv[2]).c_str(), sim.odrPath(argv[2]).c_str(), argv[2]);
   } catch (const std::exception& ex) {

@@ -272,17 +272,20 @@ bool SceneDescription::fromIni(const SimIni& ini, SceneDescription& s, std::stri
 
 RawSceneSimulator::RawSceneSimulator(SceneDescription s) : scene_(std::move(s)) {
   SceneDescription& d = scene_;
-  if (d.mission != "ERS1" && d.mission != "ERS2" && d.mission != "ENVISAT" && d.mission != "RSAT1")
-    throw std::runtime_error("mission must be ERS1, ERS2, ENVISAT or RSAT1, not " + d.mission);
+  if (d.mission != "ERS1" && d.mission != "ERS2" && d.mission != "ENVISAT" && d.mission != "RSAT1" &&
+      d.mission != "PALSAR")
+    throw std::runtime_error("mission must be ERS1, ERS2, ENVISAT, RSAT1 or PALSAR, not " + d.mission);
   if (d.lines <= 0 || d.samples <= 0 || d.samples > 100000)
     throw std::runtime_error("lines and samples must be positive (samples at most 100000)");
   if (!(d.prfHz > 0) || !(d.samplingRateHz > 0) || !(d.pulseLength > 0) || !(d.carrierHz > 0) || !(d.antennaLength > 0))
     throw std::runtime_error("PRF, sampling rate, pulse length, carrier and antenna length must be positive");
   if (!(d.patternExtent > 0)) throw std::runtime_error("pattern extent must be positive");
   // Keep every value as the leader records it (RADARSAT values come from
-  // the line codes and stand as given).
+  // the line codes and stand as given). A PALSAR leader records the
+  // wavelength (7 decimals), the others the carrier.
   if (d.mission != "RSAT1") {
-  d.carrierHz = roundTrip("%8.3f", d.carrierHz / 1e9) * 1000000000.0;
+  d.carrierHz = d.mission == "PALSAR" ? kC / roundTrip("%16.7f", kC / d.carrierHz)
+                                      : roundTrip("%8.3f", d.carrierHz / 1e9) * 1000000000.0;
   d.samplingRateHz = roundTrip("%16.7f", d.samplingRateHz / 1e6) * 1000000.0;
   d.prfHz = roundTrip("%16.7f", d.prfHz);
   d.pulseLength = roundTrip("%16.7f", d.pulseLength * 1e6) / 1000000.0;

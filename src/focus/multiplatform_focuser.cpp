@@ -100,7 +100,7 @@ int ATmultiplatformFocuser::InitProcessing() {
   const SensorDriver* sensor = findSensor(platform);
   if (!sensor) return MP_FAIL("Invalid name for platform", STATUS_BAD_PARAMETER);
   std::unique_ptr<stripmapGeneralFocuser> focuser;
-  if (sensor->makeFocuser) focuser = sensor->makeFocuser();
+  if (sensor->makeFocuser) focuser = sensor->makeFocuser(*this);
   int status = sensor->fill(*this, focuser.get());
   if (status == 0) {
     if (focuser) fillCommon(*focuser);

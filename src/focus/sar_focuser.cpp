@@ -624,6 +624,17 @@ int SARFocuser::process() {
     frPoly.c[4] = fr[2];
     if (conf.DeleteTempFiles) removeReported("./DCEST_resume.txt");
   }
+  else if (conf.DopplerGiven) {
+    ORV_REPORT("Doppler centroid and rate taken from the first polarisation", REPORT_CHECKPOINT);
+    for (int i = 0; i < 7; ++i) {
+      dcPoly.c[i] = conf.GivenDC[i];
+      frPoly.c[i] = conf.GivenFR[i];
+    }
+    dcPoly.trg0 = conf.GivenDCref[0];
+    dcPoly.taz0 = conf.GivenDCref[1];
+    frPoly.trg0 = conf.GivenFRref[0];
+    frPoly.taz0 = conf.GivenFRref[1];
+  }
 
   // Record of the range-focused raster.
   if (conf.Flag_rangefoc) {

@@ -89,6 +89,15 @@ struct SARFocuser_conf {
   // Set by the stage template once the block is filled for a run.
   int Flag_set = 0;
 
+  // Doppler centroid and rate taken from an earlier product of the same
+  // acquisition (further polarisations): used when Flag_dcest is 0 and
+  // DopplerGiven is 1. Coefficients and range/azimuth reference times.
+  int DopplerGiven = 0;
+  double GivenDC[7] = {0, 0, 0, 0, 0, 0, 0};
+  double GivenFR[7] = {0, 0, 0, 0, 0, 0, 0};
+  double GivenDCref[2] = {0, 0};
+  double GivenFRref[2] = {0, 0};
+
   // Clears the block to its reading defaults, then reads the section
   // "sarfocuserConfiguration" of file. 0, or 9 when file does not open.
   int readpar(const std::string& file);

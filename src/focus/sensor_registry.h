@@ -23,8 +23,9 @@ struct SensorDriver {
   // files folder) and whether it is an alternating-polarisation one; 1 after
   // a report when the scene's product type has no profile.
   int (*profile)(const FocuserJobFields& job, std::string& profile, int& alternating);
-  // The sensor focuser; null where this build has none for the sensor.
-  std::unique_ptr<stripmapGeneralFocuser> (*makeFocuser)();
+  // The sensor focuser for the job; null where this build has none for the
+  // sensor.
+  std::unique_ptr<stripmapGeneralFocuser> (*makeFocuser)(const FocuserJobFields& job);
   // Hands the job's scene and auxiliary files to the focuser (null when the
   // sensor has none), looking up the files given only as a folder; 10 with
   // the report when a needed file is neither given nor found.

@@ -30,7 +30,7 @@ TEST(PlatformJobs, PalsarSinglePolarisationWithASecondSceneIsRefusedBeforeExtrac
       << run.log;
 
   // One scene only: the orbit and the leader are required, then the
-  // platform is refused by this build.
+  // extraction refuses a leader that is not of raw data.
   p = basicJob("PALSAR", dir / "IMG-HH-ALPSRP", dir / "out");
   writeJob(dir / "job.txt", p);
   FocuserRun refused = runFocuser(dir.str(), dir / "job.txt");
@@ -40,7 +40,7 @@ TEST(PlatformJobs, PalsarSinglePolarisationWithASecondSceneIsRefusedBeforeExtrac
   writeJob(dir / "job.txt", p);
   refused = runFocuser(dir.str(), dir / "job.txt");
   EXPECT_EQ(refused.errorCode, 130560) << refused.errorFile;
-  EXPECT_TRUE(contains(refused.log, "No PALSAR focuser in this build")) << refused.log;
+  EXPECT_TRUE(contains(refused.log, "The CEOS fileset is not ALOS RAW DATA")) << refused.log;
 }
 
 TEST(PlatformJobs, RadarsatWithoutOrbitIsRefusedAndEnvisatTellsWhichFileIsMissing) {

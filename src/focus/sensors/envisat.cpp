@@ -34,7 +34,7 @@ int envisatProfile(const FocuserJobFields& job, std::string& profile, int& alter
   return 0;
 }
 
-std::unique_ptr<stripmapGeneralFocuser> makeEnvisatFocuser() {
+std::unique_ptr<stripmapGeneralFocuser> makeEnvisatFocuser(const FocuserJobFields&) {
   return std::make_unique<envisatLevel0Focuser>();
 }
 

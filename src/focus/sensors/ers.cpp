@@ -15,7 +15,7 @@ namespace {
 
 constexpr char kErsProfile[] = "parameters_ERS.hdr";
 
-std::unique_ptr<stripmapGeneralFocuser> makeErsFocuser() {
+std::unique_ptr<stripmapGeneralFocuser> makeErsFocuser(const FocuserJobFields&) {
   return std::make_unique<ersLevel0Focuser>();
 }
 

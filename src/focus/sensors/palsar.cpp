@@ -3,6 +3,7 @@
 #include <string>
 
 #include "base/status.h"
+#include "focus/sensors/palsar_focusers.h"
 #include "focus/sensors/sensor_job.h"
 #include "ingest/palsar/palsar_types.h"
 #include "output/general_sar_kelmir.h"
@@ -11,17 +12,31 @@ namespace {
 
 constexpr char kPalsarProfile[] = "parameters_PALSAR.hdr";
 
-std::string polarisationLabel(int code) {
-  static const char* const labels[] = {"hh", "hv", "vh", "vv"};
-  return code >= 0 && code < 4 ? labels[code] : std::to_string(code);
+// One scene, or several polarisations of one JAXA product.
+std::unique_ptr<stripmapGeneralFocuser> makePalsarFocuser(const FocuserJobFields& job) {
+  if (!job.level0FilenameSecondPol.empty()) return std::make_unique<palsarMultiPolLevel0Focuser>();
+  return std::make_unique<palsarLevel0Focuser>();
 }
 
-// Orbit and leader must be given.
-int fillPalsar(FocuserJobFields& job, stripmapGeneralFocuser*) {
+std::unique_ptr<stripmapGeneralFocuser> makePalsarErsdacFocuser(const FocuserJobFields&) {
+  return std::make_unique<palsarErsDacLevel0Focuser>();
+}
+
+// Orbit and leader must be given; the focuser takes every scene of the job.
+int fillPalsar(FocuserJobFields& job, stripmapGeneralFocuser* generic) {
   if (job.auxFile1.empty())
     return SENSOR_FAIL("Error in defining PALSAR Orbit", STATUS_BAD_PARAMETER);
   if (job.auxFile2.empty())
     return SENSOR_FAIL("Error in defining PALSAR leader file", STATUS_BAD_PARAMETER);
+  if (auto* focuser = dynamic_cast<palsarLevel0Focuser*>(generic)) {
+    fillScene(job, *focuser);
+    focuser->orbitFilename = job.auxFile1;
+    focuser->leaderFilename = job.auxFile2;
+    focuser->secondScene = job.level0FilenameSecondPol;
+    focuser->thirdScene = job.level0FilenameThirdPol;
+    focuser->fourthScene = job.level0FilenameFourthPol;
+    focuser->sceneCount = palsarSceneCount(job);
+  }
   return 0;
 }
 
@@ -42,14 +57,14 @@ void eraseTemporaryPalsar(const FocuserJobFields& job) {
                                      &job.level0FilenameThirdPol, &job.level0FilenameFourthPol}) {
       if (scene->empty()) continue;
       const std::string root =
-          out + "_" + polarisationLabel(PalsarTypes(job.auxFile2, *scene).getPol());
+          out + "_" + palsarPolarisationLabel(PalsarTypes(job.auxFile2, *scene).getPol());
       removeTemporaryFiles(root, {".chirp", ".extracted", ".extracted.interf", ".chirp.hdr",
                                   ".extracted.hdr", ".extracted.interf.hdr", ".rgfoc",
                                   ".rgfoc.hdr"});
     }
     return;
   }
-  const std::string label = polarisationLabel(PalsarTypes(job.auxFile2, job.level0Filename).getPol());
+  const std::string label = palsarPolarisationLabel(PalsarTypes(job.auxFile2, job.level0Filename).getPol());
   removeTemporaryFile(out + ".chirp");
   removeTemporaryFile(out + ".extracted_" + label);
   removeTemporaryFile(out + ".extracted_" + label + ".interf");
@@ -103,7 +118,7 @@ int palsarExportTag(const PalsarTypes& types) {
 
 const SensorDriver kPalsarSensor = {.platform = "PALSAR",
                                     .profile = fixedProfile<kPalsarProfile>,
-                                    .makeFocuser = nullptr,
+                                    .makeFocuser = makePalsarFocuser,
                                     .fill = fillPalsar,
                                     .check = checkPalsar,
                                     .eraseTemporary = eraseTemporaryPalsar,
@@ -115,7 +130,7 @@ const SensorDriver kPalsarSensor = {.platform = "PALSAR",
 
 const SensorDriver kPalsarErsdacSensor = {.platform = "PALSAR_ERSDAC",
                                           .profile = fixedProfile<kPalsarProfile>,
-                                          .makeFocuser = nullptr,
+                                          .makeFocuser = makePalsarErsdacFocuser,
                                           .fill = fillPalsar,
                                           .check = checkPalsarErsdac,
                                           .eraseTemporary = eraseTemporaryPalsar,

@@ -1,6 +1,6 @@
 #pragma once
-// ALOS PALSAR (JAXA and ERSDAC layouts): the sensor's lines of the registry.
-// This build has no PALSAR focuser: a job is checked, then refused.
+// ALOS PALSAR (JAXA and ERSDAC layouts): the sensor's lines of the registry;
+// the focusers are in palsar_focusers.h.
 #include "focus/sensor_registry.h"
 
 class PalsarTypes;

@@ -11,7 +11,7 @@ namespace {
 
 constexpr char kRadarsatProfile[] = "parameters_RS.hdr";
 
-std::unique_ptr<stripmapGeneralFocuser> makeRadarsatFocuser() {
+std::unique_ptr<stripmapGeneralFocuser> makeRadarsatFocuser(const FocuserJobFields&) {
   return std::make_unique<radarsatLevel0Focuser>();
 }
 

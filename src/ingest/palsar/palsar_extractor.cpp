@@ -1,0 +1,507 @@
+// ALOS PALSAR level-1.0 extraction.
+#include "ingest/palsar/palsar_extractor.h"
+
+#include <algorithm>
+#include <climits>
+#include <cmath>
+#include <cstdint>
+#include <cstdio>
+#include <ctime>
+#include <fstream>
+#include <new>
+
+#include "base/status.h"
+#include "diag/ckerr.h"
+#include "diag/report.h"
+#include "diag/waitbar.h"
+#include "ingest/ceos/ceos_fields.h"
+#include "orbit/general_sar_orbit.h"
+#include "product/buffer_io.h"
+#include "product/data_file.h"
+#include "product/time_base.h"
+
+namespace {
+
+constexpr double kSpeedOfLight = 299792458.0;
+constexpr double kPi = 3.14159265358979323846;
+constexpr int kJaxaStart = 720, kErsdacStart = 16252;
+// Line prefixes: 412 bytes in JAXA products, 292 in genuine ERSDAC products.
+constexpr int kJaxaPrefix = 412, kErsdacPrefix = 292;
+constexpr int kInstrumentPrefix = 288;
+
+int failure(const std::string& message, int status, int line, const char* function) {
+  orv_add_report(message, REPORT_ERROR, line, function, __FILE__);
+  return status;
+}
+#define PAL_FAIL(message, status) failure((message), (status), __LINE__, __func__)
+int calledError(int status, int line, const char* function) {
+  orv_add_report("Called function returned ERROR", REPORT_ERROR_CALL_TREE, line, function, __FILE__);
+  return status;
+}
+#define PAL_CALLED(status) calledError((status), __LINE__, __func__)
+
+std::string trimmed(const std::string& s) {
+  const auto first = s.find_first_not_of(' ');
+  if (first == std::string::npos) return {};
+  return s.substr(first, s.find_last_not_of(' ') - first + 1);
+}
+
+std::uint32_t be32(const unsigned char* p) {
+  return (std::uint32_t(p[0]) << 24) | (std::uint32_t(p[1]) << 16) | (std::uint32_t(p[2]) << 8) | std::uint32_t(p[3]);
+}
+int be16(const unsigned char* p) { return (int(p[0]) << 8) | int(p[1]); }
+
+// Fixed decimal field: length - decimals - 1 characters of integer part
+// (blanks and minus skipped), the point, `decimals` characters of fraction;
+// a minus as the first character negates.
+double readF(const char* text, int length, int decimals) {
+  const int whole = length - decimals - 1;
+  double v = 0.0;
+  for (int i = 0; i < whole; ++i)
+    if (text[i] >= '0' && text[i] <= '9') v = v * 10.0 + (text[i] - '0');
+  double scale = 0.1;
+  for (int i = whole + 1; i < length; ++i, scale *= 0.1)
+    if (text[i] >= '0' && text[i] <= '9') v += (text[i] - '0') * scale;
+  bool negative = false;
+  for (int i = 0; i < whole; ++i)
+    if (text[i] != ' ') {
+      negative = text[i] == '-';
+      break;
+    }
+  return negative ? -v : v;
+}
+
+bool readFile(const std::string& name, std::vector<char>& bytes) {
+  std::ifstream in(name, std::ios::binary);
+  if (name.empty() || !in) return false;
+  bytes.assign(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
+  return true;
+}
+
+}  // namespace
+
+ATPalExtractor::ATPalExtractor() { createElementsVector(14); }
+ATPalExtractor::~ATPalExtractor() = default;
+
+void ATPalExtractor::refreshParameters() {
+  addElementInt("Memory", &Memory, 1, 0, INT_MAX, true);
+  addElementString("ReportFilename", &ReportFilename, true);
+  addElementInt("ReportLevel", &ReportLevel, 1, 0, 3, true);
+  addElementInt("Incore", &Incore, 1, 0, 1, true);
+  addElementInt("Verbose", &Verbose, 1, 0, 1, true);
+  addElementString("LeaFileName", &LeaFileName, true);
+  addElementString("RawDataName", &RawDataName, true);
+  addElementString("Orbit_Filename", &Orbit_Filename, true);
+  addElementString("OutputFile", &OutputFile, true);
+  addElementString("OutputChirp", &OutputChirp, true);
+  addElementString("OutputAntenna", &OutputAntenna, true);
+  // Declared 0 to 1 but used as percentages: not enforced.
+  addElementInt("SkipLines", &SkipLines, 1, INT_MIN, INT_MAX, true);
+  addElementInt("ExtractLines", &ExtractLines, 1, INT_MIN, INT_MAX, true);
+  addElementInt("Raw_Focused", &Raw_Focused, 1, 0, 1, true);
+  setAllocationFlag(true);
+}
+
+int ATPalExtractor::createBuffers() { return createBuffersDefault(); }
+int ATPalExtractor::destroyBuffers() {
+  setAllocationFlag(false);
+  return 0;
+}
+int ATPalExtractor::checkpar() {
+  checkAuxiliaryFile();
+  return 0;
+}
+int ATPalExtractor::readpar(const std::string& file, int channel) {
+  readAuxiliaryFile(file, channel, "ATPalExtractor");
+  return 0;
+}
+int ATPalExtractor::writepar(const std::string& file, int channel) {
+  return writeAuxiliaryFile(file, channel, "ATPalExtractor");
+}
+int ATPalExtractor::InitProcessing(const std::string& file, int channel) {
+  if (int st = readpar(file, channel); st != 0) return PAL_CALLED(st);
+  init_report(0, "ATPalExtractor REPORT", ReportLevel);
+  if (int st = checkpar(); st != 0) return PAL_CALLED(st);
+  return 0;
+}
+int ATPalExtractor::FinalizeProcessing(const std::string&, int) {
+  exit_report();
+  return 0;
+}
+int ATPalExtractor::runall(const std::string& file, int channel) {
+  std::string target = ReportFilename;
+  if (getConfigurationFile(file, channel, "ATPalExtractor", target)) {
+    ReportFilename = target;
+    return 1;
+  }
+  if (int st = InitProcessing(file, channel); st != 0) return PAL_CALLED(st);
+  if (int st = run(); st != 0) return PAL_CALLED(st);
+  if (int st = FinalizeProcessing(file, channel); st != 0) return PAL_CALLED(st);
+  return 0;
+}
+
+int ATPalExtractor::run() {
+  if (Raw_Focused == 0) return extract();
+  if (Raw_Focused == 1) return extract_l11();
+  return 0;
+}
+
+int ATPalExtractor::extract() {
+  CheckedCall cc("ATPalExtractor::extract()");
+  std::vector<char> lea;
+  if (!readFile(LeaFileName, lea)) return PAL_FAIL("File " + LeaFileName + " cannot be opened!", STATUS_NOT_OPENED);
+  isErsdac = lea.size() >= 2612 && std::string(lea.data() + 2606, 6) == "VEXCEL";
+  int st = isErsdac ? extract_lea10Ersdac() : extract_lea10Jaxa();
+  if (st == 0) st = isErsdac ? extract_L10Ersdac() : extract_L10Jaxa();
+  for (int ch = 0; st == 0 && ch < numberOfChannels && !OutputChirp.empty(); ++ch)
+    st = write_chirp(OutputFile, OutputChirp, ch, OutputAntenna);
+  if (st != 0) return PAL_CALLED(st);
+  return 0;
+}
+
+int ATPalExtractor::extract_lea10Jaxa() { return readLeader(false); }
+int ATPalExtractor::extract_lea10Ersdac() { return readLeader(true); }
+int ATPalExtractor::extract_L10Jaxa() { return walkImage(false); }
+int ATPalExtractor::extract_L10Ersdac() { return walkImage(true); }
+
+int ATPalExtractor::extract_l11() {
+  return PAL_FAIL("This is not a PALSAR level 1.1 dataset! (" + LeaFileName + ": level 1.1 is not read here)",
+                  STATUS_BAD_PARAMETER);
+}
+
+int ATPalExtractor::readLeader(bool ersdac) {
+  CheckedCall cc("ATPalExtractor::readLeader()");
+  std::vector<char> L;
+  if (!readFile(LeaFileName, L)) return PAL_FAIL("File " + LeaFileName + " cannot be opened!", STATUS_NOT_OPENED);
+  if (L.size() < 2612) return PAL_FAIL("File reading failed! " + LeaFileName + " is too short for a PALSAR leader", STATUS_READ_FAILED);
+  const char* d = L.data();
+  if (std::string(d + 1830, 11) != "UNPROCESSED")
+    return PAL_FAIL("The CEOS fileset is not ALOS RAW DATA (" + LeaFileName + ")", STATUS_BAD_PARAMETER);
+  auto bad = [this](const char* what) { return std::string("Bad ") + what + " in the leader file " + LeaFileName; };
+
+  SamplingConstants_Obj& smp = record.sampling;
+  SARPulse_Obj& pulse = record.pulse;
+  DataSetInfo_Obj& info = record.dataSetInfo;
+  ROI_Obj& roi = record.roi;
+  info.AcquisitionStation = trimmed(ceosText(d + 1766, 16));
+  info.SceneID = trimmed(ceosText(d + 740, 32));
+  if (ersdac) {
+    std::vector<char> img;
+    std::ifstream in(RawDataName, std::ios::binary);
+    char field[4];
+    if (!in) return PAL_FAIL("File " + RawDataName + " not found!", STATUS_NOT_OPENED);
+    if (!in.seekg(232) || !in.read(field, 4)) return PAL_FAIL("File reading failed! " + RawDataName, STATUS_READ_FAILED);
+    const int n = ch2int(field, 4);
+    npol_ = n == 6 ? 4 : n == 3 ? 2 : 1;
+  } else {
+    npol_ = ch2int(d + 1108, 4);
+  }
+  const char m0 = d[1132 + 12], m1 = d[1132 + 13];
+  if (m0 != '6') {
+    return PAL_FAIL("Acquisition type not supported (Calibration, Noise, Direct Downlink)", 1);
+  }
+  if (m1 == '0' || m1 == '3') {
+    acquisitionMode = npol_ == 1 ? 0 : 1;
+    numberOfChannels = 1;
+  } else if (m1 == '1') {
+    acquisitionMode = 3;
+    numberOfChannels = 5;
+  } else if (m1 == '2') {
+    acquisitionMode = 2;
+    numberOfChannels = 1;
+  } else {
+    return PAL_FAIL("Acquisition type not supported (Calibration, Noise, Direct Downlink)", 1);
+  }
+  if (acquisitionMode == 3)
+    return PAL_FAIL("ScanSAR extraction is not available in this build (" + LeaFileName + ")", STATUS_BAD_PARAMETER);
+  const char direction = ersdac ? d[820] : d[2254];
+  info.OrbitConfiguration = direction == 'A' ? "ASCENDING" : "DESCENDING";
+  info.OrbitNumber = trimmed(ceosText(d + 1164, 8));
+  info.SceneHeading = readF(d + 1188, 8, 3);
+  smp.lambda_m = readF(d + 1220, 16, 7);
+  if (!(smp.lambda_m > 0.0)) return PAL_FAIL(bad("wavelength"), STATUS_BAD_PARAMETER);
+  maxMissingLines = ch2int(d + 1422, 8);
+  smp.frg_hz = readF(d + 1430, 16, 7) * 1000000.0;
+  if (!(smp.frg_hz > 0.0)) return PAL_FAIL(bad("sampling rate"), STATUS_BAD_PARAMETER);
+  smp.Trg_s = 1.0 / smp.frg_hz;
+  pulse.PulseSamplingRate = smp.frg_hz;
+  roi.FastStartTime = readF(d + 1446, 16, 7) / 1000000.0;
+  ORV_REPORT("SWST read from byte 727 to 731 of Leader File : " + std::to_string(roi.FastStartTime), REPORT_CHECKPOINT);
+  pulse.PulseLength = readF(d + 1462, 16, 7) / 1000000.0;
+  if (!(pulse.PulseLength > 0.0)) return PAL_FAIL(bad("pulse length"), STATUS_BAD_PARAMETER);
+  double slope = FtoDouble2(d + 1254, 16);
+  if (slope == 0.0) slope = FtoDouble2(d + 1270, 16);
+  pulse.PulseKRate = std::fabs(slope);
+  pulse.Bandwidth = pulse.PulseLength * pulse.PulseKRate;
+  if (!(pulse.Bandwidth > 0.0)) return PAL_FAIL(bad("chirp slope"), STATUS_BAD_PARAMETER);
+  gainH = std::pow(10.0, readF(d + 1486, 16, 7) / 10.0);
+  gainV = std::pow(10.0, readF(d + 1502, 16, 7) / 10.0);
+  biasI = readF(d + 1538, 16, 7);
+  biasQ = readF(d + 1554, 16, 7);
+  smp.prf_hz = readF(d + 1654, 16, 7) / 1000.0;
+  if (acquisitionMode == 2) smp.prf_hz *= 0.5;  // H and V transmissions alternate
+  if (!(smp.prf_hz > 0.0)) return PAL_FAIL(bad("PRF"), STATUS_BAD_PARAMETER);
+  smp.pri_s = 1.0 / smp.prf_hz;
+  info.Swath = std::to_string(ch2int(d + 2574, 4));
+  return 0;
+}
+
+int ATPalExtractor::walkImage(bool ersdac) {
+  CheckedCall cc("ATPalExtractor::walkImage()");
+  ready_ = 0;
+  missingLines_ = 0;
+  std::ifstream in(RawDataName, std::ios::binary);
+  if (RawDataName.empty() || !in) return PAL_FAIL("File " + RawDataName + " not found!", STATUS_NOT_OPENED);
+  const int start = ersdac ? kErsdacStart : kJaxaStart;
+  const int prefix = ersdac ? kErsdacPrefix : kJaxaPrefix;
+  std::vector<char> desc(static_cast<std::size_t>(start));
+  if (!in.read(desc.data(), start)) return PAL_FAIL("File reading failed! " + RawDataName + ": short file descriptor", STATUS_READ_FAILED);
+  const int records = ch2int(desc.data() + 236, 8);
+  if (records < 1) return PAL_FAIL("Bad number of records in the image file " + RawDataName, STATUS_BAD_PARAMETER);
+  const int skip = static_cast<int>(static_cast<long long>(SkipLines) * records / 100);
+  int keep = records - skip;
+  if (ExtractLines > 0 && ExtractLines + SkipLines < 100)
+    keep = static_cast<int>(static_cast<long long>(records) * ExtractLines / 100);
+  if (skip < 0 || keep < 1 || skip + keep > records)
+    return PAL_FAIL("Bad part of the scene to extract from " + RawDataName, STATUS_BAD_PARAMETER);
+
+  SamplingConstants_Obj& smp = record.sampling;
+  SARPulse_Obj& pulse = record.pulse;
+  DataSetInfo_Obj& info = record.dataSetInfo;
+  ROI_Obj& roi = record.roi;
+  DataFile& out = record.dataFile;
+  out.filename = OutputFile;
+  out.RowPrefix = 4;
+  out.CellType = FLOAT_COMPLEX;
+  out.HeaderOffset = 0;
+  out.ByteOrder = host_byte_order();
+  out.buffersize = 0;
+  record.rasterName = OutputFile;
+  swst.clear();
+  missing.clear();
+  sequence.clear();
+
+  std::vector<unsigned char> rec(12);
+  std::vector<float> row, previous;
+  int samples = 0, base = 0, status = 0, lastPercent = -1;
+  bool opened = false;
+  long position = 0;  // timeline position of the next record (line number - base)
+  double swstMin = 1.0, swstMax = 0.0;
+  const float bi = static_cast<float>(biasI), bq = static_cast<float>(biasQ);
+  waitbar_open("Extracting PALSAR Raw Data...");
+  for (int idx = 0; idx < records && static_cast<long>(swst.size()) < keep; ++idx) {
+    const int percent = static_cast<int>(100.0 * idx / records);
+    if (percent != lastPercent) waitbar_update(0, static_cast<float>(lastPercent = percent));
+    rec.resize(12);
+    if (!in.read(reinterpret_cast<char*>(rec.data()), 12)) {
+      status = PAL_FAIL("File reading failed! " + RawDataName + ": record " + std::to_string(idx + 1) + " is missing", STATUS_READ_FAILED);
+      break;
+    }
+    const std::uint32_t length = be32(rec.data() + 8);
+    if (length < std::uint32_t(prefix) || length > 1u << 20) {
+      status = PAL_FAIL("File reading failed! " + RawDataName + ": bad length of record " + std::to_string(idx + 1), STATUS_READ_FAILED);
+      break;
+    }
+    rec.resize(length);
+    if (!in.read(reinterpret_cast<char*>(rec.data()) + 12, std::streamsize(length - 12))) {
+      status = PAL_FAIL("File reading failed! " + RawDataName + ": record " + std::to_string(idx + 1) + " is short", STATUS_READ_FAILED);
+      break;
+    }
+    const unsigned char* r = rec.data();
+    const int number = static_cast<int>(be32(r + 12) & 0xFFFFFFu);
+    if (idx == 0) base = number;
+    const long expected = position;
+    const long actual = number - base;
+    if (actual < expected) {
+      ORV_REPORT("Invalid Line Number! A missing line is probably detected", REPORT_WARNING);
+      continue;  // a repeated or earlier record: dropped
+    }
+    const int pixels = static_cast<int>(be32(r + 24));
+    if (samples == 0) {
+      samples = pixels;
+      if (samples < 1 || 2L * samples + prefix > long(length)) {
+        status = PAL_FAIL("Bad number of data pixels in " + RawDataName, STATUS_BAD_PARAMETER);
+        break;
+      }
+      row.assign(1 + 2 * std::size_t(samples), 0.0f);
+      previous = row;
+    }
+    if (actual > expected) {
+      ORV_REPORT("Invalid Line Number! A missing line is probably detected", REPORT_WARNING);
+      missingLines_ += static_cast<int>(actual - expected);
+      if (missingLines_ > maxMissingLines) {
+        status = PAL_FAIL("Missing lines are more than missing lines number written in the Leader File (" +
+                              std::to_string(missingLines_) + " > " + std::to_string(maxMissingLines) + " in " + RawDataName + ")",
+                          STATUS_BAD_CONDITION);
+        break;
+      }
+      // Lost lines are repeats of the line before, flagged, so that the
+      // timeline stays whole.
+      for (long p = expected; p < actual && static_cast<long>(swst.size()) < keep; ++p) {
+        if (p < skip || !opened) continue;
+        if (int st = out.write(previous.data(), static_cast<int64_t>(previous.size() * sizeof(float))); st != 0) {
+          status = PAL_CALLED(st);
+          break;
+        }
+        swst.push_back(swst.back());
+        missing.push_back(1);
+        sequence.push_back(static_cast<int>(base + p));
+      }
+      if (status != 0) break;
+    }
+    position = actual + 1;
+    if (actual < skip || static_cast<long>(swst.size()) >= keep) continue;
+
+    const double nearM = be32(r + 116);
+    const double window = 2.0 * nearM / kSpeedOfLight;
+    const double t = ascii2sec85("01-JAN-" + std::to_string(be32(r + 36)) + " 00:00:00.000") +
+                     (double(be32(r + 40)) - 1.0) * 86400.0 + be32(r + 44) / 1000.0;
+    const int tx = be16(r + 52), rx = be16(r + 54);
+    if (!opened) {
+      roi.SlowStartTime = t;
+      record.swath.Acquisition_Start_Time = t;
+      out.NrOfPixelsPerLine = samples;
+      roi.Samples = samples;
+      polarization_ = std::string(tx == 0 ? "H" : tx == 1 ? "V" : "H+V") + (rx == 0 ? "/H" : "/V");
+      ORV_REPORT("SWST read from echo prefix of swath 1 : " + std::to_string(window), REPORT_CHECKPOINT);
+      if (!ersdac && acquisitionMode == 2)
+        pulse.Bandwidth = (r[kInstrumentPrefix + 60] & 4) ? 14000000.0 : 28000000.0;
+      if (int st = out.open(1); st != 0) {
+        status = PAL_CALLED(st);
+        break;
+      }
+      opened = true;
+    }
+    const float gain = static_cast<float>(tx == 1 ? gainV : gainH);
+    row[0] = static_cast<float>(window);
+    const unsigned char* iq = r + prefix;
+    for (int s = 0; s < samples; ++s) {
+      row[1 + 2 * std::size_t(s)] = (static_cast<float>(iq[2 * s]) - bi) * gain;
+      row[2 + 2 * std::size_t(s)] = (static_cast<float>(iq[2 * s + 1]) - bq) * gain;
+    }
+    if (int st = out.write(row.data(), static_cast<int64_t>(row.size() * sizeof(float))); st != 0) {
+      status = PAL_CALLED(st);
+      break;
+    }
+    previous.swap(row);
+    row.resize(previous.size());
+    swstMin = std::min(swstMin, window);
+    swstMax = std::max(swstMax, window);
+    swst.push_back(static_cast<int>(nearM));
+    missing.push_back(0);
+    sequence.push_back(number);
+  }
+  waitbar_close();
+  const int closed = opened ? out.close() : 0;
+  if (status != 0) return status;
+  if (closed != 0) return PAL_CALLED(closed);
+  if (swst.empty()) return PAL_FAIL("No line extracted from " + RawDataName, STATUS_BAD_PARAMETER);
+
+  const int lines = static_cast<int>(swst.size());
+  out.NrOfLinesPerImage = lines;
+  roi.Lines = lines;
+  smp.fc_hz = kSpeedOfLight / smp.lambda_m;
+  smp.Brg_hz = pulse.Bandwidth;
+  smp.Baz_hz = smp.prf_hz;
+  smp.brf_hz = smp.prf_hz;
+  smp.bri_s = smp.pri_s;
+  roi.FastTimeDelta = smp.Trg_s;
+  roi.SlowTimeDelta = smp.pri_s;
+  roi.FastTimeLength = samples * smp.Trg_s;
+  roi.SlowTimeLength = lines * smp.pri_s;
+  roi.FastStartTime = swstMin;
+  info.SWST_MIN = swstMin;
+  info.SWST_MAX = swstMax;
+  info.RO_REF = 692000.0;
+  info.Polarization = polarization_;
+  info.MissingLines = missingLines_;
+  static const int kModes[4] = {DataSetInfo_Obj::AM_STRIPMAP, DataSetInfo_Obj::AM_DOUBLE_POLARIZATION,
+                                                     DataSetInfo_Obj::AM_QUAD_POLARIZATION, DataSetInfo_Obj::AM_SCANSAR};
+  info.SetAcqMode(kModes[acquisitionMode]);
+  info.SetImageType(DataSetInfo_Obj::IT_RAW_DATA);
+  info.SetUnitType(DataSetInfo_Obj::UT_VOLT);
+  info.SetSensorType(DataSetInfo_Obj::ST_PALSAR);
+  info.SetProjection(DataSetInfo_Obj::PR_SLANT_RANGE);
+  const std::time_t now = std::time(nullptr);
+  char stamp[64] = {};
+  ctime_r(&now, stamp);
+  info.ProcessingDate = std::string(stamp).substr(0, 24);
+  std::string sense;
+  sec852ascii(roi.SlowStartTime, sense);
+  info.SenseDate = sense.substr(0, 27);
+
+  GeneralSAROrbit& orbit = record.orbit();
+  orbit.SVDestroy();
+  orbit.setLambda(smp.lambda_m);
+  if (int st = orbit.GetStateVectorsPAL(Orbit_Filename.empty() ? LeaFileName : Orbit_Filename, roi.SlowStartTime,
+                                        roi.SlowTimeLength);
+      st != 0) {
+    orbit.SVDestroy();
+    return PAL_CALLED(st);
+  }
+  const int written = record.writehdr();
+  orbit.SVDestroy();
+  if (written != 0) return PAL_CALLED(written);
+  ready_ = 1;
+  return 0;
+}
+
+int ATPalExtractor::extract_chirp(int channel, std::vector<fcomplex>& chirp) const {
+  if (channel < 0 || channel >= numberOfChannels) return 1;
+  const double T = record.pulse.PulseLength, fs = record.sampling.frg_hz, B = record.pulse.Bandwidth;
+  if (!(T > 0.0) || !(fs > 0.0) || !(B > 0.0)) return PAL_FAIL("Bad pulse parameters for the PALSAR chirp", STATUS_BAD_PARAMETER);
+  const double x = T * fs;
+  const int n = static_cast<int>(x >= 0 ? std::floor(x + 0.5) : std::ceil(x - 0.5));
+  const double k = B * kPi / T, g = std::sqrt(fs / B);
+  try {
+    chirp.assign(std::size_t(n), fcomplex(0.0f, 0.0f));
+  } catch (const std::bad_alloc&) {
+    return PAL_FAIL("Memory allocation failed for the PALSAR chirp", STATUS_NO_MEMORY);
+  }
+  // The conjugate of the up-chirp: PALSAR transmits a down-chirp.
+  for (int i = 0; i < n; ++i) {
+    const double t = (i - (n - 1) * 0.5) / fs;
+    const double phase = -(k * t * t);
+    chirp[std::size_t(i)] = fcomplex(static_cast<float>(std::cos(phase) / g), static_cast<float>(std::sin(phase) / g));
+  }
+  return 0;
+}
+
+int ATPalExtractor::write_chirp(const std::string& header, const std::string& out, int channel, const std::string&) {
+  CheckedCall cc("ATPalExtractor::write_chirp()");
+  if (int st = record.readhdr(header + ".hdr"); st != 0) return PAL_CALLED(st);
+  std::vector<fcomplex> chirp;
+  if (int st = extract_chirp(channel, chirp); st != 0) return PAL_CALLED(st);
+  const std::string name = numberOfChannels > 1 ? out + std::to_string(channel + 1) : out;
+  DataFile raster(name);
+  raster.NrOfPixelsPerLine = static_cast<int>(chirp.size());
+  raster.NrOfLinesPerImage = 1;
+  raster.RowPrefix = 0;
+  raster.HeaderOffset = 0;
+  raster.CellType = FLOAT_COMPLEX;
+  BufferIO io;
+  io.file = &raster;
+  io.first_column = 0;
+  io.columns = raster.NrOfPixelsPerLine;
+  io.first_row = 0;
+  io.rows = 1;
+  io.memory_type = FLOAT_COMPLEX;
+  int status = io.writebuffer(chirp.data());
+  const int closed = raster.close();
+  if (status == 0) status = closed;
+  if (status == 0) status = raster.write_hdr();
+  if (status != 0) return PAL_CALLED(status);
+  return 0;
+}
+
+int ATPalExtractor::getOutputFilename(int channel, std::string& name) const {
+  if (channel < 0 || channel >= numberOfChannels) return 1;
+  name = numberOfChannels > 1 ? OutputFile + std::to_string(channel) : OutputFile;
+  return 0;
+}
+
+int ATPalExtractor::getPolarization(int channel, std::string& pol) const {
+  if (channel < 0 || channel >= numberOfChannels) return 1;
+  pol = polarization_;
+  return 0;
+}
