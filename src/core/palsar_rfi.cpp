@@ -10,6 +10,7 @@
 #include <new>
 #include <numeric>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
@@ -19,7 +20,6 @@
 
 namespace {
 
-constexpr double kPi = 3.14159265358979323846;
 
 int calledError(int status) {
   ORV_REPORT_CALLED_ERROR();
@@ -45,7 +45,7 @@ int idealSpectrum(int n, double T, double rate, int length, double r, std::vecto
   std::vector<fcomplex> c(static_cast<std::size_t>(length), fcomplex(0.0f, 0.0f));
   for (int i = 0; i < n && i < length; ++i) {
     const double u = (double(i) / n - 0.5) * T;
-    const double phase = -kPi * u * u * rate;
+    const double phase = -consts::kPi * u * u * rate;
     c[std::size_t(i)] = fcomplex(static_cast<float>(std::cos(phase)), static_cast<float>(std::sin(phase)));
   }
   if (int st = fft_c(length, length, 1, 1, FFT_FORWARD, FFT_NONE, c.data(), c.data()); st != 0) return st;

@@ -12,6 +12,13 @@ namespace {
 
 constexpr char kPalsarProfile[] = "parameters_PALSAR.hdr";
 
+// Label of a polarisation code in the names of temporary files; an unknown
+// code pair keeps its number.
+std::string polarisationLabel(int code) {
+  static const char* const labels[] = {"hh", "hv", "vh", "vv"};
+  return code >= 0 && code < 4 ? labels[code] : std::to_string(code);
+}
+
 // One scene, or several polarisations of one JAXA product.
 std::unique_ptr<stripmapGeneralFocuser> makePalsarFocuser(const FocuserJobFields& job) {
   if (!job.level0FilenameSecondPol.empty()) return std::make_unique<palsarMultiPolLevel0Focuser>();
@@ -57,14 +64,14 @@ void eraseTemporaryPalsar(const FocuserJobFields& job) {
                                      &job.level0FilenameThirdPol, &job.level0FilenameFourthPol}) {
       if (scene->empty()) continue;
       const std::string root =
-          out + "_" + palsarPolarisationLabel(PalsarTypes(job.auxFile2, *scene).getPol());
+          out + "_" + polarisationLabel(PalsarTypes(job.auxFile2, *scene).getPol());
       removeTemporaryFiles(root, {".chirp", ".extracted", ".extracted.interf", ".chirp.hdr",
                                   ".extracted.hdr", ".extracted.interf.hdr", ".rgfoc",
                                   ".rgfoc.hdr"});
     }
     return;
   }
-  const std::string label = palsarPolarisationLabel(PalsarTypes(job.auxFile2, job.level0Filename).getPol());
+  const std::string label = polarisationLabel(PalsarTypes(job.auxFile2, job.level0Filename).getPol());
   removeTemporaryFile(out + ".chirp");
   removeTemporaryFile(out + ".extracted_" + label);
   removeTemporaryFile(out + ".extracted_" + label + ".interf");

@@ -4,6 +4,7 @@
 #include <cstdio>
 #include <fstream>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/report.h"
 #include "ingest/envisat/asar_aux.h"
@@ -41,7 +42,7 @@ int writeHeader(const std::string& output, const sarpar* p, const std::string& l
   smp.prf_hz = smp.Baz_hz = p->prf;
   smp.pri_s = 1.0 / p->prf;
   smp.brf_hz = smp.bri_s = -999.0;
-  smp.lambda_m = 299792458.0 / smp.fc_hz;
+  smp.lambda_m = consts::kSpeedOfLight / smp.fc_hz;
   raw.pulse.PulseLength = p->pulseLength;
   raw.pulse.Bandwidth = p->chirpBandwidth;
   raw.pulse.PulseKRate = -999.0;
@@ -148,7 +149,7 @@ int write_param(const std::string& file, const sarpar* par, const extconf* conf,
   if (st == 0) st = WriteMyProfileDouble(s, "Azimuth_time_reference", par[0].Azimuth_time_reference, file);
   if (st == 0) st = WriteMyProfileDouble(s, "Range_gate_bias", par[0].Range_gate_bias, file);
   ints("Swath_rank(R)", rank);
-  if (st == 0) st = WriteMyProfileDouble(s, "SL_range_sampling_step", 299792458.0 / (2.0 * par[0].Sampling_frequency), file);
+  if (st == 0) st = WriteMyProfileDouble(s, "SL_range_sampling_step", consts::kSpeedOfLight / (2.0 * par[0].Sampling_frequency), file);
   ints("SS_order", {0, 2, 4, 1, 3});
   if (st == 0) st = WriteMyProfileInt(s, "Resampl_fact", par[0].Resampl_fact, file);
   if (st == 0) st = WriteMyProfileString(s, "data_type(F_float/C_char)", "F", file);

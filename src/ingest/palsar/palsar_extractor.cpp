@@ -10,6 +10,7 @@
 #include <fstream>
 #include <new>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/ckerr.h"
 #include "diag/report.h"
@@ -22,8 +23,6 @@
 
 namespace {
 
-constexpr double kSpeedOfLight = 299792458.0;
-constexpr double kPi = 3.14159265358979323846;
 constexpr int kJaxaStart = 720, kErsdacStart = 16252;
 // Line prefixes: 412 bytes in JAXA products, 292 in genuine ERSDAC products.
 constexpr int kJaxaPrefix = 412, kErsdacPrefix = 292;
@@ -353,7 +352,7 @@ int ATPalExtractor::walkImage(bool ersdac) {
     if (actual < skip || static_cast<long>(swst.size()) >= keep) continue;
 
     const double nearM = be32(r + 116);
-    const double window = 2.0 * nearM / kSpeedOfLight;
+    const double window = 2.0 * nearM / consts::kSpeedOfLight;
     const double t = ascii2sec85("01-JAN-" + std::to_string(be32(r + 36)) + " 00:00:00.000") +
                      (double(be32(r + 40)) - 1.0) * 86400.0 + be32(r + 44) / 1000.0;
     const int tx = be16(r + 52), rx = be16(r + 54);
@@ -400,7 +399,7 @@ int ATPalExtractor::walkImage(bool ersdac) {
   const int lines = static_cast<int>(swst.size());
   out.NrOfLinesPerImage = lines;
   roi.Lines = lines;
-  smp.fc_hz = kSpeedOfLight / smp.lambda_m;
+  smp.fc_hz = consts::kSpeedOfLight / smp.lambda_m;
   smp.Brg_hz = pulse.Bandwidth;
   smp.Baz_hz = smp.prf_hz;
   smp.brf_hz = smp.prf_hz;
@@ -452,7 +451,7 @@ int ATPalExtractor::extract_chirp(int channel, std::vector<fcomplex>& chirp) con
   if (!(T > 0.0) || !(fs > 0.0) || !(B > 0.0)) return PAL_FAIL("Bad pulse parameters for the PALSAR chirp", STATUS_BAD_PARAMETER);
   const double x = T * fs;
   const int n = static_cast<int>(x >= 0 ? std::floor(x + 0.5) : std::ceil(x - 0.5));
-  const double k = B * kPi / T, g = std::sqrt(fs / B);
+  const double k = B * consts::kPi / T, g = std::sqrt(fs / B);
   try {
     chirp.assign(std::size_t(n), fcomplex(0.0f, 0.0f));
   } catch (const std::bad_alloc&) {
