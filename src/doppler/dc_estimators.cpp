@@ -68,12 +68,8 @@ struct WdarSetup {
   int blocks = 0;
   int blockl = 0;
   std::vector<int> inBand;  // in-band range bins in order of increasing frequency
-  int slopeLen = 0;         // length of the slope transform
-  FFTPlan slopePlan{};
-  bool slopeReady = false;
   ~WdarSetup() {
     if (planReady) fft_destp_c(plan);
-    if (slopeReady) fft_destp_c(slopePlan);
   }
 };
 
@@ -85,13 +81,6 @@ double parabolaOffset(double ym, double y0, double yp) {
   const double den = ym - 2.0 * y0 + yp;
   if (den == 0.0) return 0.0;
   return 0.5 * (ym - yp) / den;
-}
-
-// Wrapped to (-1/2, 1/2].
-double wrapHalf(double v) {
-  double w = v - std::floor(v);
-  if (w > 0.5) w -= 1.0;
-  return w;
 }
 
 }  // namespace
@@ -413,15 +402,6 @@ int wdar_init(DcEstState& st) {
       if (inBand(k)) setup->inBand.push_back(k);
     for (int k = 0; k < st.blocks / 2; ++k)
       if (inBand(k)) setup->inBand.push_back(k);
-    const int c = static_cast<int>(setup->inBand.size());
-    int len = 1;
-    while (len < std::max(c, 2000)) len *= 2;
-    setup->slopeLen = len;
-    if (fft_makep_c(setup->slopePlan, len, len, 1, 1, FFT_FORWARD, FFT_NONE, 1) != 0) {
-      ORV_REPORT("wdar_init: transform plan failed", REPORT_ERROR);
-      return STATUS_BAD_CONDITION;
-    }
-    setup->slopeReady = true;
     g_wdar = std::move(setup);
   } catch (const std::bad_alloc&) {
     ORV_REPORT("wdar_init: out of memory", REPORT_ERROR);
@@ -448,41 +428,55 @@ int wdar(DcEstState& st, const double poly[7], int blockIndex) {
     return STATUS_BAD_CONDITION;
   }
   WdarBlock& blk = st.wdarBlocks[blockIndex];
+  (void)poly;
   try {
     FFTBuffer work(st.blockBuf.begin(), st.blockBuf.begin() + static_cast<long>(ns) * nl);
     pfft_c(set.plan, work.data(), work.data());
     // Lag-one azimuth correlation per range frequency (rows are lines, so the
     // azimuth neighbour of a sample is one row further).
-    std::vector<double> phase(ns, 0.0);
+    std::vector<std::complex<double>> corr(ns, std::complex<double>(0.0, 0.0));
+    std::complex<double> total(0.0, 0.0);
     for (int k : set.inBand) {
       if (k == 0) continue;
       std::complex<double> r(0.0, 0.0);
       for (int l = 0; l + 1 < nl; ++l)
         r += std::conj(std::complex<double>(work[static_cast<std::size_t>(l) * ns + k])) *
              std::complex<double>(work[static_cast<std::size_t>(l + 1) * ns + k]);
-      phase[k] = std::arg(r) / (2.0 * kPi);
+      corr[k] = r;
+      total += r;
     }
-    phase[0] = wrapHalf(dcPolyValue(poly, blk.range, blk.line));
-    FFTBuffer seq(set.slopeLen, fcomplex(0.0f, 0.0f));
-    for (std::size_t j = 0; j < set.inBand.size(); ++j) {
-      const double p = 2.0 * kPi * phase[set.inBand[j]];
-      seq[j] = fcomplex(static_cast<float>(std::cos(p)), static_cast<float>(std::sin(p)));
+    // The lag-one phase at range frequency fr is 2 pi fdc (1 + fr / fc) / PRF
+    // modulo 2 pi: relative to the phase of the whole band it is a line in
+    // fr whose slope is the absolute centroid, far below one cycle across
+    // the band for any centroid of a few PRF, so it needs no unwrapping.
+    // Weighted least squares of that phase against the normalised range
+    // frequency, each bin weighted by its correlation magnitude. Working on
+    // the phase relative to the band's own removes the PRF wrap that a
+    // phase taken against a reference outside the data would bring in.
+    const double tabs = std::abs(total);
+    double sw = 0.0, swx = 0.0;
+    for (int k : set.inBand) {
+      if (k == 0) continue;
+      const double x = (k < ns / 2 ? k : k - ns) / static_cast<double>(ns);
+      const double w = std::abs(corr[k]);
+      sw += w;
+      swx += w * x;
     }
-    pfft_c(set.slopePlan, seq.data(), seq.data());
-    fftshift(seq.data(), set.slopeLen, 1);
-    const int L = set.slopeLen;
-    std::vector<double> mag(L);
-    for (int i = 0; i < L; ++i) mag[i] = std::abs(seq[i]);
-    const int kp = static_cast<int>(std::max_element(mag.begin(), mag.end()) - mag.begin());
-    double pos = kp;
-    if (kp > 0 && kp < L - 1) {
-      const double xs[3] = {-1.0, 0.0, 1.0};
-      const double ys[3] = {mag[kp - 1], mag[kp], mag[kp + 1]};
-      double c[3] = {0.0, 0.0, 0.0};
-      if (polfit(xs, ys, 3, c, 2) == 0 && c[2] != 0.0) pos = kp - c[1] / (2.0 * c[2]);
+    double slope = 0.0;
+    if (sw > 0.0 && tabs > 0.0) {
+      const double xm = swx / sw;
+      double sxy = 0.0, sxx = 0.0;
+      for (int k : set.inBand) {
+        if (k == 0) continue;
+        const double x = (k < ns / 2 ? k : k - ns) / static_cast<double>(ns) - xm;
+        const double w = std::abs(corr[k]);
+        const double ph = std::arg(corr[k] * std::conj(total));
+        sxy += w * x * ph;
+        sxx += w * x * x;
+      }
+      if (sxx > 0.0) slope = sxy / sxx / (2.0 * kPi);
     }
     // Slope in cycles per unit of normalised range frequency.
-    const double slope = (pos - L / 2) / L * ns;
     blk.value = (st.fc / st.fs) * slope;
   } catch (const std::bad_alloc&) {
     ORV_REPORT("wdar: out of memory", REPORT_ERROR);
