@@ -22,10 +22,13 @@ struct Focused {
 
 // Simulates and focuses in core; a first pass on an empty raster gives the
 // output annotation that places the targets.
-Focused focus(const Geometry& g, const AzimuthFocusConf& conf) {
+// `slopeHz`: the processing centroid moves by that much across the swath
+// while the echoes keep g.dc (a centroid estimated with a range trend).
+Focused focus(const Geometry& g, const AzimuthFocusConf& conf, double slopeHz = 0.0) {
   Focused f;
   AzimuthFocusFiles files;
   fillScene(g, files, f.scene);
+  f.scene.polyDC[1] = slopeHz / (g.samples / g.frg);
   f.scene.inCore = 1;
   std::vector<fcomplex> probe(static_cast<std::size_t>(g.samples) * g.lines);
   f.scene.buffer = probe.data();
@@ -104,6 +107,40 @@ TEST(StoltFocusPointTargets, ChirpZoomKernelCentroidNearHalfPrf) {
   g.dc = 0.48 * g.prf;
   const AzimuthFocusConf conf = sceneConf(g, 1, 0.4);
   checkTargets(g, conf, false, focus(g, conf));
+}
+
+// The peak phase is -4 pi R0 / lambda itself, whatever the centroid, its
+// ambiguity, and a 150 Hz range trend of the processing centroid against
+// the echoes'. (It used to carry a constant that moved with the centroid,
+// from the azimuth shift turned against the centroid's wavenumber and the
+// residual wavenumber offset of one reference for the whole block.)
+TEST(StoltFocusPointTargets, PeakPhaseFreeOfTheCentroid) {
+  struct Case {
+    double dc, slope;
+  };
+  for (const Case c : {Case{0.0, 0.0}, Case{320.0, 150.0}, Case{-450.0, 0.0}, Case{2300.0, 0.0},
+                       Case{2300.0, 150.0}}) {
+    {
+      const double dc = c.dc, slope = c.slope;
+      Geometry g;
+      g.dc = dc;
+      const AzimuthFocusConf conf = sceneConf(g, 7, 0.4);
+      const Focused f = focus(g, conf, slope);
+      // The helper places the azimuth spectrum in the band of the wrapped
+      // centroid; n whole PRFs above it the phase at a peak between lines
+      // turns by 2 pi n times the line.
+      const double n = std::round(dc / g.prf);
+      for (const Target& t : f.targets) {
+        const double row = (t.t0 - f.scene.firstLineTime) * g.prf;
+        const double col = (2.0 * t.R0 / kC - f.scene.firstSampleTime) * g.frg;
+        const PointMeasure m = measure(f.image.data(), f.scene.outLines, f.scene.outSamples, row, col);
+        const double residual =
+            std::remainder(m.phase + 2.0 * kPi * n * m.row + 4.0 * kPi * t.R0 / g.lambda(), 2.0 * kPi);
+        EXPECT_LT(std::fabs(residual) * 180.0 / kPi, 5.0)
+            << "centroid " << dc << " Hz, trend " << slope << " Hz, target at " << row << ", " << col;
+      }
+    }
+  }
 }
 
 }  // namespace
