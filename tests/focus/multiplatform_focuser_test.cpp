@@ -372,7 +372,9 @@ TEST(ErsProfile, ChainReadsTheErsValues) {
   EXPECT_EQ(conf.Blocks % conf.Patchs, 0);
   EXPECT_EQ(conf.Blockl % conf.Patchl, 0);
   EXPECT_DOUBLE_EQ(conf.RgBand, 0.82);
-  EXPECT_EQ(conf.Amb_flag, 2);
+  // Ambiguity from the data, WDAR over every low-contrast block.
+  EXPECT_EQ(conf.Amb_flag, 1);
+  EXPECT_EQ(conf.Nwdarblocks, 1000);
   const int weights[7] = {1, 1, 1, 0, 0, 0, 0};
   for (int i = 0; i < 7; ++i) EXPECT_EQ(conf.Pol_Weights[i], weights[i]) << i;
   // Azimuth blocks: overlaps are kept halved.
