@@ -127,23 +127,34 @@ void my_qsort(int lo, int hi, float* keys, int* idx) {
 }
 
 int sel_no_overlap(int* x, int* y, int count, int width, int height, double sx, double sy) {
-  const int cx = static_cast<int>(std::ceil(sx));
-  const int cy = static_cast<int>(std::ceil(sy));
-  std::vector<int> kept;
+  const int cx = std::max(1, static_cast<int>(std::ceil(sx)));
+  const int cy = std::max(1, static_cast<int>(std::ceil(sy)));
+  // Kept points in buckets of cx x cy cells: a point closer than cx and cy
+  // to a candidate lies in the candidate's bucket or one of its eight
+  // neighbours, so each candidate looks at a few points, not at all kept.
+  const int bw = width / cx + 1, bh = height / cy + 1;
+  std::vector<std::vector<int>> buckets(static_cast<std::size_t>(bw) * bh);
+  int kept = 0;
   for (int i = 0; i < count; ++i) {
     if (x[i] < 0) continue;
     const double left = x[i] - sx / 2.0, top = y[i] - sy / 2.0;
     bool drop = left < 0.0 || top < 0.0 || left + sx > width || top + sy > height;
-    for (int k : kept) {
-      if (drop) break;
-      if (std::abs(x[i] - x[k]) < cx && std::abs(y[i] - y[k]) < cy) drop = true;
-    }
-    if (drop)
+    const int bx = std::clamp(x[i] / cx, 0, bw - 1), by = std::clamp(y[i] / cy, 0, bh - 1);
+    for (int v = std::max(0, by - 1); !drop && v <= std::min(bh - 1, by + 1); ++v)
+      for (int u = std::max(0, bx - 1); !drop && u <= std::min(bw - 1, bx + 1); ++u)
+        for (int k : buckets[static_cast<std::size_t>(v) * bw + u])
+          if (std::abs(x[i] - x[k]) < cx && std::abs(y[i] - y[k]) < cy) {
+            drop = true;
+            break;
+          }
+    if (drop) {
       x[i] = -1;
-    else
-      kept.push_back(i);
+    } else {
+      buckets[static_cast<std::size_t>(by) * bw + bx].push_back(i);
+      ++kept;
+    }
   }
-  return static_cast<int>(kept.size());
+  return kept;
 }
 
 int topNpoints(const float* map, std::vector<MapPoint>& out, int n, int width, int height,
@@ -171,8 +182,15 @@ int topNpoints(const float* map, std::vector<MapPoint>& out, int n, int width, i
   int lowestBin = kHistBins;  // bins >= lowestBin are collected
   int wanted = 0;
   int kept = 0;
+  // The candidates grow by n, then by twice as many each round: the greedy
+  // thinning in descending order keeps the same first survivors on any
+  // larger candidate set, and a large n on a map of many equal cells (the
+  // low-contrast blocks of a whole scene) then takes a few rounds, not
+  // thousands.
+  int grow = n;
   while (lowestBin > 0 && kept < n) {
-    wanted += n;
+    wanted += grow;
+    grow = grow > (1 << 29) ? grow : 2 * grow;
     int held = 0;
     for (int b = kHistBins - 1; b >= 0; --b) {
       held += hist[b];
@@ -334,7 +352,9 @@ int multimlbf(DcEstState& st, int blockIndex) {
       const fcomplex* up = &set.taps[static_cast<std::size_t>(2 * i) * set.fLength];
       const fcomplex* down = up + set.fLength;
       // Both looks of every line, filtered along range at the kept
-      // (decimated) samples only, beat and stored azimuth-fastest.
+      // (decimated) samples only, beat and stored azimuth-fastest; lines are
+      // independent.
+#pragma omp parallel for schedule(static)
       for (int l = 0; l < nl; ++l) {
         const fcomplex* line = &st.blockBuf[static_cast<std::size_t>(l) * ns];
         for (int j = 0; j < nd; ++j) {
@@ -435,16 +455,19 @@ int wdar(DcEstState& st, const double poly[7], int blockIndex) {
     // Lag-one azimuth correlation per range frequency (rows are lines, so the
     // azimuth neighbour of a sample is one row further).
     std::vector<std::complex<double>> corr(ns, std::complex<double>(0.0, 0.0));
-    std::complex<double> total(0.0, 0.0);
-    for (int k : set.inBand) {
+    const int nb = static_cast<int>(set.inBand.size());
+#pragma omp parallel for schedule(static)
+    for (int b = 0; b < nb; ++b) {
+      const int k = set.inBand[b];
       if (k == 0) continue;
       std::complex<double> r(0.0, 0.0);
       for (int l = 0; l + 1 < nl; ++l)
         r += std::conj(std::complex<double>(work[static_cast<std::size_t>(l) * ns + k])) *
              std::complex<double>(work[static_cast<std::size_t>(l + 1) * ns + k]);
       corr[k] = r;
-      total += r;
     }
+    std::complex<double> total(0.0, 0.0);
+    for (int k : set.inBand) total += corr[k];
     // The lag-one phase at range frequency fr is 2 pi fdc (1 + fr / fc) / PRF
     // modulo 2 pi: relative to the phase of the whole band it is a line in
     // fr whose slope is the absolute centroid, far below one cycle across

@@ -374,7 +374,7 @@ TEST(ErsProfile, ChainReadsTheErsValues) {
   EXPECT_DOUBLE_EQ(conf.RgBand, 0.82);
   // Ambiguity from the data, WDAR over every low-contrast block.
   EXPECT_EQ(conf.Amb_flag, 1);
-  EXPECT_EQ(conf.Nwdarblocks, 1000);
+  EXPECT_EQ(conf.Nwdarblocks, 200);
   const int weights[7] = {1, 1, 1, 0, 0, 0, 0};
   for (int i = 0; i < 7; ++i) EXPECT_EQ(conf.Pol_Weights[i], weights[i]) << i;
   // Azimuth blocks: overlaps are kept halved.
