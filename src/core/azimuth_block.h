@@ -94,10 +94,11 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
 // Walks the block in overlapping range sub-blocks of `subSamples` samples,
 // `overlap` the full overlap. poly[5]: Doppler centroid in fast time about
 // `tref`. block / blocks feed the progress bar. Each sub-block leaves its
-// targets at the phase -kz R0 of its reference wavenumber kz; the residual
-// (kz - k0) R, R the slant range of each output sample, is taken out as the
-// sub-block is copied back, so that every target ends at -k0 R0 whatever
-// the centroid of its sub-block.
+// targets at a phase offset (k0 - kz) Rq from -k0 R0, kz its reference
+// wavenumber and Rq the target's range in the sub-block's equivalent
+// geometry; it is taken out as the sub-block is copied back, so that every
+// target ends at -k0 R0 whatever the centroid. par.range0 gives the slant
+// range of the block's first output sample.
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
             const double poly[5], double tref, int block = 0, int blocks = 1);
 

@@ -594,7 +594,8 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     const int ncopyBack = std::min(s - o, S - o - f);
     if (ncopyBack > 0) {
       // Residual phase of the targets of this sub-block, taken out as it is
-      // copied back (see residualPhase).
+      // copied back (see residualPhasors). Without Stolt mapping the
+      // equivalent range refers to the middle of the sub-block.
       try {
         const double firstOut = range0 + (f - o / 2) * out.spacing;
         const double rw0 = par.interp == 0 ? firstOut + (s / 2) * out.spacing : firstOut;
