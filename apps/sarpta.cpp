@@ -183,7 +183,11 @@ int main(int argc, char** argv) {
     if (!tok) {
       r.message = "truth section " + sec + " incomplete";
     } else {
-      r = analysePointTarget(image, (ta_ - t0) / dt, (tau - r0) / dr + rangeOffset, ph, opt);
+      // The record's centroid (absolute, Hz) at the target places its azimuth
+      // spectrum for the phase at the sub-pixel peak.
+      PtaOptions at = opt;
+      if (haveRecord) at.azimuthCentroidPrf = record.polynomials.EvaluateDC(tau, ta_) * dt;
+      r = analysePointTarget(image, (ta_ - t0) / dt, (tau - r0) / dr + rangeOffset, ph, at);
     }
     if (!r.found) {
       ++missing;

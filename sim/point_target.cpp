@@ -54,8 +54,15 @@ PtaResult measure(const std::vector<cdouble>& win, int n, double expectedPhase, 
     }
   const int cutRow = quietestBin(eRow), cutCol = quietestBin(eCol);
   std::vector<cdouble> up(static_cast<std::size_t>(nu) * nu, cdouble(0.0, 0.0));
+  const bool absolute = std::isfinite(opt.azimuthCentroidPrf);
   for (int i = 0; i < n; ++i) {
-    const int ui = upsampledBin(i, n, nu, cutRow);
+    int ui = upsampledBin(i, n, nu, cutRow);
+    if (absolute) {
+      // Bin i at the frequency i / n + k (PRF units) nearest the centroid.
+      const long k = std::lround(opt.azimuthCentroidPrf - static_cast<double>(i) / n);
+      const long f = i + k * n;
+      ui = static_cast<int>(((f % nu) + nu) % nu);
+    }
     for (int j = 0; j < n; ++j)
       up[static_cast<std::size_t>(ui) * nu + upsampledBin(j, n, nu, cutCol)] = spec[static_cast<std::size_t>(i) * n + j];
   }

@@ -5,6 +5,7 @@
 // spectral window, computed numerically from the window function.
 #include <cstdio>
 #include <functional>
+#include <limits>
 #include <string>
 #include <vector>
 
@@ -65,6 +66,13 @@ struct PtaOptions {
   int search = 8;     // peak search radius around the prediction, pixels
   WindowSpec azimuth, range;
   double azimuthSpacing = 1.0, rangeSpacing = 1.0;  // metres per pixel
+  // Absolute Doppler centroid at the target, in PRF units (NaN: unknown).
+  // A sampled response only knows its spectrum modulo the PRF; between
+  // samples, and so at the sub-pixel peak, its phase depends on which PRF
+  // interval the spectrum is taken from. Given the centroid, the azimuth
+  // spectrum is upsampled in the band centre +- PRF/2 where the echoes
+  // really lie; without it, in the band cut at the quietest frequency.
+  double azimuthCentroidPrf = std::numeric_limits<double>::quiet_NaN();
 };
 
 struct PtaResult {

@@ -12,6 +12,7 @@
 
 #include "base/constants.h"
 #include "sim/ers_ceos_writer.h"
+#include "sim/sim_fft.h"
 
 namespace {
 
@@ -504,13 +505,47 @@ void RawSceneSimulator::renderLines(int first, int count, std::vector<fcomplex>&
         }
       }
     }
+    // Azimuth filter per range frequency. A scatterer's Doppler scales with
+    // the radio frequency, so at baseband range frequency fr the clutter
+    // spectrum is centred on fdc (1 + fr / fc): tap m of the azimuth filter
+    // is turned by exp(j 2 pi fdc (fr / fc) m / PRF). Without this the
+    // clutter would carry the centroid only modulo the PRF.
+    const int P = nextPowerOfTwo(S);
+    std::vector<cdouble> spec(static_cast<std::size_t>(rows) * P);
 #pragma omp parallel for schedule(static)
-    for (int k = 0; k < count; ++k) {
-      fcomplex* o = out.data() + static_cast<std::size_t>(k) * S;
-      for (int n = 0; n <= 2 * H; ++n) {
-        const fcomplex tap = azimuthTaps_[2 * H - n];
-        const fcomplex* src = filtered.data() + static_cast<std::size_t>(k + n) * S;
-        for (int j = 0; j < S; ++j) o[j] += tap * src[j];
+    for (int r = 0; r < rows; ++r) {
+      cdouble* x = spec.data() + static_cast<std::size_t>(r) * P;
+      const fcomplex* src = filtered.data() + static_cast<std::size_t>(r) * S;
+      for (int j = 0; j < S; ++j) x[j] = cdouble(src[j].real(), src[j].imag());
+      simFft(x, P, -1);
+    }
+    const int nt = 2 * H + 1;
+    std::vector<cdouble> taps(static_cast<std::size_t>(nt) * P);
+    for (int b = 0; b < P; ++b) {
+      const double fr = (b < P / 2 ? b : b - P) * d.samplingRateHz / P;
+      const double shift = d.dopplerCentroidHz * fr / d.carrierHz;
+      for (int m = -H; m <= H; ++m) {
+        const fcomplex h = azimuthTaps_[H + m];
+        taps[static_cast<std::size_t>(m + H) * P + b] =
+            cdouble(h.real(), h.imag()) * std::polar(1.0 / P, 2.0 * kPi * shift * m / d.prfHz);
+      }
+    }
+#pragma omp parallel
+    {
+      std::vector<cdouble> acc(P);
+#pragma omp for schedule(static)
+      for (int k = 0; k < count; ++k) {
+        std::fill(acc.begin(), acc.end(), cdouble(0.0, 0.0));
+        // Output line k + H of the filtered rows takes row k + H - m with tap m.
+        for (int m = -H; m <= H; ++m) {
+          const cdouble* x = spec.data() + static_cast<std::size_t>(k + H - m) * P;
+          const cdouble* t = taps.data() + static_cast<std::size_t>(m + H) * P;
+          for (int b = 0; b < P; ++b) acc[b] += t[b] * x[b];
+        }
+        simFft(acc.data(), P, 1);
+        fcomplex* o = out.data() + static_cast<std::size_t>(k) * S;
+        for (int j = 0; j < S; ++j)
+          o[j] = fcomplex(static_cast<float>(acc[j].real()), static_cast<float>(acc[j].imag()));
       }
     }
   }

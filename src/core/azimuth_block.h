@@ -42,6 +42,8 @@ struct AzimuthBlockPar {
   double dcref = 0.0;        // fixed reference centroid, 0 = none
   double bw = 0.0;           // range bandwidth, Hz
   int final = 0;             // 1 = remove the residual k0 offset at the end
+  double range0 = 0.0;       // slant range of output sample 0 of the block, m
+                             // (0: the range of input sample overlap/2)
 };
 
 // What focazwk tells its caller about the block it focused.
@@ -91,7 +93,12 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
 
 // Walks the block in overlapping range sub-blocks of `subSamples` samples,
 // `overlap` the full overlap. poly[5]: Doppler centroid in fast time about
-// `tref`. block / blocks feed the progress bar.
+// `tref`. block / blocks feed the progress bar. Each sub-block leaves its
+// targets at a phase offset (k0 - kz) Rq from -k0 R0, kz its reference
+// wavenumber and Rq the target's range in the sub-block's equivalent
+// geometry; it is taken out as the sub-block is copied back, so that every
+// target ends at -k0 R0 whatever the centroid. par.range0 gives the slant
+// range of the block's first output sample.
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
             const double poly[5], double tref, int block = 0, int blocks = 1);
 

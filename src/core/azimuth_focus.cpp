@@ -138,6 +138,9 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
                        rgShift);
   par.azshift = azShift;
   par.rgshift = rgShift;
+  // Slant range of the first product sample, for the phase reference of the
+  // kernels' residual wavenumber offset.
+  par.range0 = kC / 2.0 * (conf.RangeOverlap / frg + files.FastStartTime - rgShift);
 
   AzimuthBlockPlan plan;
   st = azimuth_block_plan(lines, conf.LinesInBlock, conf.AzimuthOverlap, plan);

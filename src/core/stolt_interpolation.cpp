@@ -289,7 +289,7 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
 
   const int conj = par.conj;
   const double Req = par.Req;
-  const double kzc = grid.kzc, k0 = grid.k0, kxc = grid.kxc;
+  const double kzc = grid.kzc, k0 = grid.k0;
 #pragma omp parallel for schedule(dynamic, 8)
   for (int j = 0; j < nl; ++j) {
     RowBuffers& rb = buffers[threadIndex()];
@@ -336,7 +336,9 @@ int ChirpInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* 
       // Two-tap interpolation with the phase slope of content at the middle
       // of the range window (minus half a turn per input step) taken out,
       // then the row's azimuth and range references.
-      const double theta = (kx[j] - kxc) * az + dk[j] * Rp;
+      // The azimuth shift turns with the absolute kx, so that it leaves no
+      // centroid-dependent phase on the targets.
+      const double theta = kx[j] * az + dk[j] * Rp;
       const fcomplex et = unitPhasor(theta);
       for (int q = ilo; q <= ihi; ++q) {
         const double t = (std::sqrt(grid.kz[q] * grid.kz[q] + kx2[j]) - k0 - a) / dki;
@@ -443,7 +445,7 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
   }
 
   const int conj = par.conj;
-  const double kzc = grid.kzc, k0 = grid.k0, kxc = grid.kxc;
+  const double kzc = grid.kzc, k0 = grid.k0;
 #pragma omp parallel for schedule(dynamic, 8)
   for (int j = 0; j < nl; ++j) {
     RowBuffers& rb = buffers[threadIndex()];
@@ -462,7 +464,9 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
       std::copy(row, row + ns, spectrum);
       pfft_c(rowFwd, spectrum, spectrum);
       fftshift(spectrum, padded);
-      const double azPhase = (kx[j] - kxc) * az;
+      // The azimuth shift turns with the absolute kx, so that it leaves no
+      // centroid-dependent phase on the targets.
+      const double azPhase = kx[j] * az;
       double* rowTerm = rb.term.data();
       double* rowP = rb.P.data();
       if (A) wt.azimuthRow(kin.data(), padded, kx[j], rowTerm, rowP);

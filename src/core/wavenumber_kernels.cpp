@@ -360,8 +360,10 @@ int FastWK(AzimuthBlockPar& par, const double* kx, const double* kx2, const doub
           fcomplex v = row[i];
           if (conj) v = std::conj(v);
           const double k = table[i];
-          const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * Req - (k - k0) * rg +
-                               (kx[j] - kxc) * az;
+          // The azimuth shift turns with the absolute wavenumber kx: a
+          // shift against the centroid's kx would leave the phase -kxc az
+          // on every target.
+          const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * Req - (k - k0) * rg + kx[j] * az;
           v = wk_rotate(v, phase);
           float W = 1.0f;
           if (A) {
@@ -471,6 +473,35 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out) {
   return st;
 }
 
+namespace {
+
+// The kernels reference a sub-block to its equivalent geometry: a target
+// that lies x metres beyond the first output sample of the sub-block sits at
+// the equivalent range Rq = Req + x, and the reference function leaves it
+// at the phase -kz Rq - k0 (R0 - Rq) instead of -k0 R0, kz = sqrt(k0^2 -
+// kx^2) with kx = 2 pi dcref / Veq. Turning the output sample at range R by
+// (kz - k0) (Req + R - Rw0), Rw0 the range of the sub-block's first output
+// sample, leaves every target at -k0 R0 whatever the centroid. (Req and Veq
+// describe the range curvature, not the slant range and the platform speed,
+// so neither the scene's nor the block's centroid reference would do.) The
+// reference function is the stationary-phase spectrum of the azimuth chirp,
+// which lacks the -pi/4 that the transform of a down-chirp carries; it is
+// put back here too (with the opposite sign for conjugated processing).
+void residualPhasors(const AzimuthBlockPar& par, double rw0, double r0, double dr, int n,
+                     std::vector<fcomplex>& turn) {
+  double k0, kx, kz;
+  ComputeWaveNumbers(par, k0, kx, kz);
+  const double quarter = (par.conj ? -kPi : kPi) / 4.0;
+  turn.resize(n);
+  for (int i = 0; i < n; ++i) {
+    double sd, cd;
+    wk_sincos((kz - k0) * (par.Req + r0 + i * dr - rw0) + quarter, sd, cd);
+    turn[i] = fcomplex(static_cast<float>(cd), static_cast<float>(sd));
+  }
+}
+
+}  // namespace
+
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
             const double poly[5], double tref, int block, int blocks) {
   const int S = par.samples;
@@ -503,8 +534,9 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   const double squint0 = std::asin(kC / par.fc * par.dc / 2.0 / par.Veq);
   double k0, kxc, kzc;
   ComputeWaveNumbers(par, k0, kxc, kzc);
-  const double dkz = kzc - k0;
-  const double Q = dkz != 0.0 ? ((o / 2) * dr + par.t0 * kC / 2.0) / dkz : 0.0;
+  // Slant range of output sample 0 of the block: the product's first
+  // sample when the caller gives it, else that of input sample o / 2.
+  const double range0 = par.range0 != 0.0 ? par.range0 : (o / 2) * dr + par.t0 * kC / 2.0;
 
   const int nsub = (S - o + (s - o) - 1) / (s - o);
   const std::size_t workSize = static_cast<std::size_t>(nl) * s;
@@ -523,6 +555,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   par.samples = s;
 
   double E = 0.0, H = 0.0, r = 1.0;
+  std::vector<fcomplex> turn;
   for (int b = 0; b < nsub; ++b) {
     const int f = b * (s - o);
     const int ncopy = std::min(s, S - f);
@@ -561,11 +594,23 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     if (st != 0) break;
     const int ncopyBack = std::min(s - o, S - o - f);
     if (ncopyBack > 0) {
+      // Residual phase of the targets of this sub-block, taken out as it is
+      // copied back (see residualPhasors). Without Stolt mapping the
+      // equivalent range refers to the middle of the sub-block.
+      try {
+        const double firstOut = range0 + (f - o / 2) * out.spacing;
+        const double rw0 = par.interp == 0 ? firstOut + (s / 2) * out.spacing : firstOut;
+        residualPhasors(par, rw0, range0 + f * out.spacing, out.spacing, ncopyBack, turn);
+      } catch (const std::bad_alloc&) {
+        st = STATUS_NO_MEMORY;
+        break;
+      }
 #pragma omp parallel for schedule(static)
-      for (int j = 0; j < nl; ++j)
-        std::memcpy(blockData + static_cast<std::size_t>(j) * S + f,
-                    work.data() + static_cast<std::size_t>(j) * s + o / 2,
-                    sizeof(fcomplex) * ncopyBack);
+      for (int j = 0; j < nl; ++j) {
+        const fcomplex* src = work.data() + static_cast<std::size_t>(j) * s + o / 2;
+        fcomplex* dst = blockData + static_cast<std::size_t>(j) * S + f;
+        for (int i = 0; i < ncopyBack; ++i) dst[i] = src[i] * turn[i];
+      }
     }
     if (par.verbose)
       waitbar_update(0, static_cast<float>((static_cast<double>(block) * nsub + b) /
@@ -575,13 +620,6 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     restore();
     ORV_REPORT_CALLED_ERROR();
     return st;
-  }
-  if (dkz != 0.0) {
-#pragma omp parallel for schedule(static)
-    for (int j = 0; j < nl; ++j) {
-      fcomplex* row = blockData + static_cast<std::size_t>(j) * S;
-      RngShift(row, S, out.spacing, dkz, row, S, Q, 1.0);
-    }
   }
   restore();
   return STATUS_OK;

@@ -427,6 +427,8 @@ int resumefile(const std::string& path, const DcEstInput& input, const DcEstStat
     dbl(ms, "Mean_of_good_MLBF_estimates", st.mlbfMean);
     dbl(ms, "Std_of_good_MLBF_estimates", st.mlbfStd);
     i32(ms, "MLBF_estimated_ambiguity", st.mlbfAmbiguity);
+    i32(ms, "MLBF_bins_with_good_estimates", st.mlbfGoodBlocks);
+    dbl(ms, "MLBF_quality_threshold", st.kThr);
 
     const char* ws = "WDAR_ambiguity_estimation";
     i32(ws, "WDAR_bins_processed", st.nWdar);
@@ -438,6 +440,7 @@ int resumefile(const std::string& path, const DcEstInput& input, const DcEstStat
     else
       str(ws, "WDAR_offset_frequency", "NOT_AVAILABLE");
     i32(ws, "Geometry_estimated_ambiguity", st.geomAmbiguity);
+    i32(ws, "WDAR_estimated_ambiguity", st.wdarAmbiguity);
   }
   if (st.ambFlag == 2)
     i32("GEOM_ambiguity_estimation", "Geometry_estimated_ambiguity", st.geomAmbiguity);
@@ -451,6 +454,7 @@ int resumefile(const std::string& path, const DcEstInput& input, const DcEstStat
   dbl(ep, "RgRgRg_Hz/s", poly[5]);
   dbl(ep, "RgRgRgRg_Hz/s", poly[6]);
   i32(ep, "Estimated_ambiguity", st.ambiguity);
+  str(ep, "Ambiguity_source", st.ambiguitySource.empty() ? "NOT_AVAILABLE" : st.ambiguitySource);
   dbl(ep, "DC_time_origin_s", input.timeOrigin);
 
   const char* ap = "Ambiguous_polynomial_estimation";

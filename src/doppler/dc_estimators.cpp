@@ -68,12 +68,8 @@ struct WdarSetup {
   int blocks = 0;
   int blockl = 0;
   std::vector<int> inBand;  // in-band range bins in order of increasing frequency
-  int slopeLen = 0;         // length of the slope transform
-  FFTPlan slopePlan{};
-  bool slopeReady = false;
   ~WdarSetup() {
     if (planReady) fft_destp_c(plan);
-    if (slopeReady) fft_destp_c(slopePlan);
   }
 };
 
@@ -85,13 +81,6 @@ double parabolaOffset(double ym, double y0, double yp) {
   const double den = ym - 2.0 * y0 + yp;
   if (den == 0.0) return 0.0;
   return 0.5 * (ym - yp) / den;
-}
-
-// Wrapped to (-1/2, 1/2].
-double wrapHalf(double v) {
-  double w = v - std::floor(v);
-  if (w > 0.5) w -= 1.0;
-  return w;
 }
 
 }  // namespace
@@ -138,23 +127,34 @@ void my_qsort(int lo, int hi, float* keys, int* idx) {
 }
 
 int sel_no_overlap(int* x, int* y, int count, int width, int height, double sx, double sy) {
-  const int cx = static_cast<int>(std::ceil(sx));
-  const int cy = static_cast<int>(std::ceil(sy));
-  std::vector<int> kept;
+  const int cx = std::max(1, static_cast<int>(std::ceil(sx)));
+  const int cy = std::max(1, static_cast<int>(std::ceil(sy)));
+  // Kept points in buckets of cx x cy cells: a point closer than cx and cy
+  // to a candidate lies in the candidate's bucket or one of its eight
+  // neighbours, so each candidate looks at a few points, not at all kept.
+  const int bw = width / cx + 1, bh = height / cy + 1;
+  std::vector<std::vector<int>> buckets(static_cast<std::size_t>(bw) * bh);
+  int kept = 0;
   for (int i = 0; i < count; ++i) {
     if (x[i] < 0) continue;
     const double left = x[i] - sx / 2.0, top = y[i] - sy / 2.0;
     bool drop = left < 0.0 || top < 0.0 || left + sx > width || top + sy > height;
-    for (int k : kept) {
-      if (drop) break;
-      if (std::abs(x[i] - x[k]) < cx && std::abs(y[i] - y[k]) < cy) drop = true;
-    }
-    if (drop)
+    const int bx = std::clamp(x[i] / cx, 0, bw - 1), by = std::clamp(y[i] / cy, 0, bh - 1);
+    for (int v = std::max(0, by - 1); !drop && v <= std::min(bh - 1, by + 1); ++v)
+      for (int u = std::max(0, bx - 1); !drop && u <= std::min(bw - 1, bx + 1); ++u)
+        for (int k : buckets[static_cast<std::size_t>(v) * bw + u])
+          if (std::abs(x[i] - x[k]) < cx && std::abs(y[i] - y[k]) < cy) {
+            drop = true;
+            break;
+          }
+    if (drop) {
       x[i] = -1;
-    else
-      kept.push_back(i);
+    } else {
+      buckets[static_cast<std::size_t>(by) * bw + bx].push_back(i);
+      ++kept;
+    }
   }
-  return static_cast<int>(kept.size());
+  return kept;
 }
 
 int topNpoints(const float* map, std::vector<MapPoint>& out, int n, int width, int height,
@@ -182,8 +182,15 @@ int topNpoints(const float* map, std::vector<MapPoint>& out, int n, int width, i
   int lowestBin = kHistBins;  // bins >= lowestBin are collected
   int wanted = 0;
   int kept = 0;
+  // The candidates grow by n, then by twice as many each round: the greedy
+  // thinning in descending order keeps the same first survivors on any
+  // larger candidate set, and a large n on a map of many equal cells (the
+  // low-contrast blocks of a whole scene) then takes a few rounds, not
+  // thousands.
+  int grow = n;
   while (lowestBin > 0 && kept < n) {
-    wanted += n;
+    wanted += grow;
+    grow = grow > (1 << 29) ? grow : 2 * grow;
     int held = 0;
     for (int b = kHistBins - 1; b >= 0; --b) {
       held += hist[b];
@@ -345,7 +352,9 @@ int multimlbf(DcEstState& st, int blockIndex) {
       const fcomplex* up = &set.taps[static_cast<std::size_t>(2 * i) * set.fLength];
       const fcomplex* down = up + set.fLength;
       // Both looks of every line, filtered along range at the kept
-      // (decimated) samples only, beat and stored azimuth-fastest.
+      // (decimated) samples only, beat and stored azimuth-fastest; lines are
+      // independent.
+#pragma omp parallel for schedule(static)
       for (int l = 0; l < nl; ++l) {
         const fcomplex* line = &st.blockBuf[static_cast<std::size_t>(l) * ns];
         for (int j = 0; j < nd; ++j) {
@@ -413,15 +422,6 @@ int wdar_init(DcEstState& st) {
       if (inBand(k)) setup->inBand.push_back(k);
     for (int k = 0; k < st.blocks / 2; ++k)
       if (inBand(k)) setup->inBand.push_back(k);
-    const int c = static_cast<int>(setup->inBand.size());
-    int len = 1;
-    while (len < std::max(c, 2000)) len *= 2;
-    setup->slopeLen = len;
-    if (fft_makep_c(setup->slopePlan, len, len, 1, 1, FFT_FORWARD, FFT_NONE, 1) != 0) {
-      ORV_REPORT("wdar_init: transform plan failed", REPORT_ERROR);
-      return STATUS_BAD_CONDITION;
-    }
-    setup->slopeReady = true;
     g_wdar = std::move(setup);
   } catch (const std::bad_alloc&) {
     ORV_REPORT("wdar_init: out of memory", REPORT_ERROR);
@@ -448,41 +448,58 @@ int wdar(DcEstState& st, const double poly[7], int blockIndex) {
     return STATUS_BAD_CONDITION;
   }
   WdarBlock& blk = st.wdarBlocks[blockIndex];
+  (void)poly;
   try {
     FFTBuffer work(st.blockBuf.begin(), st.blockBuf.begin() + static_cast<long>(ns) * nl);
     pfft_c(set.plan, work.data(), work.data());
     // Lag-one azimuth correlation per range frequency (rows are lines, so the
     // azimuth neighbour of a sample is one row further).
-    std::vector<double> phase(ns, 0.0);
-    for (int k : set.inBand) {
+    std::vector<std::complex<double>> corr(ns, std::complex<double>(0.0, 0.0));
+    const int nb = static_cast<int>(set.inBand.size());
+#pragma omp parallel for schedule(static)
+    for (int b = 0; b < nb; ++b) {
+      const int k = set.inBand[b];
       if (k == 0) continue;
       std::complex<double> r(0.0, 0.0);
       for (int l = 0; l + 1 < nl; ++l)
         r += std::conj(std::complex<double>(work[static_cast<std::size_t>(l) * ns + k])) *
              std::complex<double>(work[static_cast<std::size_t>(l + 1) * ns + k]);
-      phase[k] = std::arg(r) / (2.0 * kPi);
+      corr[k] = r;
     }
-    phase[0] = wrapHalf(dcPolyValue(poly, blk.range, blk.line));
-    FFTBuffer seq(set.slopeLen, fcomplex(0.0f, 0.0f));
-    for (std::size_t j = 0; j < set.inBand.size(); ++j) {
-      const double p = 2.0 * kPi * phase[set.inBand[j]];
-      seq[j] = fcomplex(static_cast<float>(std::cos(p)), static_cast<float>(std::sin(p)));
+    std::complex<double> total(0.0, 0.0);
+    for (int k : set.inBand) total += corr[k];
+    // The lag-one phase at range frequency fr is 2 pi fdc (1 + fr / fc) / PRF
+    // modulo 2 pi: relative to the phase of the whole band it is a line in
+    // fr whose slope is the absolute centroid, far below one cycle across
+    // the band for any centroid of a few PRF, so it needs no unwrapping.
+    // Weighted least squares of that phase against the normalised range
+    // frequency, each bin weighted by its correlation magnitude. Working on
+    // the phase relative to the band's own removes the PRF wrap that a
+    // phase taken against a reference outside the data would bring in.
+    const double tabs = std::abs(total);
+    double sw = 0.0, swx = 0.0;
+    for (int k : set.inBand) {
+      if (k == 0) continue;
+      const double x = (k < ns / 2 ? k : k - ns) / static_cast<double>(ns);
+      const double w = std::abs(corr[k]);
+      sw += w;
+      swx += w * x;
     }
-    pfft_c(set.slopePlan, seq.data(), seq.data());
-    fftshift(seq.data(), set.slopeLen, 1);
-    const int L = set.slopeLen;
-    std::vector<double> mag(L);
-    for (int i = 0; i < L; ++i) mag[i] = std::abs(seq[i]);
-    const int kp = static_cast<int>(std::max_element(mag.begin(), mag.end()) - mag.begin());
-    double pos = kp;
-    if (kp > 0 && kp < L - 1) {
-      const double xs[3] = {-1.0, 0.0, 1.0};
-      const double ys[3] = {mag[kp - 1], mag[kp], mag[kp + 1]};
-      double c[3] = {0.0, 0.0, 0.0};
-      if (polfit(xs, ys, 3, c, 2) == 0 && c[2] != 0.0) pos = kp - c[1] / (2.0 * c[2]);
+    double slope = 0.0;
+    if (sw > 0.0 && tabs > 0.0) {
+      const double xm = swx / sw;
+      double sxy = 0.0, sxx = 0.0;
+      for (int k : set.inBand) {
+        if (k == 0) continue;
+        const double x = (k < ns / 2 ? k : k - ns) / static_cast<double>(ns) - xm;
+        const double w = std::abs(corr[k]);
+        const double ph = std::arg(corr[k] * std::conj(total));
+        sxy += w * x * ph;
+        sxx += w * x * x;
+      }
+      if (sxx > 0.0) slope = sxy / sxx / (2.0 * kPi);
     }
     // Slope in cycles per unit of normalised range frequency.
-    const double slope = (pos - L / 2) / L * ns;
     blk.value = (st.fc / st.fs) * slope;
   } catch (const std::bad_alloc&) {
     ORV_REPORT("wdar: out of memory", REPORT_ERROR);

@@ -11,6 +11,7 @@
 #include "base/constants.h"
 #include "base/status.h"
 #include "core/fft.h"
+#include "diag/environment.h"
 #include "diag/report.h"
 #include "doppler/dc_driver.h"
 #include "doppler/dc_estimators.h"
@@ -31,6 +32,28 @@ double wrapHalf(double v) {
   double w = v - std::floor(v);
   if (w > 0.5) w -= 1.0;
   return w;
+}
+
+// The ambiguity chosen, how, and the spread of each estimator, on the
+// standard output and in the process log.
+void reportAmbiguityChoice(const DcEstState& st) {
+  char text[512];
+  if (st.ambFlag == 1) {
+    std::snprintf(text, sizeof text,
+                  "Doppler ambiguity %d from %s; MLBF: %d good estimates in %d blocks, mean %.3f, "
+                  "std %.3f, amb %d; WDAR: %d blocks, mean %.3f, std %.3f, standard error %.3f, "
+                  "amb %d; geometry: amb %d.",
+                  st.ambiguity, st.ambiguitySource.c_str(), st.mlbfGood, st.mlbfGoodBlocks,
+                  st.mlbfMean, st.mlbfGood > 0 ? st.mlbfStd : 0.0, st.mlbfAmbiguity,
+                  static_cast<int>(st.wdarBlocks.size()), st.wdarMean,
+                  st.wdarGood > 0 ? st.wdarStd : 0.0, st.wdarStdErr < kNoStd ? st.wdarStdErr : 0.0,
+                  st.wdarAmbiguity, st.geomAmbiguity);
+  } else {
+    std::snprintf(text, sizeof text, "Doppler ambiguity %d from %s.", st.ambiguity,
+                  st.ambiguitySource.c_str());
+  }
+  std::printf("\n%s\n", text);
+  logWrite("%s\n", text);
 }
 
 int nextPow2(long n) {
@@ -425,10 +448,14 @@ int estambiguity(DcEstState& st, DcEstInput& input, const double poly[7]) {
   if (st.verbose) std::printf("Geometric computed DC gives ambiguity: %d \n", st.geomAmbiguity);
   if (st.ambFlag == 0) {
     st.ambiguity = 0;
+    st.ambiguitySource = "NONE (Amb_flag 0)";
+    reportAmbiguityChoice(st);
     return STATUS_OK;
   }
   if (st.ambFlag == 2) {
     st.ambiguity = st.geomAmbiguity;
+    st.ambiguitySource = "GEOMETRY";
+    reportAmbiguityChoice(st);
     return STATUS_OK;
   }
   if (st.ambFlag != 1) {
@@ -490,13 +517,26 @@ int estambiguity(DcEstState& st, DcEstInput& input, const double poly[7]) {
   }
 
   // What remains after removing the wrapped polynomial is the ambiguity.
+  // An MLBF estimate counts only when its beat peak stands kThr times above
+  // everything else in the search window: a bright scatterer gives a clear
+  // beat line, homogeneous clutter none (its beat spectrum is flat across
+  // the window and the peak falls anywhere, mostly near zero beat, which
+  // would pull the ambiguity towards the one of the fractional centroid).
   std::vector<double> mlbf, wd;
+  int mlbfBlocksGood = 0;
   for (MlbfBlock& b : st.mlbfBlocks) {
     const double p = dcPolyValue(poly, b.range, b.line);
-    for (double& e : b.estimates) {
+    int good = 0;
+    for (std::size_t i = 0; i < b.estimates.size(); ++i) {
+      double& e = b.estimates[i];
       e -= p;
-      mlbf.push_back(e);
+      if (i < b.quality.size() && b.quality[i] >= st.kThr) {
+        mlbf.push_back(e);
+        ++good;
+      }
     }
+    b.flag = good > 0 ? 1 : 0;
+    if (good > 0) ++mlbfBlocksGood;
   }
   for (WdarBlock& b : st.wdarBlocks) {
     b.value -= dcPolyValue(poly, b.range, b.line);
@@ -515,31 +555,76 @@ int estambiguity(DcEstState& st, DcEstInput& input, const double poly[7]) {
     return s;
   }
   st.mlbfAmbiguity = static_cast<int>(roundHalfAway(st.mlbfMean));
-  const bool haveWdar = !wd.empty();
-  if (st.varTh <= st.mlbfStd) {
-    if (haveWdar) {
-      st.ambiguity = static_cast<int>(roundHalfAway(st.wdarMean));
-      std::printf("\nWDAR results (NO offset correction!): mean %f, std %f , amb %d.\n", st.wdarMean,
-                  st.wdarStd, st.ambiguity);
+  st.wdarAmbiguity = static_cast<int>(roundHalfAway(st.wdarMean));
+  st.mlbfGoodBlocks = mlbfBlocksGood;
+
+  // Confidence of each estimator: the standard error of its mean (MLBF
+  // estimates of one block share the block's scatterers, so the blocks
+  // count, not the estimates). MLBF holds when its spread is below varTh;
+  // WDAR, whose single blocks spread by more than half a PRF on clutter,
+  // holds when at least eight blocks give a standard error of at most
+  // varTh / 3 (a wrong ambiguity then needs a three-sigma error).
+  st.mlbfStdErr = mlbfBlocksGood > 0 ? st.mlbfStd / std::sqrt(static_cast<double>(mlbfBlocksGood)) : kNoStd;
+  // The WDAR mean is trimmed until its spread falls below varTh, which says
+  // little of its error; the standard error of the median of all blocks,
+  // 1.25 sigma / sqrt(n) with sigma from the median absolute deviation, does.
+  st.wdarStdErr = kNoStd;
+  if (wd.size() >= 2) {
+    std::vector<double> v = wd;
+    std::nth_element(v.begin(), v.begin() + v.size() / 2, v.end());
+    const double med = v[v.size() / 2];
+    for (double& x : v) x = std::fabs(x - med);
+    std::nth_element(v.begin(), v.begin() + v.size() / 2, v.end());
+    st.wdarStdErr = 1.25 * 1.4826 * v[v.size() / 2] / std::sqrt(static_cast<double>(wd.size()));
+  }
+  const bool mlbfHolds = !mlbf.empty() && st.mlbfStd < st.varTh;
+  const bool wdarHolds = wd.size() >= 8 && st.wdarStdErr <= st.varTh / 3.0;
+  if (mlbfHolds) {
+    if (wd.empty()) {
+      std::printf("\nNo WDAR blocks available. Offset frequency estimation unavailable. \n");
     } else {
-      std::printf("No WDAR blocks available. \n");
+      // Frequency offset of WDAR against the MLBF ambiguity, for the record;
+      // the phase-slope estimate itself carries no offset.
+      st.wdarOffset = st.wdarMean - static_cast<double>(st.mlbfAmbiguity);
+      st.wdarOffsetAvailable = 1;
     }
-    return STATUS_BAD_CONDITION;
   }
-  if (!haveWdar) {
-    std::printf("\nNo WDAR blocks available. Offset frequency estimation unavailable. \n");
-  } else {
-    st.wdarOffset = st.wdarMean - static_cast<double>(roundHalfAway(st.mlbfMean));
-    st.wdarOffsetAvailable = 1;
-    for (WdarBlock& b : st.wdarBlocks) b.value -= st.wdarOffset;
-    st.wdarMean -= st.wdarOffset;
+  if (!wd.empty())
     std::printf("\nWDAR results: mean %f, std %f, Nest %d, amb %d.\n", st.wdarMean, st.wdarStd,
-                st.wdarGood, static_cast<int>(roundHalfAway(st.wdarMean)));
+                st.wdarGood, st.wdarAmbiguity);
+  else if (!mlbfHolds)
+    std::printf("No WDAR blocks available. \n");
+  if (!mlbf.empty())
+    std::printf("\nMLBF results: mean %f, std %f, Nest %d, amb %d.\n", st.mlbfMean, st.mlbfStd,
+                st.mlbfGood, st.mlbfAmbiguity);
+
+  int status = STATUS_OK;
+  if (mlbfHolds && wdarHolds) {
+    if (st.mlbfAmbiguity == st.wdarAmbiguity) {
+      st.ambiguity = st.mlbfAmbiguity;
+      st.ambiguitySource = "MLBF and WDAR";
+    } else if (st.wdarStdErr <= st.mlbfStdErr) {
+      st.ambiguity = st.wdarAmbiguity;
+      st.ambiguitySource = "WDAR (MLBF disagrees)";
+    } else {
+      st.ambiguity = st.mlbfAmbiguity;
+      st.ambiguitySource = "MLBF (WDAR disagrees)";
+    }
+  } else if (mlbfHolds) {
+    st.ambiguity = st.mlbfAmbiguity;
+    st.ambiguitySource = "MLBF";
+  } else if (wdarHolds) {
+    st.ambiguity = st.wdarAmbiguity;
+    st.ambiguitySource = "WDAR";
+  } else {
+    // Neither estimator is conclusive: the geometric ambiguity stands, and
+    // the caller warns that the data did not resolve it.
+    st.ambiguity = st.geomAmbiguity;
+    st.ambiguitySource = "GEOMETRY (data estimates not conclusive)";
+    status = STATUS_BAD_CONDITION;
   }
-  st.ambiguity = st.mlbfAmbiguity;
-  std::printf("\nMLBF results: mean %f, std %f, Nest %d, amb %d.\n", st.mlbfMean, st.mlbfStd,
-              st.mlbfGood, st.ambiguity);
-  return STATUS_OK;
+  reportAmbiguityChoice(st);
+  return status;
 }
 
 int dcnapoly(DcEstInput& input, DcEstState& st, double poly[7]) {
@@ -655,8 +740,10 @@ int dcnapoly(DcEstInput& input, DcEstState& st, double poly[7]) {
   } else {
     if (amb != STATUS_BAD_CONDITION) ORV_REPORT_CALLED_ERROR();
     std::printf("\nWARNING: unresolved ambiguity!\n");
-    // The polynomial goes on without ambiguity, and the record says so.
-    st.ambiguity = 0;
+    // The data did not decide: the geometric ambiguity stands when the
+    // estimators were run (0 when they could not be), and the record says so.
+    st.ambiguity = amb == STATUS_BAD_CONDITION ? st.geomAmbiguity : 0;
+    poly[0] += st.ambiguity;
   }
 
   // PRF units per sample and line to Hz per second.

@@ -119,6 +119,11 @@ struct DcEstState {
   double wdarStd = 0.0;
   int wdarOffsetAvailable = 0;  // 1 once wdarOffset is computed
   int geomAmbiguity = 0;
+  int mlbfGoodBlocks = 0;       // blocks with at least one good MLBF estimate
+  int wdarAmbiguity = 0;
+  double mlbfStdErr = 0.0;      // standard error of the MLBF mean (per block)
+  double wdarStdErr = 0.0;      // standard error of the WDAR mean
+  std::string ambiguitySource;  // how the ambiguity was chosen
 
   int patchs = 8;            // "Patchs": contrast cell width, samples
   int patchl = 32;           // "Patchl": contrast cell height, lines

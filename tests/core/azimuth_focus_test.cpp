@@ -28,10 +28,13 @@ struct Focused {
 // Simulates and focuses in core. The annotation does not depend on the data
 // nor, with the automatic shifts, on the number of lines: a first pass on a
 // short empty raster gives it, and with it the places of the targets.
-Focused focusScene(const Geometry& g, const AzimuthFocusConf& conf) {
+// `slopeHz`: the processing centroid moves by that much across the swath
+// while the echoes keep g.dc (a centroid estimated with a range trend).
+Focused focusScene(const Geometry& g, const AzimuthFocusConf& conf, double slopeHz = 0.0) {
   Focused f;
   AzimuthFocusFiles files;
   fillScene(g, files, f.scene);
+  f.scene.polyDC[1] = slopeHz / (g.samples / g.frg);
   {
     AzimuthFocusScene probeScene = f.scene;
     AzimuthFocusConf probeConf = conf;
@@ -116,5 +119,35 @@ TEST_P(AzimuthKernels, PointTargetsMeetTheBars) {
 INSTANTIATE_TEST_SUITE_P(PointTargets, AzimuthKernels,
                          ::testing::Values(KernelCase{0, 0.48}, KernelCase{7, 300.0 / 1679.9}, KernelCase{7, 0.48},
                                            KernelCase{1, 300.0 / 1679.9}, KernelCase{1, 0.48}));
+
+// The peak phase is -4 pi R0 / lambda itself, whatever the centroid, its
+// ambiguity, and a 150 Hz range trend of the processing centroid against
+// the echoes' (the azimuth shift turned with the absolute wavenumber, the
+// residual wavenumber offset of each range sub-block removed).
+TEST(AzimuthFocusPointTargets, PeakPhaseFreeOfTheCentroid) {
+  struct Case {
+    double dc, slope;
+  };
+  for (const Case c : {Case{0.0, 0.0}, Case{320.0, 150.0}, Case{-450.0, 0.0}, Case{2300.0, 0.0},
+                       Case{2300.0, 150.0}}) {
+    Geometry g;
+    g.dc = c.dc;
+    const AzimuthFocusConf conf = sceneConf(g, 7, 0.4);
+    const Focused f = focusScene(g, conf, c.slope);
+    // The measurement upsamples the azimuth spectrum in the band of the
+    // wrapped centroid; n whole PRFs above it the phase at a peak between
+    // lines turns by 2 pi n times the line.
+    const double n = std::round(c.dc / g.prf);
+    for (const Target& t : f.targets) {
+      const double row = (t.t0 - f.scene.firstLineTime) * g.prf;
+      const double col = (2.0 * t.R0 / kC - f.scene.firstSampleTime) * g.frg;
+      const PtaResult m = measureTarget(f.image.data(), f.scene.outLines, f.scene.outSamples, row, col);
+      const double residual =
+          std::remainder(m.phase + 2.0 * kPi * n * m.peakLine + 4.0 * kPi * t.R0 / g.lambda(), 2.0 * kPi);
+      EXPECT_LT(std::fabs(residual) * 180.0 / kPi, bars::kPhaseDeg)
+          << "centroid " << c.dc << " Hz, trend " << c.slope << " Hz, target at " << row << ", " << col;
+    }
+  }
+}
 
 }  // namespace

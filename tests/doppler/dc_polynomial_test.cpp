@@ -272,11 +272,14 @@ TEST(DcAmbiguityEstimate, DecisionBetweenMlbfAndWdar) {
     return std::make_pair(status, st);
   };
   std::string out;
-  // MLBF spread above the limit: WDAR without offset correction, unresolved.
+  // MLBF spread above the limit and a single WDAR block: neither estimator
+  // is conclusive, the geometric ambiguity stands and the status says so.
   auto [s1, st1] = run(1e-9, 1, out);
   EXPECT_EQ(s1, 1);
-  EXPECT_NE(out.find("\nWDAR results (NO offset correction!): mean "), std::string::npos) << out;
-  EXPECT_EQ(st1.ambiguity, std::lround(st1.wdarMean));
+  EXPECT_EQ(st1.ambiguity, st1.geomAmbiguity);
+  EXPECT_EQ(st1.ambiguitySource, "GEOMETRY (data estimates not conclusive)");
+  EXPECT_NE(out.find("\nWDAR results: mean "), std::string::npos) << out;
+  EXPECT_NE(out.find("Doppler ambiguity 0 from GEOMETRY"), std::string::npos) << out;
   EXPECT_EQ(st1.wdarOffsetAvailable, 0);
   // ... and without WDAR blocks.
   auto [s2, st2] = run(1e-9, 0, out);
@@ -286,18 +289,19 @@ TEST(DcAmbiguityEstimate, DecisionBetweenMlbfAndWdar) {
   auto [s3, st3] = run(0.5, 0, out);
   EXPECT_EQ(s3, 0);
   EXPECT_EQ(st3.ambiguity, 1);
+  EXPECT_EQ(st3.ambiguitySource, "MLBF");
   EXPECT_EQ(st3.wdarOffsetAvailable, 0);
   EXPECT_NE(out.find("\nNo WDAR blocks available. Offset frequency estimation unavailable. \n"),
             std::string::npos);
   EXPECT_NE(out.find("\nMLBF results: mean "), std::string::npos);
-  // MLBF good with WDAR: the WDAR offset is measured against the MLBF
-  // ambiguity and removed from its mean.
+  // MLBF good with one WDAR block (too few to decide): MLBF decides and the
+  // WDAR offset against its ambiguity is recorded.
   auto [s4, st4] = run(0.5, 1, out);
   EXPECT_EQ(s4, 0);
   EXPECT_EQ(st4.ambiguity, 1);
+  EXPECT_EQ(st4.ambiguitySource, "MLBF");
   EXPECT_EQ(st4.wdarOffsetAvailable, 1);
-  EXPECT_NEAR(st4.wdarMean, 1.0, 1e-12);
-  EXPECT_NEAR(st4.wdarBlocks.at(0).value, 1.0, 1e-12);
+  EXPECT_NEAR(st4.wdarOffset, st4.wdarMean - 1.0, 1e-12);
 }
 
 }  // namespace
