@@ -54,20 +54,16 @@ TEST(Genpow, SmoothLengthsAndTheExcludedValue) {
   EXPECT_EQ(genpow(5624, 1), 5760);
 }
 
-TEST(FftShift, EvenAndOddRowsAndInverse) {
+TEST(FftShift, EvenAndOddRows) {
   std::vector<fcomplex> even{0, 1, 2, 3, 4, 5, 10, 11, 12, 13, 14, 15};
   fftshift(even.data(), 6, 2);
   std::vector<fcomplex> evenWant{3, 4, 5, 0, 1, 2, 13, 14, 15, 10, 11, 12};
   EXPECT_EQ(even, evenWant);
-  ifftshift(even.data(), 6, 2);
-  EXPECT_EQ(even, (std::vector<fcomplex>{0, 1, 2, 3, 4, 5, 10, 11, 12, 13, 14, 15}));
 
   // a b c d e -> d e a b c
   std::vector<fcomplex> odd{0, 1, 2, 3, 4, 10, 11, 12, 13, 14};
   fftshift(odd.data(), 5, 2);
   EXPECT_EQ(odd, (std::vector<fcomplex>{3, 4, 0, 1, 2, 13, 14, 10, 11, 12}));
-  ifftshift(odd.data(), 5, 2);
-  EXPECT_EQ(odd, (std::vector<fcomplex>{0, 1, 2, 3, 4, 10, 11, 12, 13, 14}));
 
   std::vector<fcomplex> one{7};
   fftshift(one.data(), 1, 1);
@@ -220,20 +216,6 @@ TEST(ChirpZ, ZoomedGridMatchesTheDefiningSum) {
     for (int n = 0; n < M; ++n) s += dcomplex(x[n]) * std::polar(1.0, n * (a * k - b));
     EXPECT_LT(std::abs(dcomplex(X[k]) - s), 1e-4 * std::max(1.0, std::abs(s))) << k;
   }
-}
-
-TEST(FftReal, ForwardMatchesComplexTransformAndRoundTrips) {
-  const int nx = 16, ux = 16, ny = 2, uy = 2;
-  std::vector<float> r(nx * ny);
-  for (int i = 0; i < nx * ny; ++i) r[i] = std::sin(0.3f * i) + 0.1f * i;
-  std::vector<fcomplex> spec((nx / 2 + 1) * ny);
-  ASSERT_EQ(fft_r(nx, ux, ny, uy, FFT_FORWARD, FFT_NONE, r.data(), spec.data()), 0);
-  std::vector<fcomplex> c(r.begin(), r.end());
-  auto want = dft(c.data(), ux, 1, -1);
-  for (int k = 0; k <= ux / 2; ++k) EXPECT_LT(std::abs(dcomplex(spec[k]) - want[k]), 1e-4);
-  std::vector<float> back(nx * ny);
-  ASSERT_EQ(fft_r(nx, ux, ny, uy, FFT_BACKWARD_NORMALISED, FFT_NONE, spec.data(), back.data()), 0);
-  for (int i = 0; i < nx * ny; ++i) EXPECT_NEAR(back[i], r[i], 1e-5f);
 }
 
 }  // namespace

@@ -178,17 +178,6 @@ TEST_F(Environment, FatalPathWritesErrorFileLogsAndDatedTrace) {
   EXPECT_EQ(dated, 1);
 }
 
-TEST_F(Environment, WarningFormGoesOn) {
-  warningReport(EC_FILE_NOT_FOUND, "optional.txt", "fun", "f.cpp", 9);
-  EXPECT_NE(readText(path("Process.trace")).find("\nWARNING : A file was not found; the run goes on "
-                                                 "without it. [FILE ACCESS WARNING] (optional.txt) \n"),
-            std::string::npos);
-  EXPECT_NE(readText(path("Process.log")).find("\nWARNING : [ERROR ID : 261122]A file was not found"),
-            std::string::npos);
-  EXPECT_NE(readText(path("Process.log")).find("FILE=f.cpp   LINE=9"), std::string::npos);
-  EXPECT_FALSE(fs::exists(path("progress.txt_error")));
-}
-
 TEST_F(Environment, ErrorFileForARasterAndItsLimits) {
   writeErrorFile(EC_STAGE_FAILED, std::string(3000, 'd') + "\n" + std::string(40, 'e'),
                  path("raster").c_str());

@@ -8,8 +8,6 @@
 #include "support/files.h"
 #include "support/host_run.h"
 #include "support/point_targets.h"
-#include "focus/sensors/ers.h"
-#include "focus/multiplatform_focuser.h"
 #include "job/focuser_handover.h"
 
 using namespace support;
@@ -43,28 +41,13 @@ TEST(ErsOrbitLookup, ArcFoundFromTheArchiveFolderWhenNoOrbitIsGiven) {
   std::string error;
   ASSERT_TRUE(simulateErs(smallScene(), dir.str(), files, error)) << error;
 
-  ATmultiplatformFocuser f;
-  f.platform = "ERS";
-  f.level0Filename = files["image"];
-  f.auxFile2 = files["leader"];
-  f.auxDirectory1 = files["orbit_archive"];
-  f.processingConfFilename = std::string(resourcesDir()) + "parameters_ERS.hdr";
-  f.outputFilename = dir / "out";
-  ASSERT_EQ(f.InitProcessing(), 0);
-  auto* ers = dynamic_cast<ersLevel0Focuser*>(f.sensorFocuser());
-  ASSERT_NE(ers, nullptr);
-  EXPECT_EQ(ers->orbitFilename, files["orbit"]);
-  EXPECT_EQ(f.auxFile1, files["orbit"]);
-  EXPECT_EQ(ers->LEAFilename, files["leader"]);
-  EXPECT_EQ(f.FinalizeProcessing("headerfile", 0), 0);
-
-  // Through the job's hand-over the found arc comes back into the job.
+  // The arc found by the look-up comes back into the job through its hand-over.
   std::unique_ptr<JobFocuser> job = makeJobFocuser();
   job->job.platform = "ERS";
   job->job.level0Filename = files["image"];
   job->job.auxFile2 = files["leader"];
   job->job.auxDirectory1 = files["orbit_archive"];
-  job->job.processingConfFilename = f.processingConfFilename;
+  job->job.processingConfFilename = std::string(resourcesDir()) + "parameters_ERS.hdr";
   job->job.outputFilename = dir / "out";
   EXPECT_EQ(job->checkpar(), 0);
   EXPECT_EQ(job->InitProcessing(), 0);

@@ -128,42 +128,4 @@ TEST_F(StageTemplate, RunCallsStagesInOrderAndStopsAtTheFirstFailure) {
   }
 }
 
-TEST_F(StageTemplate, DopplerShiftIsBeamCentreToZeroDoppler) {
-  EXPECT_DOUBLE_EQ(stripmapGeneralFocuserModular::getDCshift(300.0, -2000.0), 0.15);
-  EXPECT_DOUBLE_EQ(stripmapGeneralFocuserModular::getDCshift(-300.0, -2000.0), -0.15);
-  EXPECT_DOUBLE_EQ(stripmapGeneralFocuserModular::getDCshift(300.0, 0.0), 0.0);
-}
-
-TEST_F(StageTemplate, ModularStepsSkipWhenTheirFlagIsOffAndCheckTheirInputs) {
-  RecordingFocuser f;
-  EXPECT_EQ(f.rangefoc("a", "b", "c"), 0);  // flags all off
-  EXPECT_EQ(f.dcEst("a"), 0);
-  EXPECT_EQ(f.frEst("a"), 0);
-  EXPECT_EQ(f.azfoc("a", "b", 0.0), 0);
-  f.configuration.generalConf.Flag_rangefoc = 1;
-  f.configuration.generalConf.Flag_dcest = 1;
-  f.configuration.generalConf.Flag_azimuthfoc = 1;
-  EXPECT_EQ(f.rangefoc(path("none"), "b", "c"), 1);
-  EXPECT_TRUE(traced("Raw data image does not exist!"));
-
-  // A range-focused raster without polynomials.
-  writeRaster(path("rg"), 2, 2, std::vector<fcomplex>(4), DataSetInfo_Obj::IT_RANGE_FOCUSED);
-  EXPECT_EQ(f.frEst(path("rg")), 1);
-  EXPECT_TRUE(traced("Doppler Centroid Estimation does not exist!"));
-  EXPECT_EQ(f.azfoc(path("rg"), path("out"), 0.0), 1);
-  EXPECT_EQ(f.frEst(path("nothing")), 1);
-  EXPECT_TRUE(traced("Range focused image does not exist!"));
-
-  // With a centroid but no rate, azimuth focusing refuses rather than
-  // estimating the rate itself.
-  GeneralSAR rec;
-  ASSERT_EQ(rec.GSread(path("rg") + ".hdr"), 0);
-  rec.polynomials.CreatePolys(1, 0);
-  rec.GSenable(GeneralSAR::GS_POLYNOMIALS);
-  ASSERT_EQ(rec.GSwrite(path("rg") + ".hdr"), 0);
-  EXPECT_EQ(f.azfoc(path("rg"), path("out"), 0.0), 1);
-  EXPECT_TRUE(traced("Doppler Rate Estimation does not exist!"));
-  EXPECT_FALSE(std::filesystem::exists(path("out.hdr")));
-}
-
 }  // namespace

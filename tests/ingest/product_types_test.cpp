@@ -42,7 +42,7 @@ TEST(EnvisatTypesTest, EveryProductPrefixHasItsTypeNumber) {
   EXPECT_EQ(EnvisatTypes(dir / "short").is_im0(), 0);
 }
 
-TEST(EnvisatTypesTest, SensingExtentAndOrbitCoverage) {
+TEST(EnvisatTypesTest, SensingExtent) {
   TempFolder dir;
   writeBytes(dir / "im0", mphHead("ASA_IM__0CNPDE", "02-MAR-2008 10:00:00.250000", "02-MAR-2008 10:00:16.750000"));
   ROI_Obj roi;
@@ -57,17 +57,6 @@ TEST(EnvisatTypesTest, SensingExtentAndOrbitCoverage) {
   EXPECT_EQ(roi.FastTimeLength, -1.0);
   EXPECT_EQ(roi.FastTimeDelta, -1.0);
   EXPECT_EQ(EnvisatTypes(dir / "absent").read_roi(&roi), 0);
-
-  writeBytes(dir / "orbit", mphHead("DOR_VOR_AXVF", "01-MAR-2008 21:55:27.000000", "03-MAR-2008 00:23:27.000000"));
-  EXPECT_EQ(EnvisatTypes(dir / "im0").check_dorvor(dir / "orbit"), 1);
-  // Starts equal to the orbit start are not covered.
-  writeBytes(dir / "edge", mphHead("ASA_IM__0CNPDE", "01-MAR-2008 21:55:27.000000"));
-  EXPECT_EQ(EnvisatTypes(dir / "edge").check_dorvor(dir / "orbit"), 0);
-  writeBytes(dir / "late", mphHead("ASA_IM__0CNPDE", "04-MAR-2008 00:00:00.000000"));
-  EXPECT_EQ(EnvisatTypes(dir / "late").check_dorvor(dir / "orbit"), 0);
-  // The product must be an ASAR product (types 1 to 11).
-  writeBytes(dir / "xca", mphHead("ASA_XCA_AXVIEC", "02-MAR-2008 10:00:00.000000"));
-  EXPECT_EQ(EnvisatTypes(dir / "xca").check_dorvor(dir / "orbit"), 0);
 }
 
 TEST(EnvisatTypesTest, RealProductHeads) {

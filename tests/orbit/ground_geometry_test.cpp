@@ -82,10 +82,8 @@ TEST(GeodeticConversion, RoundTripsAtAllLatitudesAndHeights) {
     for (double lon : lons)
       for (double h : heights) {
         const double llh[3] = {lat * kDeg, lon * kDeg, h};
-        double xyz[3], back[3], xyz2[3], g[3];
+        double xyz[3], back[3], xyz2[3];
         llh2xyz(xyz, llh, kA, kB);
-        geo2cart(g, llh);
-        for (int k = 0; k < 3; ++k) EXPECT_NEAR(g[k], xyz[k], 1e-6);
         xyz2llh(xyz, back, kA, kB);
         llh2xyz(xyz2, back, kA, kB);
         for (int k = 0; k < 3; ++k)
@@ -158,8 +156,6 @@ TEST(InverseSolution, ReturnsAzimuthAndRangeTimeOfAGroundPoint) {
   double pts[21], cx[5], cy[5], cz[5];
   orbit.positions(0.0, dt, 7, pts);
   ASSERT_EQ(orb_interp(0.0, pts, dt, cx, cy, cz, 5), 0);
-  double cx7[7], cy7[7], cz7[7];
-  ASSERT_EQ(orb_interp(0.0, pts, dt, cx7, cy7, cz7, 7), 0);
   for (double u : {3.0, 9.3, 10.0, 16.8})
     for (double fd : {0.0, 700.0, -300.0})
       for (double side : {1.0, -1.0})
@@ -178,9 +174,6 @@ TEST(InverseSolution, ReturnsAzimuthAndRangeTimeOfAGroundPoint) {
           double Se[3], Ve[3], Xe[3];
           orbit.state(u, Se, Ve, nullptr);
           ASSERT_EQ(gr_pt(Xe, Se, Ve, tauOf(slant), fd, kLambda, 0.0, side, kA, kB), 0);
-          ASSERT_EQ(inv_grpt_opt_NSV(&t, &tau, cx7, cy7, cz7, Xe, 6 * dt, kLambda, fd, 7), 0);
-          EXPECT_NEAR(t, u, 1e-6);
-          EXPECT_NEAR(tau * kC / 2, slant, 1e-3);
           ASSERT_EQ(inv_grpt_NSV(&t, &tau, pts, Xe, dt, kLambda, fd, 7), 0);
           EXPECT_NEAR(t, u, 1e-6);
         }

@@ -9,7 +9,6 @@
 
 #include "product/antenna_pattern.h"
 #include "product/byte_order.h"
-#include "product/buffer_io.h"
 #include "product/data_file.h"
 #include "product/data_set_info.h"
 #include "product/geo_coords.h"
@@ -50,83 +49,6 @@ TEST(SARPulse, ChirpEnergyAndPhaseForBothSigns) {
   bad.PulseSamplingRate = 1e6;
   bad.Bandwidth = 1e6;
   EXPECT_NE(bad.generateChirp(c), 0);
-}
-
-// A fake ASA_INS / ASA_XCA product: main header, specific header with the
-// data offset at position 231, then the record.
-std::string fakeAsarAux(const std::string& path, const std::vector<unsigned char>& record) {
-  std::string header(1247 + 378, ' ');
-  const std::string offset = "+00000000000000001625<bytes>";
-  header.replace(1247 + 231, offset.size(), offset);
-  std::ofstream out(path, std::ios::binary);
-  out.write(header.data(), static_cast<std::streamsize>(header.size()));
-  out.write(reinterpret_cast<const char*>(record.data()), static_cast<std::streamsize>(record.size()));
-  return path;
-}
-
-TEST(SensorAttitude, DroopGainFromInstrumentFile) {
-  const std::string dir = record_test::freshDir();
-  std::vector<unsigned char> rec(171648, 0);
-  for (int s = 0; s < 5; ++s) {
-    const std::size_t table = 171368 - 68 * static_cast<std::size_t>(4 - s);
-    float2ch(20.0f + s, &rec[table], 'm');
-    for (int i = 0; i < 8; ++i) {
-      const double v = 100.0 * s + i + 0.5;
-      unsigned char b[8];
-      std::memcpy(b, &v, 8);
-      if (get_endian() == 'l') swp8(b);
-      std::memcpy(&rec[table + 4 + 8 * i], b, 8);
-    }
-  }
-  const std::string ins = fakeAsarAux(dir + "/ASA_INS_AX", rec);
-  SensorAttitude_Obj a;
-  ASSERT_EQ(a.getDroopGain(ins, 4), 0);
-  EXPECT_EQ(a.Temperature, 24.0);
-  EXPECT_EQ(a.DroopGain[0], 400.5);
-  EXPECT_EQ(a.DroopGain[7], 407.5);
-  ASSERT_EQ(a.getDroopGain(ins, 1), 0);
-  EXPECT_EQ(a.DroopGain[3], 103.5);
-  EXPECT_EQ(a.Temperature, 21.0);
-  // Swath 5 and above: nothing changes.
-  ASSERT_EQ(a.getDroopGain(ins, 5), 0);
-  EXPECT_EQ(a.DroopGain[3], 103.5);
-  EXPECT_EQ(a.Temperature, 21.0);
-  EXPECT_EQ(a.getDroopGain(dir + "/missing", 1), 9);
-  std::ofstream(dir + "/short", std::ios::binary) << std::string(2000, ' ');
-  EXPECT_EQ(a.getDroopGain(dir + "/short", 1), 4);
-}
-
-TEST(SwathInfo, BurstTimesFromRowPrefixes) {
-  const std::string dir = record_test::freshDir();
-  const std::string raster = dir + "/raw";
-  DataFile layout(raster);
-  layout.NrOfPixelsPerLine = 4;
-  layout.NrOfLinesPerImage = 6;
-  layout.RowPrefix = 17;
-  layout.CellType = INT8_COMPLEX;
-  ASSERT_EQ(layout.write_hdr(), 0);
-  std::ofstream out(raster, std::ios::binary);
-  const double t0 = ascii2sec85("29-MAR-2012 07:11:34.432893");
-  for (int row = 0; row < 6; ++row) {
-    unsigned char prefix[17] = {};
-    const mjd m = sec852mjd(t0 + row * 0.5);
-    std::memcpy(prefix, &m.days, 4);
-    std::memcpy(prefix + 4, &m.seconds, 4);
-    std::memcpy(prefix + 8, &m.microseconds, 4);
-    out.write(reinterpret_cast<const char*>(prefix), 17);
-    out.write("abcdefgh", 8);
-  }
-  out.close();
-  SwathInfo s;
-  s.Bursts = 3;
-  s.Lines_per_burst = 2;
-  ASSERT_EQ(s.readBurstTimes(raster), 0);
-  ASSERT_EQ(s.BurstTimes.size(), 3u);
-  EXPECT_NEAR(s.BurstTimes[0], t0, 1e-6);
-  EXPECT_NEAR(s.BurstTimes[1], t0 + 1.0, 1e-6);
-  EXPECT_NEAR(s.BurstTimes[2], t0 + 2.0, 1e-6);
-  s.Bursts = 4;  // runs past the end
-  EXPECT_EQ(s.readBurstTimes(raster), 4);
 }
 
 TEST(AntennaPattern, RealExternalCalibrationFile) {

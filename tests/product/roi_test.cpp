@@ -7,7 +7,7 @@
 
 namespace {
 
-TEST(RoiObj, AxesIndicesAndCorners) {
+TEST(RoiObj, AxesAndIndices) {
   ROI_Obj r;
   r.SetFastAxe(5e-3, 1e-7, 100);
   r.SetSlowAxe(1000.0, 0.5, 40);
@@ -25,47 +25,8 @@ TEST(RoiObj, AxesIndicesAndCorners) {
   EXPECT_EQ(roundHalfAway(-2.5), -3);
   EXPECT_EQ(roundHalfAway(2.4999), 2);
 
-  double f = 0, s = 0;
-  r.GetUpLeft(&f, &s);
-  EXPECT_DOUBLE_EQ(f, 5e-3);
-  EXPECT_DOUBLE_EQ(s, 1000.0);
-  r.GetDownRight(&f, &s);
-  EXPECT_DOUBLE_EQ(f, 5e-3 + 1e-5);
-  EXPECT_DOUBLE_EQ(s, 1020.0);
-  r.GetUpRight(&f, &s);
-  EXPECT_DOUBLE_EQ(f, 5e-3 + 1e-5);
-  EXPECT_DOUBLE_EQ(s, 1000.0);
-  r.GetDownLeft(&f, &s);
-  EXPECT_DOUBLE_EQ(f, 5e-3);
-  EXPECT_DOUBLE_EQ(s, 1020.0);
-  r.GetCenter(&f, &s);
-  EXPECT_DOUBLE_EQ(f, 5e-3 + 5e-6);
-  EXPECT_DOUBLE_EQ(s, 1010.0);
   r.ResetROI();
   EXPECT_TRUE(r.isNULL());
-}
-
-TEST(RoiObj, Intersection) {
-  ROI_Obj a, b, out;
-  a.SetFastAxe(0.0, 1.0, 100);
-  a.SetSlowAxe(10.0, 0.5, 100);
-  b.SetFastAxe(20.5, 2.0, 100);
-  b.SetSlowAxe(0.0, 1.0, 30);
-  ASSERT_EQ(IntersectROI(a, b, out), 0);
-  EXPECT_DOUBLE_EQ(out.FastStartTime, 20.5);
-  EXPECT_EQ(out.Samples, 79);  // (100 - 20.5) / 1 truncated
-  EXPECT_DOUBLE_EQ(out.FastTimeLength, 79.0);
-  EXPECT_DOUBLE_EQ(out.SlowStartTime, 10.0);
-  EXPECT_EQ(out.Lines, 40);    // (30 - 10) / 0.5
-  EXPECT_DOUBLE_EQ(out.SlowTimeDelta, 0.5);
-
-  ROI_Obj far;
-  far.SetFastAxe(500.0, 1.0, 10);
-  far.SetSlowAxe(10.0, 0.5, 10);
-  IntersectROI(&a, &far, &out);
-  EXPECT_EQ(out.Samples, 0);
-  EXPECT_EQ(out.Lines, 0);
-  EXPECT_TRUE(out.isNULL());
 }
 
 TEST(RoiObj, FileRegion) {

@@ -96,38 +96,6 @@ TEST(TimeBase, RoundTripToTheMicrosecond) {
   EXPECT_EQ(fmt(59.9999996), "01-JAN-1985 00:01:00.000000");
 }
 
-TEST(TimeBase, LeapSecondTable) {
-  int sum = 0;
-  for (int y = 1972; y <= 2006; ++y) sum += TimeFormat::leapSecondsOfYear(y);
-  EXPECT_EQ(sum, 23);  // TAI-UTC went from 10 s in 1972 to 33 s in 2006
-  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1972), 2);
-  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1980), 0);
-  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1985), 1);
-  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1986), 0);
-  EXPECT_EQ(TimeFormat::leapSecondsOfYear(2005), 1);
-  EXPECT_EQ(TimeFormat::leapSecondsOfYear(1971), 0);
-  EXPECT_EQ(TimeFormat::leapSecondsOfYear(2010), 0);
-
-  // Sums from 1985 (included) to 2000 (excluded): 1985, 87, 89, 90, 92-95, 97, 98.
-  TimeFormat t(ascii2sec85("15-JUN-2000 00:00:00"));
-  const double before = t.getSEC85();
-  t.add_leap_seconds(ascii2sec85("01-JAN-1985 00:00:00"));
-  EXPECT_DOUBLE_EQ(t.getSEC85() - before, 10.0);
-  // Argument year not below the object's year: nothing.
-  TimeFormat u(ascii2sec85("15-JUN-1990 00:00:00"));
-  u.add_leap_seconds("01-JAN-1995 00:00:00");
-  EXPECT_DOUBLE_EQ(u.getSEC85(), ascii2sec85("15-JUN-1990 00:00:00"));
-  // Other argument forms: 1999 to 2006 holds only the 2005 second.
-  TimeFormat w("01-JUL-2006 00:00:00");
-  const mjd m1999 = sec852mjd(ascii2sec85("01-JUL-1999 00:00:00"));
-  w.add_leap_seconds(&m1999);
-  EXPECT_DOUBLE_EQ(w.getSEC85(), ascii2sec85("01-JUL-2006 00:00:01"));
-  // Full table from 1972 to 2007.
-  TimeFormat x(ascii2sec85("01-JUL-2007 00:00:00"));
-  x.add_leap_seconds("=\"01-JAN-1972 00:00:00\"");
-  EXPECT_DOUBLE_EQ(x.getSEC85(), ascii2sec85("01-JUL-2007 00:00:23"));
-}
-
 TEST(TimeBase, RealErsLeaderTimes) {
   const std::string path = TESSIVOR_REALDATA_DIR "/ers1_2000_orbit44928/lea_01.001";
   std::ifstream in(path, std::ios::binary);
