@@ -1,6 +1,9 @@
 #include "product/data_set_info.h"
 
 #include "product/record_io.h"
+#include "product/time_base.h"
+
+#include <ctime>
 
 namespace {
 
@@ -234,4 +237,17 @@ int DataSetInfo_Obj::getISNbr() const {
   for (const auto& s : kSwaths)
     if (Swath == s.name) return s.number;
   return 666;
+}
+
+void DataSetInfo_Obj::StampProcessingDate() {
+  const std::time_t now = std::time(nullptr);
+  char stamp[64] = {};
+  ctime_r(&now, stamp);
+  ProcessingDate = std::string(stamp).substr(0, 24);
+}
+
+void DataSetInfo_Obj::SetSenseDate(double sec85) {
+  std::string sense;
+  sec852ascii(sec85, sense);
+  SenseDate = sense.substr(0, 27);
 }

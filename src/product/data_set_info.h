@@ -111,6 +111,10 @@ class DataSetInfo_Obj : public GeneralSAR_Base {
   int getPolarizationNbr() const;
   // ASAR swath number of Swath ("IS1".."IS7", "SS1".."SS5"), else 666.
   int getISNbr() const;
+  // ProcessingDate: now, as ctime writes it without its line end.
+  void StampProcessingDate();
+  // SenseDate of a time in seconds since 1985.
+  void SetSenseDate(double sec85);
 
   std::string OrbitNumber = "NOT_AVAILABLE";
   std::string Track = "NOT_AVAILABLE";

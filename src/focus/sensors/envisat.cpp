@@ -140,11 +140,7 @@ int envisatLevel0Focuser::nameStages() {
     ORV_REPORT("enviextractor object not allocated!", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  work.rawFile = outputFilename + "." + "extracted";
-  work.chirpFile = outputFilename + "." + "chirp";
-  work.antennaFile = outputFilename + "." + "antenna";
-  work.rgfocFile = outputFilename + ".rgfoc";
-  work.outputFile = outputFilename;
+  nameLevel0Stages(work, focuser(), outputFilename, ".antenna", true);
   enviextractor& x = *extractor_;
   x.input.ASA_Level0_File = level0Filename;
   x.input.ASA_INS_File = ASA_INSFilename;
@@ -156,11 +152,6 @@ int envisatLevel0Focuser::nameStages() {
   x.output.OutputRawFile = work.rawFile;
   x.output.OutputChirpFile = work.chirpFile;
   x.output.OutputAntennaPatternFile = work.antennaFile;
-  SARFocuser& f = focuser();
-  f.RawDataFile = work.rawFile;
-  f.ChirpFile = work.chirpFile;
-  f.AntennaFile = work.antennaFile;
-  f.OutputFilename = outputFilename;
   return 0;
 }
 

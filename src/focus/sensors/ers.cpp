@@ -101,11 +101,7 @@ int ersLevel0Focuser::nameStages() {
     ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  work.rawFile = outputFilename + "." + "extracted";
-  work.chirpFile = outputFilename + "." + "chirp";
-  work.antennaFile.clear();
-  work.rgfocFile = outputFilename + ".rgfoc";
-  work.outputFile = outputFilename;
+  nameLevel0Stages(work, focuser(), outputFilename, "", false);
   ATERSExtractor& x = *extractor_;
   x.ImgFilename = level0Filename;
   x.LeaFilename = LEAFilename;
@@ -114,11 +110,6 @@ int ersLevel0Focuser::nameStages() {
   x.ChirpFile = work.chirpFile;
   x.extractPercent = extractLines;
   x.skipPercent = skipLines;
-  SARFocuser& f = focuser();
-  f.RawDataFile = work.rawFile;
-  f.ChirpFile = work.chirpFile;
-  f.AntennaFile = "antenna not exist";
-  f.OutputFilename = outputFilename;
   return 0;
 }
 

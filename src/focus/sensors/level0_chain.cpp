@@ -3,6 +3,7 @@
 #include <cstdio>
 
 #include "diag/report.h"
+#include "focus/sar_focuser.h"
 #include "focus/stripmap_general_focuser.h"
 #include "product/profile.h"
 
@@ -17,6 +18,19 @@ bool fileOpens(const std::string& name) {
 int level0CalledError(int status) {
   ORV_REPORT_CALLED_ERROR();
   return status;
+}
+
+void nameLevel0Stages(FocuserWork& work, SARFocuser& chain, const std::string& root,
+                      const std::string& antennaSuffix, bool chainUsesAntenna) {
+  work.rawFile = root + ".extracted";
+  work.chirpFile = root + ".chirp";
+  work.antennaFile = antennaSuffix.empty() ? std::string() : root + antennaSuffix;
+  work.rgfocFile = root + ".rgfoc";
+  work.outputFile = root;
+  chain.RawDataFile = work.rawFile;
+  chain.ChirpFile = work.chirpFile;
+  chain.AntennaFile = chainUsesAntenna ? work.antennaFile : "antenna not exist";
+  chain.OutputFilename = root;
 }
 
 int readWorkRecords(FocuserWork& work, bool withAntenna) {

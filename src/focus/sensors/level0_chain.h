@@ -4,11 +4,19 @@
 
 struct SARFocuser_conf;
 struct FocuserWork;
+class SARFocuser;
 
 // Profile Memory of section "sarfocuserConfiguration" (256 when absent) and
 // the chain's configuration read from the profile with the fixed values of
 // single scenes. `announceDefault` reports the default at level 1.
 int configureLevel0Chain(SARFocuser_conf& conf, const std::string& profile, bool announceDefault);
+
+// Names the stage rasters of a scene whose products start with `root`
+// ("<root>.extracted", ".chirp", ".rgfoc", the antenna pattern
+// "<root><antennaSuffix>" or none when the suffix is empty) and hands them to
+// the chain, which reads the antenna pattern only when `chainUsesAntenna`.
+void nameLevel0Stages(FocuserWork& work, SARFocuser& chain, const std::string& root,
+                      const std::string& antennaSuffix, bool chainUsesAntenna);
 
 // Records of the extracted rasters into the work object (the antenna's only
 // with `withAntenna`).

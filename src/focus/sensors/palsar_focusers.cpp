@@ -45,11 +45,8 @@ int palsarLevel0Focuser::nameStages(const std::string& scene, const std::string&
     ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
     return 1;
   }
-  work.rawFile = root + ".extracted";
-  work.chirpFile = root + ".chirp";
-  work.antennaFile = root + ".rgpatt";
-  work.rgfocFile = root + ".rgfoc";
-  work.outputFile = root;
+  // No range antenna pattern is extracted: the chain applies none.
+  nameLevel0Stages(work, focuser(), root, ".rgpatt", false);
   ATPalExtractor& x = *extractor_;
   x.LeaFileName = leaderFilename;
   x.RawDataName = scene;
@@ -62,12 +59,6 @@ int palsarLevel0Focuser::nameStages(const std::string& scene, const std::string&
   x.Raw_Focused = 0;
   x.Verbose = 0;
   x.Memory = Memory;
-  SARFocuser& f = focuser();
-  f.RawDataFile = work.rawFile;
-  f.ChirpFile = work.chirpFile;
-  // No range antenna pattern is extracted: the chain applies none.
-  f.AntennaFile = "antenna not exist";
-  f.OutputFilename = root;
   return 0;
 }
 

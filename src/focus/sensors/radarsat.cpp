@@ -62,11 +62,7 @@ int radarsatLevel0Focuser::nameStages() {
     ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  work.rawFile = outputFilename + ".extracted";
-  work.chirpFile = outputFilename + ".chirp";
-  work.antennaFile.clear();
-  work.rgfocFile = outputFilename + ".rgfoc";
-  work.outputFile = outputFilename;
+  nameLevel0Stages(work, focuser(), outputFilename, "", false);
   radarextract& x = *extractor_;
   x.DataFile = level0Filename;
   x.LeaderFile = leaderFilename;
@@ -75,11 +71,6 @@ int radarsatLevel0Focuser::nameStages() {
   x.OutputChirpFile = work.chirpFile;
   x.LinesToExtract = extractLines;
   x.LinesToSkip = skipLines;
-  SARFocuser& f = focuser();
-  f.RawDataFile = work.rawFile;
-  f.ChirpFile = work.chirpFile;
-  f.AntennaFile = "antenna not exist";
-  f.OutputFilename = outputFilename;
   return 0;
 }
 

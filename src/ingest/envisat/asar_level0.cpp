@@ -881,9 +881,6 @@ int fill_enviinfo(const std::string& level0, DataSetInfo_Obj* info) {
   info->Track = h.track;
   info->SenseDate = h.sensingStart;
   info->OrbitConfiguration = h.stopLat < h.startLat ? "DESCENDING" : "ASCENDING";
-  const std::time_t now = std::time(nullptr);
-  char stamp[64] = {};
-  ctime_r(&now, stamp);
-  info->ProcessingDate = std::string(stamp).substr(0, 24);
+  info->StampProcessingDate();
   return 0;
 }

@@ -355,13 +355,8 @@ int ATERSExtractor::readImage() {
   // Description holds four characters, so this is ERS2 for both satellites;
   // the orbit reader decides on Description itself.
   info.SetSensorType(info.Description == "ERS-1" ? DataSetInfo_Obj::ST_ERS1 : DataSetInfo_Obj::ST_ERS2);
-  const std::time_t now = std::time(nullptr);
-  char stamp[64] = {};
-  ctime_r(&now, stamp);
-  info.ProcessingDate = std::string(stamp).substr(0, 24);
-  std::string sense;
-  sec852ascii(roi.SlowStartTime, sense);
-  info.SenseDate = sense.substr(0, 27);
+  info.StampProcessingDate();
+  info.SetSenseDate(roi.SlowStartTime);
   vectorsReady_ = true;
   return 0;
 }

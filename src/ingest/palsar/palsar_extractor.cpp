@@ -421,13 +421,8 @@ int ATPalExtractor::walkImage(bool ersdac) {
   info.SetUnitType(DataSetInfo_Obj::UT_VOLT);
   info.SetSensorType(DataSetInfo_Obj::ST_PALSAR);
   info.SetProjection(DataSetInfo_Obj::PR_SLANT_RANGE);
-  const std::time_t now = std::time(nullptr);
-  char stamp[64] = {};
-  ctime_r(&now, stamp);
-  info.ProcessingDate = std::string(stamp).substr(0, 24);
-  std::string sense;
-  sec852ascii(roi.SlowStartTime, sense);
-  info.SenseDate = sense.substr(0, 27);
+  info.StampProcessingDate();
+  info.SetSenseDate(roi.SlowStartTime);
 
   GeneralSAROrbit& orbit = record.orbit();
   orbit.SVDestroy();

@@ -540,13 +540,8 @@ int radarextract::RADARExtract() {
   info.SetAcqMode(DataSetInfo_Obj::AM_STRIPMAP);
   info.SetSensorType(DataSetInfo_Obj::ST_RADARSAT);
   info.SetProjection(DataSetInfo_Obj::PR_SLANT_RANGE);
-  const std::time_t now = std::time(nullptr);
-  char stamp[64] = {};
-  ctime_r(&now, stamp);
-  info.ProcessingDate = std::string(stamp).substr(0, 24);
-  std::string sense;
-  sec852ascii(firstTime, sense);
-  info.SenseDate = sense.substr(0, 27);
+  info.StampProcessingDate();
+  info.SetSenseDate(firstTime);
 
   // Orbit: the leader's vectors, or a RADARSAT text orbit around the scene centre.
   const std::string orbitPath = OrbitFile.empty() ? LeaderFile : OrbitFile;
