@@ -33,6 +33,8 @@ void usage() {
                "  --azimuth-band F, --range-band F         processed band / sampling rate\n"
                "  --azimuth-spacing M, --range-spacing M   metres per pixel (truth values)\n"
                "  --window N                 analysed window, power of two (32)\n"
+               "  --burst-channel K          burst-mode channel K (0 or 1) of the truth's [Bursts]\n"
+               "                             (with --record: the channel of the record's polarisation)\n"
                "  --json FILE                write the results as JSON\n");
 }
 
@@ -166,6 +168,35 @@ int main(int argc, char** argv) {
     return 9;
   }
   const IrMetrics ta = theoreticalMetrics(opt.azimuth, opt.window, opt.upsample);
+  // Burst-mode channel: the azimuth theory is that of each target's gated
+  // spectrum, from the burst timing of the truth.
+  int channel = -1;
+  BurstSpec burst;
+  if (truth.find("Bursts", "echoes")) {
+    if (a.count("--burst-channel")) {
+      channel = std::atoi(a["--burst-channel"].c_str());
+    } else if (haveRecord) {
+      for (int k = 0; k < 2; ++k) {
+        const std::string* label = truth.find("Bursts", "polarisation_" + std::to_string(k));
+        if (label && *label == record.dataSetInfo.Polarization) channel = k;
+      }
+    }
+    if (channel == 0 || channel == 1) {
+      bool bok = true;
+      burst.echoes = need(truth, "Bursts", "echoes", bok);
+      burst.cycle = need(truth, "Bursts", "cycle_lines", bok);
+      burst.firstLine = need(truth, "Bursts", "first_burst_line_" + std::to_string(channel), bok);
+      burst.prf = prf;
+      if (haveRecord) burst.speed = record.attitude.Eq_speed;
+      if (!bok || !haveRecord) {
+        std::fprintf(stderr, "sarpta: burst theory needs the truth's [Bursts] keys and --record\n");
+        return 10;
+      }
+    } else {
+      channel = -1;
+    }
+  }
+  std::vector<IrMetrics> azimuthTheory;
   const IrMetrics tr = theoreticalMetrics(opt.range, opt.window, opt.upsample);
 
   std::vector<PtaResult> results;
@@ -189,6 +220,15 @@ int main(int argc, char** argv) {
       if (haveRecord) at.azimuthCentroidPrf = record.polynomials.EvaluateDC(tau, ta_) * dt;
       r = analysePointTarget(image, (ta_ - t0) / dt, (tau - r0) / dr + rangeOffset, ph, at);
     }
+    IrMetrics own = ta;
+    if (channel >= 0 && tok) {
+      BurstSpec b = burst;
+      b.zeroDopplerLine = (ta_ - firstLine) * prf;
+      b.rateHz = -std::fabs(record.polynomials.EvaluateFR(tau, ta_));
+      b.centroidHz = record.polynomials.EvaluateDC(tau, ta_);
+      if (b.active()) own = burstTheoreticalMetrics(opt.azimuth, b, opt.window, opt.upsample);
+    }
+    azimuthTheory.push_back(own);
     if (!r.found) {
       ++missing;
       std::printf("%-3d %10.3f %10.3f  not measured: %s\n", i, r.predictedLine, r.predictedSample, r.message.c_str());
@@ -197,6 +237,9 @@ int main(int argc, char** argv) {
                   r.peakLine, r.peakSample, r.errorLine, r.errorSample, r.azimuth.irwPixels, r.range.irwPixels,
                   r.irwAzimuthM, r.irwRangeM, r.azimuth.pslrDb, r.range.pslrDb, r.azimuth.islrDb, r.range.islrDb,
                   r.phaseError);
+      if (channel >= 0)
+        std::printf("    burst theory of channel %d: irwAz %.4f pixels, pslrAz %.2f, islrAz %.2f dB\n", channel,
+                    own.irwPixels, own.pslrDb, own.islrDb);
     }
     results.push_back(r);
   }
@@ -228,7 +271,8 @@ int main(int argc, char** argv) {
                      r.peakLine, r.peakSample, r.errorLine, r.errorSample, r.peakAmplitude, r.phase, r.expectedPhase,
                      r.phaseError, r.irwAzimuthM, r.irwRangeM);
         metrics("azimuth", r.azimuth, ", ");
-        metrics("range", r.range, "");
+        metrics("range", r.range, ", ");
+        metrics("azimuth_theory", azimuthTheory[i], "");
       } else {
         std::string m;
         for (char c : r.message) m += (c == '"' || c == '\\') ? '\'' : c;

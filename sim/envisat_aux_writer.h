@@ -19,7 +19,13 @@ namespace asar_sim {
 inline constexpr float kCarrierHz = 5331004416.0f;
 inline constexpr float kSamplingHz = 19207680.0f;
 inline constexpr float kRangeGateBias = 5.0995e-07f;
-// Ranks of the swaths IS1..IS7 (IM and AP) and the echoes of an IM cycle.
+// Ranks of the swaths IS1..IS7 (IM and AP). The value that follows each
+// rank table counts echoes: 1023 echoes of an IM cycle before its
+// calibration packet, and in AP the echoes of one polarisation's burst
+// before the instrument switches to the other (a cycle of two bursts). The
+// AP values grow with the swath so that a burst spans about the same
+// Doppler band, |Doppler rate| x echoes / PRF (some 250 Hz in IS2), at
+// every incidence; four such bands are about the antenna's Doppler band.
 inline constexpr int kRanks[7] = {9, 9, 12, 10, 13, 11, 14};
 inline constexpr int kApBurstEchoes[7] = {194, 196, 257, 218, 277, 238, 297};
 // Boresight-related first elevation angle of each swath's pattern, degrees.

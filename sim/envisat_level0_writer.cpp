@@ -67,6 +67,38 @@ std::string level0Sph(const AsarSimConfig& cfg, const ModeCodes& m, double start
   return s;
 }
 
+// Labels of the two channels of an alternating-polarisation mode, in the
+// order of their polarisation index.
+std::pair<const char*, const char*> channelLabels(const std::string& mode) {
+  if (mode == "APC") return {"V/V", "H/H"};
+  if (mode == "APH") return {"H/V", "H/H"};
+  return {"V/V", "V/H"};
+}
+
+// The burst timing of an alternating-polarisation scene for the analysis of
+// its channels: a burst of `echoes` lines of one polarisation, then as many
+// of the other, so that each channel repeats every `cycle_lines` lines;
+// `first_burst_line_k` is a line (possibly before line 0) where a burst of
+// channel k begins.
+int appendBurstTruth(const std::string& path, const AsarSimConfig& cfg, std::string& error) {
+  const int e = cfg.burstEchoes();
+  const int into = ((cfg.firstLineCounter() - kApStart) % (2 * e) + 2 * e) % (2 * e);
+  const auto [label0, label1] = channelLabels(cfg.mode);
+  std::ofstream out(path, std::ios::app);
+  out << "\n[Bursts]\n"
+      << "echoes = " << e << "\n"
+      << "cycle_lines = " << 2 * e << "\n"
+      << "first_burst_line_0 = " << -into << "\n"
+      << "first_burst_line_1 = " << e - into << "\n"
+      << "polarisation_0 = " << label0 << "\n"
+      << "polarisation_1 = " << label1 << "\n";
+  if (!out) {
+    error = "cannot write " + path;
+    return 5;
+  }
+  return 0;
+}
+
 }  // namespace
 
 int AsarSimConfig::firstLineCounter() const {
@@ -256,5 +288,6 @@ int writeEnvisatScene(const RawSceneSimulator& sim, const AsarSimConfig& cfg, co
   }
   if (d.truncateImageBytes > 0) fs::resize_file(f.level0, std::uintmax_t(d.truncateImageBytes), ec);
   if (files) *files = f;
-  return sim.writeTruth(outDir + "/truth.txt", error);
+  if (int st = sim.writeTruth(outDir + "/truth.txt", error); st != 0 || cfg.imageMode()) return st;
+  return appendBurstTruth(outDir + "/truth.txt", cfg, error);
 }

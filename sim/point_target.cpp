@@ -159,6 +159,56 @@ IrMetrics theoreticalMetrics(const WindowSpec& w, int extent, int upsample) {
   return profileMetrics(p, 1.0 / upsample, n / 2);
 }
 
+bool BurstSpec::inBurst(double n) const {
+  // Echo line k stands for the times of [k - 1/2, k + 1/2).
+  const double into = std::fmod(n - firstLine + 0.5, cycle);
+  return (into < 0.0 ? into + cycle : into) < echoes;
+}
+
+double BurstSpec::weight(double v, const WindowSpec& window) const {
+  if (std::fabs(v) > 0.5 * window.bandFraction) return 0.0;
+  const double f = centroidHz + v * prf;
+  if (!inBurst(zeroDopplerLine + f / rateHz * prf)) return 0.0;
+  // Band of the de-scalloping filter: the truncated sinc whose main lobe in
+  // frequency spans four burst bandwidths.
+  const double a = 4.0 * std::fabs(rateHz) * echoes / (prf * prf);
+  double h = 1.0;
+  for (int k = 1; k <= taps; ++k) {
+    const double x = consts::kPi * a * k;
+    h += 2.0 * std::sin(x) / x * std::cos(2.0 * consts::kPi * k * v);
+  }
+  double gain = std::fabs(h);
+  if (speed > 0.0) {
+    const double y = consts::kPi * v * prf * 0.5 * patternLength / speed;
+    const double s = y == 0.0 ? 1.0 : std::sin(y) / y;
+    gain /= s * s;
+  }
+  return gain * window.weight(v / window.bandFraction);
+}
+
+IrMetrics burstTheoreticalMetrics(const WindowSpec& window, const BurstSpec& burst, int extent, int upsample) {
+  const int n = extent * upsample;
+  // The gate is a step function of frequency: fine Simpson intervals keep
+  // its edges within a small fraction of a burst bandwidth.
+  const int q = 16384;
+  std::vector<double> wt(q + 1);
+  for (int k = 0; k <= q; ++k)
+    wt[k] = burst.weight(-0.5 + static_cast<double>(k) / q, window) * ((k == 0 || k == q) ? 1 : (k % 2 ? 4 : 2));
+  std::vector<double> p(n);
+  for (int i = 0; i < n; ++i) {
+    const double x = (i - n / 2) / static_cast<double>(upsample);  // lines
+    double re = 0.0, im = 0.0;
+    for (int k = 0; k <= q; ++k) {
+      if (wt[k] == 0.0) continue;
+      const double u = -0.5 + static_cast<double>(k) / q;
+      re += wt[k] * std::cos(2.0 * consts::kPi * u * x);
+      im += wt[k] * std::sin(2.0 * consts::kPi * u * x);
+    }
+    p[i] = re * re + im * im;
+  }
+  return profileMetrics(p, 1.0 / upsample, n / 2);
+}
+
 // ---------------------------------------------------------------- reader
 
 ComplexRasterReader::~ComplexRasterReader() {

@@ -37,6 +37,35 @@ struct WindowSpec {
 // +-extent/2 pixels.
 IrMetrics theoreticalMetrics(const WindowSpec& w, int extentPixels, int upsample);
 
+// One channel of burst-mode azimuth data (alternating polarisation): the
+// channel holds echoes in bursts of `echoes` lines that repeat every
+// `cycle` lines, a burst beginning at line `firstLine` of the line axis of
+// the truth. A target at zero Doppler on line `zeroDopplerLine` of that axis
+// is seen at the Doppler `rateHz` x (t - t0) (rate negative), so the bursts
+// gate its azimuth spectrum: the spectrum holds the bursts' stretches of
+// the Doppler history, each |rate| x echoes / PRF wide. After focusing,
+// the de-scalloping keeps four burst bandwidths about the centroid (the
+// band of a `taps`-tap sinc filter) and divides by the two-way pattern of
+// an antenna of `patternLength` metres seen at the speed `speed`.
+struct BurstSpec {
+  double echoes = 0.0, cycle = 0.0, firstLine = 0.0;
+  double zeroDopplerLine = 0.0;
+  double rateHz = 0.0, centroidHz = 0.0, prf = 0.0;
+  double speed = 0.0, patternLength = 9.0;
+  int taps = 31;  // on each side of the centre
+  bool active() const { return echoes > 0.0 && cycle >= echoes && prf > 0.0 && rateHz != 0.0; }
+  // Whether line n (continuous) lies in a burst of the channel.
+  bool inBurst(double n) const;
+  // Spectral weight at v = (f - centroid) / PRF, v in [-1/2, 1/2], with the
+  // azimuth window of the product over its look band.
+  double weight(double v, const WindowSpec& window) const;
+};
+// Theoretical measures of the azimuth response of a burst-mode channel at
+// one target: the response integrated from BurstSpec::weight, sampled as
+// theoreticalMetrics does. The burst gate, not the window, sets its
+// sidelobes; its width follows the burst bandwidths that the gate lets pass.
+IrMetrics burstTheoreticalMetrics(const WindowSpec& window, const BurstSpec& burst, int extentPixels, int upsample);
+
 // Complex float raster read by windows; cells outside read as zero.
 class ComplexRasterReader {
  public:

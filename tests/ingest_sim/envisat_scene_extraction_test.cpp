@@ -17,6 +17,7 @@
 #include "ingest/envisat/enviextractor.h"
 #include "ingest/product_types.h"
 #include "product/product_aggregates.h"
+#include "product/profile.h"
 #include "sim/envisat_aux_writer.h"
 #include "sim/envisat_level0_writer.h"
 
@@ -134,6 +135,29 @@ TEST_F(AsarSceneTest, CleanImageModeScene) {
   EXPECT_EQ(raw.orbit().pos.size(), 15u);  // five vectors from the DORIS file
   EXPECT_TRUE(fs::exists(ex_.output.OutputChirpFile));
   EXPECT_TRUE(fs::exists(ex_.output.OutputAntennaPatternFile));
+
+  // The extraction parameter record of the scene carries the same values.
+  const std::string record = (dir_ / "extraction.par").string();
+  ASSERT_EQ(write_param(record, ex_.par, &ex_.ext, files_.level0, files_.ins, 1), 0);
+  const char* s = "ExtractionParameters";
+  std::vector<int> ints;
+  ASSERT_EQ(GetMyProfileIntArray(s, "SWST_code", ints, 1, record), 0);
+  EXPECT_EQ(ints.at(0), sim_->swstCode());
+  ASSERT_EQ(GetMyProfileIntArray(s, "PRI_code", ints, 1, record), 0);
+  EXPECT_EQ(ints.at(0), 11641);
+  ASSERT_EQ(GetMyProfileIntArray(s, "Swath_rank(R)", ints, 1, record), 0);
+  EXPECT_EQ(ints.at(0), 9);
+  ASSERT_EQ(GetMyProfileIntArray(s, "Pulse_length", ints, 1, record), 0);
+  EXPECT_EQ(ints.at(0), 519);
+  std::vector<double> v;
+  ASSERT_EQ(GetMyProfileDoubleArray(s, "Sampling_frequency", v, 1, record), 0);
+  EXPECT_DOUBLE_EQ(v.at(0), 19207680.0);
+  ASSERT_EQ(GetMyProfileDoubleArray(s, "Azimuth_time_reference", v, 1, record), 0);
+  EXPECT_NEAR(v.at(0), scene_.startTime, 1e-5);
+  std::string text;
+  ASSERT_EQ(GetMyProfileString("Paths", "ASA_INS_Full_Name", text, record), 0);
+  EXPECT_EQ(text, files_.ins);
+  FreeProfile(record);
 }
 
 TEST_F(AsarSceneTest, PartOfTheSceneByPercentages) {

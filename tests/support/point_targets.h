@@ -29,6 +29,7 @@ struct PtaTarget {
   bool found = false;
   double errorLine = 0.0, errorSample = 0.0, phaseError = 0.0;
   IrMetrics azimuth, range;
+  IrMetrics azimuthTheory;  // the target's own azimuth theory (burst-mode channels)
 };
 struct PtaReport {
   int exitStatus = -1;
@@ -44,7 +45,8 @@ PtaReport runSarpta(const std::string& folder, const std::vector<std::string>& a
 PtaReport analyseProduct(const std::string& folder, const std::string& product, const std::string& record,
                          const std::string& truth);
 
-// Every target found, IRW and PSLR of both axes within the bars of the theory.
+// Every target found, IRW and PSLR of both axes within the bars of the theory
+// (in azimuth the target's own theory where sarpta gives one).
 void expectTheoreticalResponses(const PtaReport& pta, std::size_t targets);
 
 // Every target within kProductPixels of its truth position (moved by
