@@ -1,5 +1,6 @@
 #include "focus/sar_focuser.h"
 
+#include <charconv>
 #include <cmath>
 #include <cstdio>
 #include <new>
@@ -34,18 +35,6 @@ int calledError(int status) {
 }
 
 double sincPi(double x) { return x == 0.0 ? 1.0 : std::sin(kPi * x) / (kPi * x); }
-
-bool opens(const std::string& name) {
-  if (name.empty()) return false;
-  std::FILE* f = std::fopen(name.c_str(), "rb");
-  if (!f) return false;
-  std::fclose(f);
-  return true;
-}
-
-void removeReported(const std::string& name) {
-  if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
-}
 
 // Values taken from the raw record for the kernels.
 struct ChainContext {
@@ -164,7 +153,26 @@ void readValue(const std::string& file, const std::string& section, const std::s
   readDouble(file, section, key, value);
 }
 
+// A value of the configuration document into the chain's block.
+void fromDocument(int& value, int document) { value = document; }
+void fromDocument(double& value, int document) { value = document; }
+void fromDocument(double& value, float document) { value = documentReal(document); }
+
 }  // namespace
+
+// ---- files ----------------------------------------------------------------------
+
+bool fileOpens(const std::string& name) {
+  if (name.empty()) return false;
+  std::FILE* f = std::fopen(name.c_str(), "rb");
+  if (!f) return false;
+  std::fclose(f);
+  return true;
+}
+
+void removeReported(const std::string& name) {
+  if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
+}
 
 // ---- kernels --------------------------------------------------------------------
 
@@ -187,6 +195,29 @@ int estimateCentroid(DcEstInput& input, DcEstState& state, double poly[7]) {
 int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
                  const AzimuthFocusConf& conf) {
   return azimuthfoc(files, scene, conf);
+}
+
+int centroidStep(const SARFocuser_conf& conf, DcEstInput& input, double fc, double fs,
+                 const fcomplex* inMemory, poly& dc) {
+  DcEstState state;
+  fillDcEstState(conf, fc, fs, state);
+  if (inMemory) {
+    state.inMemory = 1;
+    state.data = inMemory;
+  }
+  double c[7] = {0, 0, 0, 0, 0, 0, 0};
+  if (int st = estimateCentroid(input, state, c); st != 0) return st;
+  for (int i = 0; i < 7; ++i) dc.c[i] = c[i];
+  return 0;
+}
+
+int azimuthStep(const AzimuthFocusFiles& files, const AzimuthFocusConf& conf, const poly& dc,
+                const poly& fr, int samples, int lines, AzimuthFocusScene& scene) {
+  scene.samples = samples;
+  scene.lines = lines;
+  polyToFlat(dc, scene.polyDC);
+  polyToFlat(fr, scene.polyFR);
+  return focusAzimuth(files, scene, conf);
 }
 
 DcEstInput dcEstInput(const std::string& raster, const std::string& outDir, int samples, int lines,
@@ -240,6 +271,14 @@ AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, doubl
   return ac;
 }
 
+double documentReal(float value) {
+  char text[32];
+  const auto written = std::to_chars(text, text + sizeof text, value);
+  double result = value;
+  std::from_chars(text, written.ptr, result);
+  return result;
+}
+
 SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& c) {
   SARFocuser_conf conf;
   conf.clear();
@@ -251,11 +290,13 @@ SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& c) {
   conf.ReportFilename = common.ReportFilename;
 
   const DCestConf& d = c.dcestConf;
-  forEachDcEstValue([&](const char*, auto chain, auto document, auto) { conf.*chain = d.*document; });
+  forEachDcEstValue(
+      [&](const char*, auto chain, auto document, auto) { fromDocument(conf.*chain, d.*document); });
   for (int i = 0; i < 7; ++i) conf.Pol_Weights[i] = d.Pol_weights[i];
 
   const AzimuthConf& a = c.azimuthConf;
-  forEachAzimuthValue([&](const char*, auto chain, auto document, auto) { conf.*chain = a.*document; });
+  forEachAzimuthValue(
+      [&](const char*, auto chain, auto document, auto) { fromDocument(conf.*chain, a.*document); });
   conf.RangeOverlap = a.RangeOverlap / 2;
   conf.AzimuthOverlap = a.AzimuthOverlap / 2;
 
@@ -309,7 +350,7 @@ void SARFocuser_conf::clear() {
 
 int SARFocuser_conf::readpar(const std::string& file) {
   clear();
-  if (!opens(file)) {
+  if (!fileOpens(file)) {
     ORV_REPORT("File not opened! (" + file + ")", REPORT_ERROR);
     return STATUS_NOT_OPENED;
   }
@@ -326,7 +367,7 @@ int SARFocuser_conf::readpar(const std::string& file) {
 }
 
 int SARFocuser_conf::readconf(const std::string& file) {
-  if (!opens(file)) {
+  if (!fileOpens(file)) {
     ORV_REPORT("File not opened! (" + file + ")", REPORT_ERROR);
     return STATUS_NOT_OPENED;
   }
@@ -436,9 +477,9 @@ int SARFocuser::run() {
     ORV_REPORT("Focusing configuration not set", REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
-  if (opens(RawDataFile)) {
+  if (fileOpens(RawDataFile)) {
     ORV_REPORT("STRIPMAP RAW DATA DETECTED, FOCUSSING...", REPORT_CHECKPOINT);
-    if (!opens(ChirpFile)) {
+    if (!fileOpens(ChirpFile)) {
       ORV_REPORT(" Chirp file does not exists! (" + ChirpFile + ")", 17);
       return STATUS_BAD_PARAMETER;
     }
@@ -449,7 +490,7 @@ int SARFocuser::run() {
   }
 
   // Alternating polarisation: two channels "<raw>1" and "<raw>2".
-  if (!opens(RawDataFile + "1")) {
+  if (!fileOpens(RawDataFile + "1")) {
     ORV_REPORT("Raw Data file does not exists!", REPORT_IMAGE_MISSING);
     return STATUS_BAD_PARAMETER;
   }
@@ -458,7 +499,7 @@ int SARFocuser::run() {
   int status = 0;
   for (int k = 1; k <= 2 && status == 0; ++k) {
     const std::string n = std::to_string(k);
-    if (!opens(chirp + n)) {
+    if (!fileOpens(chirp + n)) {
       ORV_REPORT("Chirp file does not exists!", 17);
       status = STATUS_BAD_PARAMETER;
       break;
@@ -594,16 +635,11 @@ int SARFocuser::process() {
   frPoly.taz0 = ctx.azimuthStart;
   if (conf.Flag_dcest) {
     DcEstInput in = dcEstInput(ctx.rgfocFile, ".", rgSamples, rgLines, ctx.prf_hz, ctx.azimuthStart);
-    DcEstState state;
-    fillDcEstState(conf, ctx.fc_hz, ctx.frg_hz, state);
-    if (conf.Incore) {
-      state.inMemory = 1;
-      state.data = rw.data.data();
-    }
     ORV_REPORT("DC Estimation", REPORT_CHECKPOINT);
-    double c[7] = {0, 0, 0, 0, 0, 0, 0};
-    if (int st = estimateCentroid(in, state, c); st != 0) return calledError(st);
-    for (int i = 0; i < 7; ++i) dcPoly.c[i] = c[i];
+    if (int st = centroidStep(conf, in, ctx.fc_hz, ctx.frg_hz,
+                              conf.Incore ? rw.data.data() : nullptr, dcPoly);
+        st != 0)
+      return calledError(st);
 
     ORV_REPORT("GEOMETRIC POLYNOMIALS COMPUTATION", REPORT_CHECKPOINT);
     GeneralSAROrbit& orbit = rawRecord.orbit();
@@ -675,10 +711,6 @@ int SARFocuser::process() {
     const AzimuthFocusFiles files =
         azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
     scene.verbose = conf.Verbose;
-    scene.samples = rgSamples;
-    scene.lines = rgLines;
-    polyToFlat(dcPoly, scene.polyDC);
-    polyToFlat(frPoly, scene.polyFR);
     scene.DCref = conf.DCref;
     scene.inCore = conf.Incore;
     scene.buffer = conf.Incore ? rw.data.data() : nullptr;
@@ -687,7 +719,8 @@ int SARFocuser::process() {
     char text[64];
     std::snprintf(text, sizeof text, "DCref: %f", conf.DCref);
     ORV_REPORT(text, REPORT_MESSAGE);
-    if (int st = focusAzimuth(files, scene, ac); st != 0) return calledError(st);
+    if (int st = azimuthStep(files, ac, dcPoly, frPoly, rgSamples, rgLines, scene); st != 0)
+      return calledError(st);
     if (conf.DeleteTempFiles) {
       removeReported(ctx.rgfocFile);
       removeReported(ctx.rgfocFile + ".hdr");

@@ -7,14 +7,6 @@
 #include "focus/stripmap_general_focuser.h"
 #include "product/profile.h"
 
-bool fileOpens(const std::string& name) {
-  if (name.empty()) return false;
-  std::FILE* f = std::fopen(name.c_str(), "rb");
-  if (!f) return false;
-  std::fclose(f);
-  return true;
-}
-
 int level0CalledError(int status) {
   ORV_REPORT_CALLED_ERROR();
   return status;

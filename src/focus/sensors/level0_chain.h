@@ -2,9 +2,9 @@
 // Chain set-up shared by the focusers of single level-0 scenes.
 #include <string>
 
-struct SARFocuser_conf;
+#include "focus/sar_focuser.h"
+
 struct FocuserWork;
-class SARFocuser;
 
 // Profile Memory of section "sarfocuserConfiguration" (256 when absent) and
 // the chain's configuration read from the profile with the fixed values of
@@ -21,9 +21,6 @@ void nameLevel0Stages(FocuserWork& work, SARFocuser& chain, const std::string& r
 // Records of the extracted rasters into the work object (the antenna's only
 // with `withAntenna`).
 int readWorkRecords(FocuserWork& work, bool withAntenna);
-
-// True when the file opens for reading.
-bool fileOpens(const std::string& name);
 
 // The call-tree report; returns status.
 int level0CalledError(int status);
