@@ -253,11 +253,11 @@ int ATstripmlook::coherml() {
   const int a = AzimuthMLFactor, r = RangeMLFactor;
   if (r < 1) {
     ORV_REPORT("Fast Undersampling factor must be >=1", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (a < 1) {
     ORV_REPORT("Slow Undersampling factor must be >=1", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (!recordRead_) return ML_FAIL("No input record read for " + SLCInput, STATUS_BAD_CONDITION);
   const int L = input.dataFile.NrOfLinesPerImage, S = input.dataFile.NrOfPixelsPerLine;

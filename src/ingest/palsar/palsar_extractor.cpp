@@ -415,7 +415,7 @@ int ATPalExtractor::walkImage(bool ersdac) {
 }
 
 int ATPalExtractor::extract_chirp(int channel, std::vector<fcomplex>& chirp) const {
-  if (channel < 0 || channel >= numberOfChannels) return 1;
+  if (channel < 0 || channel >= numberOfChannels) return STATUS_BAD_CONDITION;
   const double T = record.pulse.PulseLength, fs = record.sampling.frg_hz, B = record.pulse.Bandwidth;
   if (!(T > 0.0) || !(fs > 0.0) || !(B > 0.0)) return PAL_FAIL("Bad pulse parameters for the PALSAR chirp", STATUS_BAD_PARAMETER);
   const double x = T * fs;
@@ -463,13 +463,13 @@ int ATPalExtractor::write_chirp(const std::string& header, const std::string& ou
 }
 
 int ATPalExtractor::getOutputFilename(int channel, std::string& name) const {
-  if (channel < 0 || channel >= numberOfChannels) return 1;
+  if (channel < 0 || channel >= numberOfChannels) return STATUS_BAD_CONDITION;
   name = numberOfChannels > 1 ? OutputFile + std::to_string(channel) : OutputFile;
   return 0;
 }
 
 int ATPalExtractor::getPolarization(int channel, std::string& pol) const {
-  if (channel < 0 || channel >= numberOfChannels) return 1;
+  if (channel < 0 || channel >= numberOfChannels) return STATUS_BAD_CONDITION;
   pol = polarization_;
   return 0;
 }
