@@ -518,19 +518,38 @@ int SARFocuser::run() {
   return status;
 }
 
-int SARFocuser::process() {
-  SARFocuser_conf& conf = *conf_;
-  GeneralRAWData rawRecord;
+namespace {
+
+// One raster through the chain: the raw record and the values taken from it,
+// the replica, the range focuser's work, the Doppler polynomials and the
+// result of azimuth focusing, handed from one step to the next.
+struct ChainRun {
+  SARFocuser_conf& conf;
   ChainContext ctx;
+  GeneralRAWData rawRecord;
+  std::vector<fcomplex> chirp;
+  RangeFocParams rp;
+  RangeFocWork rw;
+  int rgSamples = 0;
+  int rgLines = 0;
+  polyDC dcPoly;
+  polyFR frPoly;
+  AzimuthFocusScene scene;
 
-  ctx.reportFile = conf.ReportFilename;
-  ctx.rawFile = RawDataFile;
-  ctx.chirpFile = ChirpFile;
-  ctx.outputFile = OutputFilename;
-  if (conf.Flag_rangefoc) ctx.rgfocFile = OutputFilename + ".rgfoc";
+  int readRawRecord(const std::string& raw);
+  int readReplica(const std::string& chirpName);
+  int rangeStep(const std::string& raw);
+  int dopplerStep();
+  int writeRangeFocusedRecord();
+  int azimuthStage();
+  int writeFocusedRecord();
+};
 
-  if (int st = rawRecord.readhdr(RawDataFile + ".hdr"); st != 0) {
-    ORV_REPORT("Cannot read the raw data record " + RawDataFile + ".hdr", REPORT_ERROR);
+// The raw record, the sampling and region values of the chain, the look
+// sign and the whole-image shift sentinels.
+int ChainRun::readRawRecord(const std::string& raw) {
+  if (int st = rawRecord.readhdr(raw + ".hdr"); st != 0) {
+    ORV_REPORT("Cannot read the raw data record " + raw + ".hdr", REPORT_ERROR);
     return calledError(st);
   }
 
@@ -551,7 +570,7 @@ int SARFocuser::process() {
   rawRecord.orbit().setLookSign(lookSign);
   ctx.antennaLength = conf.AntennaLength;
   if (ctx.frg_hz <= 0.0 || ctx.prf_hz <= 0.0 || ctx.lines < 1 || ctx.samples < 1) {
-    ORV_REPORT("Sampling values of the raw data record are wrong: " + RawDataFile + ".hdr",
+    ORV_REPORT("Sampling values of the raw data record are wrong: " + raw + ".hdr",
                REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
@@ -559,14 +578,16 @@ int SARFocuser::process() {
   // 1.0 is the sentinel of "the whole image".
   if (conf.ApplyAzShift == 1.0) conf.ApplyAzShift = ctx.lines;
   if (conf.ApplyRgShift == 1.0) conf.ApplyRgShift = ctx.samples;
+  return 0;
+}
 
-  // The whole replica in memory.
+// The whole replica in memory.
+int ChainRun::readReplica(const std::string& chirpName) {
   DataFile chirpFile;
-  if (int st = chirpFile.read_hdr(ChirpFile); st != 0) {
-    ORV_REPORT("Cannot read the chirp header " + ChirpFile + ".hdr", REPORT_ERROR);
+  if (int st = chirpFile.read_hdr(chirpName); st != 0) {
+    ORV_REPORT("Cannot read the chirp header " + chirpName + ".hdr", REPORT_ERROR);
     return calledError(st);
   }
-  std::vector<fcomplex> chirp;
   try {
     chirp.assign(std::max(chirpFile.NrOfPixelsPerLine, 0), fcomplex(0.0f, 0.0f));
   } catch (const std::bad_alloc&) {
@@ -580,8 +601,13 @@ int SARFocuser::process() {
     chirpFile.close();
     if (st != 0) return calledError(st);
   }
+  return 0;
+}
 
-  RangeFocParams rp;
+// Range focusing of the raw raster into ".rgfoc" (or into memory with
+// Incore); the raw raster, the report and the replica go when the chain
+// erases its inputs.
+int ChainRun::rangeStep(const std::string& raw) {
   rp.inputFile = ctx.rawFile;
   rp.outputFile = ctx.rgfocFile;
   rp.fs = ctx.frg_hz;
@@ -590,7 +616,6 @@ int SARFocuser::process() {
   rp.prf = ctx.prf_hz;
   rp.lines = ctx.lines;
   rp.samples = ctx.samples;
-  RangeFocWork rw;
   rw.verbose = conf.Verbose;
   rw.replica = chirp.data();
   rw.replicaLen = static_cast<int>(chirp.size());
@@ -598,13 +623,11 @@ int SARFocuser::process() {
   rw.prefix = rawRecord.dataFile.RowPrefix > 0 ? 1 : 0;
   rw.incore = conf.Incore;
   if (rawRecord.dataFile.RowPrefix != 0 && rawRecord.dataFile.RowPrefix != 4) {
-    ORV_REPORT("Raw raster rows must carry a 4-byte sampling window prefix: " + RawDataFile,
-               REPORT_ERROR);
+    ORV_REPORT("Raw raster rows must carry a 4-byte sampling window prefix: " + raw, REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
   if (rawRecord.dataFile.HeaderOffset != 0) {
-    ORV_REPORT("Raw raster with a header block cannot be range focused: " + RawDataFile,
-               REPORT_ERROR);
+    ORV_REPORT("Raw raster with a header block cannot be range focused: " + raw, REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
 
@@ -623,12 +646,14 @@ int SARFocuser::process() {
       removeReported(ctx.chirpFile + ".hdr");
     }
   }
-  const int rgSamples = rw.outSamples;
-  const int rgLines = rw.outLines;
+  rgSamples = rw.outSamples;
+  rgLines = rw.outLines;
+  return 0;
+}
 
-  // Doppler centroid and the geometric Doppler rate.
-  polyDC dcPoly;
-  polyFR frPoly;
+// Doppler centroid estimated from the range-focused raster and the
+// geometric Doppler rate, or both taken from an earlier product.
+int ChainRun::dopplerStep() {
   dcPoly.trg0 = ctx.swstMin;
   dcPoly.taz0 = ctx.azimuthStart;
   frPoly.trg0 = ctx.swstMin;
@@ -671,71 +696,72 @@ int SARFocuser::process() {
     frPoly.trg0 = conf.GivenFRref[0];
     frPoly.taz0 = conf.GivenFRref[1];
   }
+  return 0;
+}
 
-  // Record of the range-focused raster.
-  if (conf.Flag_rangefoc) {
-    GeneralSLCData rg;
-    rawRecord.dataSetInfo.clone(&rg.dataSetInfo);
-    rg.dataSetInfo.SWST_MIN = rg.dataSetInfo.SWST_MAX = ctx.swstMin;
-    rg.dataSetInfo.Description = "StripMap Range Focused Image File";
-    rg.dataSetInfo.ProcessingSoftware = "SARFocuser v1.0";
-    rg.dataSetInfo.ProcessingCenter = "Orvane - Lumbrao";
-    rg.dataSetInfo.Swath = rawRecord.dataSetInfo.Swath;
-    rg.dataSetInfo.OrbitConfiguration = rawRecord.dataSetInfo.OrbitConfiguration;
-    rg.dataSetInfo.Polarization = rawRecord.dataSetInfo.Polarization;
-    rg.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
-    rg.rasterName = ctx.rgfocFile;
-    setComplexRasterLayout(rg.dataFile, ctx.rgfocFile, rgSamples, rgLines);
-    rg.roi.SetFastAxe(ctx.swstMin, rawRoi.FastTimeDelta, rgSamples);
-    rg.roi.SetSlowAxe(ctx.azimuthStart, rawRoi.SlowTimeDelta, rgLines);
-    rg.polynomials.CreatePolys(1, 1);
-    rg.polynomials.DC[0] = dcPoly;
-    rg.polynomials.FR[0] = frPoly;
-    rg.attitude.Eq_speed = kEqSpeedPlaceholder;
-    rg.attitude.Mean_DC = -1.0;
-    rg.attitude.SquintAngle = -1.0;
-    setHammingWindows(rg.spectralWindows, conf);
-    rawRecord.orbit().clone(&rg.orbit());
-    if (int st = rg.orbit().SVGetGeoCoords(&rg.geoCoords, &rg.roi); st != 0)
-      return calledError(st);
-    rawRecord.sampling.clone(&rg.sampling);
-    rawRecord.pulse.clone(&rg.pulse);
-    rawRecord.swath.clone(&rg.swath);
-    if (int st = rg.writehdr(); st != 0) return calledError(st);
-    rg.destroyAll();
+// Record of the range-focused raster.
+int ChainRun::writeRangeFocusedRecord() {
+  const ROI_Obj& rawRoi = rawRecord.roi;
+  GeneralSLCData rg;
+  rawRecord.dataSetInfo.clone(&rg.dataSetInfo);
+  rg.dataSetInfo.SWST_MIN = rg.dataSetInfo.SWST_MAX = ctx.swstMin;
+  rg.dataSetInfo.Description = "StripMap Range Focused Image File";
+  rg.dataSetInfo.ProcessingSoftware = "SARFocuser v1.0";
+  rg.dataSetInfo.ProcessingCenter = "Orvane - Lumbrao";
+  rg.dataSetInfo.Swath = rawRecord.dataSetInfo.Swath;
+  rg.dataSetInfo.OrbitConfiguration = rawRecord.dataSetInfo.OrbitConfiguration;
+  rg.dataSetInfo.Polarization = rawRecord.dataSetInfo.Polarization;
+  rg.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
+  rg.rasterName = ctx.rgfocFile;
+  setComplexRasterLayout(rg.dataFile, ctx.rgfocFile, rgSamples, rgLines);
+  rg.roi.SetFastAxe(ctx.swstMin, rawRoi.FastTimeDelta, rgSamples);
+  rg.roi.SetSlowAxe(ctx.azimuthStart, rawRoi.SlowTimeDelta, rgLines);
+  rg.polynomials.CreatePolys(1, 1);
+  rg.polynomials.DC[0] = dcPoly;
+  rg.polynomials.FR[0] = frPoly;
+  rg.attitude.Eq_speed = kEqSpeedPlaceholder;
+  rg.attitude.Mean_DC = -1.0;
+  rg.attitude.SquintAngle = -1.0;
+  setHammingWindows(rg.spectralWindows, conf);
+  rawRecord.orbit().clone(&rg.orbit());
+  if (int st = rg.orbit().SVGetGeoCoords(&rg.geoCoords, &rg.roi); st != 0)
+    return calledError(st);
+  rawRecord.sampling.clone(&rg.sampling);
+  rawRecord.pulse.clone(&rg.pulse);
+  rawRecord.swath.clone(&rg.swath);
+  if (int st = rg.writehdr(); st != 0) return calledError(st);
+  rg.destroyAll();
+  return 0;
+}
+
+// Azimuth focusing of the range-focused raster into the output; the
+// range-focused raster goes when the chain erases its inputs.
+int ChainRun::azimuthStage() {
+  const SamplingConstants_Obj& smp = rawRecord.sampling;
+  if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
+  const AzimuthFocusFiles files =
+      azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
+  scene.verbose = conf.Verbose;
+  scene.DCref = conf.DCref;
+  scene.inCore = conf.Incore;
+  scene.buffer = conf.Incore ? rw.data.data() : nullptr;
+  const AzimuthFocusConf ac = azimuthFocusConf(conf, ctx.frg_hz, ctx.prf_hz);
+  ORV_REPORT("Azimuth Focusing", REPORT_CHECKPOINT);
+  char text[64];
+  std::snprintf(text, sizeof text, "DCref: %f", conf.DCref);
+  ORV_REPORT(text, REPORT_MESSAGE);
+  if (int st = azimuthStep(files, ac, dcPoly, frPoly, rgSamples, rgLines, scene); st != 0)
+    return calledError(st);
+  if (conf.DeleteTempFiles) {
+    removeReported(ctx.rgfocFile);
+    removeReported(ctx.rgfocFile + ".hdr");
   }
+  return 0;
+}
 
-  AzimuthFocusScene scene;
-  if (conf.Flag_azimuthfoc) {
-    if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
-    const AzimuthFocusFiles files =
-        azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
-    scene.verbose = conf.Verbose;
-    scene.DCref = conf.DCref;
-    scene.inCore = conf.Incore;
-    scene.buffer = conf.Incore ? rw.data.data() : nullptr;
-    const AzimuthFocusConf ac = azimuthFocusConf(conf, ctx.frg_hz, ctx.prf_hz);
-    ORV_REPORT("Azimuth Focusing", REPORT_CHECKPOINT);
-    char text[64];
-    std::snprintf(text, sizeof text, "DCref: %f", conf.DCref);
-    ORV_REPORT(text, REPORT_MESSAGE);
-    if (int st = azimuthStep(files, ac, dcPoly, frPoly, rgSamples, rgLines, scene); st != 0)
-      return calledError(st);
-    if (conf.DeleteTempFiles) {
-      removeReported(ctx.rgfocFile);
-      removeReported(ctx.rgfocFile + ".hdr");
-    }
-  }
-
-  if (conf.Incore) {
-    RangeFocParams out = rp;
-    out.outputFile = ctx.outputFile;
-    rw.outSamples = scene.outSamples;
-    rw.outLines = scene.outLines;
-    if (int st = dest_buffer(out, rw); st != 0) return calledError(st);
-  }
-
-  // Record of the focused product.
+// Record of the focused product, written beside it.
+int ChainRun::writeFocusedRecord() {
+  const ROI_Obj& rawRoi = rawRecord.roi;
   GeneralSAR product;
   rawRecord.dataSetInfo.clone(&product.dataSetInfo);
   DataSetInfo_Obj& info = product.dataSetInfo;
@@ -784,7 +810,43 @@ int SARFocuser::process() {
     product.GSenable(o);
   if (int st = product.GSwrite(ctx.outputFile + ".hdr"); st != 0) return calledError(st);
   product.GSdestroy();
-  rawRecord.destroyAll();
+  return 0;
+}
+
+}  // namespace
+
+int SARFocuser::process() {
+  ChainRun run{.conf = *conf_};
+  SARFocuser_conf& conf = run.conf;
+  ChainContext& ctx = run.ctx;
+
+  ctx.reportFile = conf.ReportFilename;
+  ctx.rawFile = RawDataFile;
+  ctx.chirpFile = ChirpFile;
+  ctx.outputFile = OutputFilename;
+  if (conf.Flag_rangefoc) ctx.rgfocFile = OutputFilename + ".rgfoc";
+
+  if (int st = run.readRawRecord(RawDataFile); st != 0) return st;
+  if (int st = run.readReplica(ChirpFile); st != 0) return st;
+  if (int st = run.rangeStep(RawDataFile); st != 0) return st;
+  if (int st = run.dopplerStep(); st != 0) return st;
+  if (conf.Flag_rangefoc) {
+    if (int st = run.writeRangeFocusedRecord(); st != 0) return st;
+  }
+  if (conf.Flag_azimuthfoc) {
+    if (int st = run.azimuthStage(); st != 0) return st;
+  }
+
+  if (conf.Incore) {
+    RangeFocParams out = run.rp;
+    out.outputFile = ctx.outputFile;
+    run.rw.outSamples = run.scene.outSamples;
+    run.rw.outLines = run.scene.outLines;
+    if (int st = dest_buffer(out, run.rw); st != 0) return calledError(st);
+  }
+
+  if (int st = run.writeFocusedRecord(); st != 0) return st;
+  run.rawRecord.destroyAll();
 
   if (conf.Multilook) {
     if (int st = stripmlookFocusedProduct(ctx.outputFile, conf.Memory, conf.Verbose,
