@@ -136,5 +136,7 @@ class stripmapGeneralFocuserModular : public stripmapGeneralFocuser {
   int Memory = 256;
   int Incore = 0;
   FocuserWork work;
+  // The document as setConfFile read it; the steps work on the chain's block
+  // taken from it there.
   GeneralSAR_configuration configuration;
 };
