@@ -7,10 +7,12 @@
 #include <cstring>
 #include <fstream>
 
+#include "base/constants.h"
+
 namespace {
 
 constexpr int kMph = 1247, kSph = 378, kDsOffset = 1625;
-constexpr double kPi = 3.14159265358979323846;
+constexpr double kPi = consts::kPi;
 
 // Gaussian 4-bit quantiser levels of the positive half, in standard deviations.
 constexpr double kHalfLevels[8] = {0.1284, 0.3881, 0.6568, 0.9423, 1.2562, 1.6180, 2.0690, 2.7326};

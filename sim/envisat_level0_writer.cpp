@@ -10,6 +10,7 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "base/constants.h"
 #include "product/time_base.h"
 #include "sim/envisat_aux_writer.h"
 
@@ -203,7 +204,7 @@ int writeEnvisatScene(const RawSceneSimulator& sim, const AsarSimConfig& cfg, co
   const StateVector s0 = sim.orbit().at(t0), s1 = sim.orbit().at(t1);
   ecefToGeodetic(s0.pos, lat0, lon0, h0);
   ecefToGeodetic(s1.pos, lat1, lon1, h1);
-  double track = std::atan2(lon1 - lon0, lat1 - lat0) * 180.0 / 3.14159265358979323846;
+  double track = std::atan2(lon1 - lon0, lat1 - lat0) * 180.0 / consts::kPi;
   if (track < 0.0) track += 360.0;
 
   std::vector<unsigned char> packets;

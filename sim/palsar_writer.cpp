@@ -10,12 +10,13 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "base/constants.h"
 #include "product/time_base.h"
 #include "sim/ers_ceos_writer.h"
 
 namespace {
 
-constexpr double kC = 299792458.0;
+constexpr double kC = consts::kSpeedOfLight;
 constexpr double kWavelength = 0.2361;
 constexpr double kPulse = 27e-6;
 constexpr int kLeaderFd = 720, kDssLength = 4096, kPprLength = 4680, kVectors = 28;
@@ -75,7 +76,7 @@ std::vector<char> buildLeader(const RawSceneSimulator& sim, const PalsarSimConfi
   double lat0, lon0, h0, lat1, lon1, h1;
   ecefToGeodetic(p0, lat0, lon0, h0);
   ecefToGeodetic(p1, lat1, lon1, h1);
-  double heading = std::atan2(lon1 - lon0, lat1 - lat0) * 180.0 / 3.14159265358979323846;
+  double heading = std::atan2(lon1 - lon0, lat1 - lat0) * 180.0 / consts::kPi;
   if (heading < 0.0) heading += 360.0;
   putFormat(r, 1188, 8, "%8.3f", heading);
   putF16(r, 1220, sim.wavelength());
@@ -159,7 +160,7 @@ void addInterference(const PalsarSimConfig& cfg, int line, double clutterPower, 
     // Power in its own range-frequency bin over the clutter's power per bin.
     const double a = std::sqrt(clutterPower * std::pow(10.0, db / 10.0) / samples);
     for (int j = 0; j < samples; ++j) {
-      const double phase = 2.0 * 3.14159265358979323846 * freq * j / fs + phase0;
+      const double phase = 2.0 * consts::kPi * freq * j / fs + phase0;
       row[j] += fcomplex(static_cast<float>(a * std::cos(phase)), static_cast<float>(a * std::sin(phase)));
     }
   };

@@ -9,11 +9,12 @@
 #include <sstream>
 #include <stdexcept>
 
+#include "base/constants.h"
 #include "sim/ers_ceos_writer.h"
 
 namespace {
 
-constexpr double kC = 299792458.0;
+constexpr double kC = consts::kSpeedOfLight;
 constexpr double kPulse = 42.0e-6;
 constexpr double kOffset = 4.2e-6;
 constexpr double kCarrier = 5300432425.742575;  // c / 0.05656 m
@@ -254,7 +255,7 @@ int RadarsatSceneWriter::write(const std::string& outDir, std::string& error) co
   auto code = [table](int v) { return static_cast<unsigned char>(table ? v + 16 : (v & 0x0F)); };
   for (int j = 0; j < replicaSamples_; ++j) {
     const double u = (j - 0.5 * (replicaSamples_ - 1)) / fs;
-    const double ph = M_PI * K * u * u;
+    const double ph = consts::kPi * K * u * u;
     replica[2 * std::size_t(j)] = code(level4(static_cast<float>(6.0 * std::cos(ph))));
     replica[2 * std::size_t(j) + 1] = code(level4(static_cast<float>(6.0 * std::sin(ph))));
   }

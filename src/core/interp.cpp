@@ -3,12 +3,15 @@
 #include <algorithm>
 #include <cstring>
 
+#include "base/status.h"
+
 int interp::setplans(int in_samples, int in_rows, int out_samples, int out_rows) {
   destroyplans();
-  if (in_samples < 1 || in_rows < 1 || out_samples < 1 || out_rows < 1) return 1;
+  if (in_samples < 1 || in_rows < 1 || out_samples < 1 || out_rows < 1)
+    return STATUS_BAD_CONDITION;
   const bool samplesChange = in_samples != out_samples;
   const bool rowsChange = in_rows != out_rows;
-  if (samplesChange && rowsChange) return 1;
+  if (samplesChange && rowsChange) return STATUS_BAD_CONDITION;
   inSamples_ = in_samples;
   inRows_ = in_rows;
   outSamples_ = out_samples;
@@ -20,7 +23,7 @@ int interp::setplans(int in_samples, int in_rows, int out_samples, int out_rows)
                     FFT_NONE, 1) != 0 ||
         fft_makep_c(forward_, in_samples, in_samples, in_rows, in_rows, FFT_FORWARD, FFT_NONE, 1) != 0) {
       destroyplans();
-      return 1;
+      return STATUS_BAD_CONDITION;
     }
   } else if (rowsChange) {
     axis_ = COLUMNS_CHANGE_ROWS;
@@ -28,7 +31,7 @@ int interp::setplans(int in_samples, int in_rows, int out_samples, int out_rows)
                     FFT_BACKWARD_NORMALISED, 1) != 0 ||
         fft_makep_c(forward_, in_samples, in_samples, in_rows, in_rows, FFT_NONE, FFT_FORWARD, 1) != 0) {
       destroyplans();
-      return 1;
+      return STATUS_BAD_CONDITION;
     }
   }
   planned_ = true;
@@ -50,7 +53,7 @@ void interp::resetplans() {
 }
 
 int interp::interpft_p(fcomplex* in, fcomplex* out) {
-  if (!planned_) return 1;
+  if (!planned_) return STATUS_BAD_CONDITION;
   if (axis_ == NONE) {
     std::memcpy(static_cast<void*>(out), in, sizeof(fcomplex) * size_t(inRows_) * size_t(inSamples_));
     return 0;

@@ -79,7 +79,7 @@ void rfiGaussianReset() {
 }
 
 int PSD(const fcomplex* x, int n, double* out, int L) {
-  if (L < 2 || n < L) return 1;
+  if (L < 2 || n < L) return STATUS_BAD_CONDITION;
   std::vector<double> w(static_cast<std::size_t>(L));
   double U = 0.0;
   for (int i = 0; i < L; ++i) {
@@ -89,7 +89,7 @@ int PSD(const fcomplex* x, int n, double* out, int L) {
   }
   const int segments = 2 * n / L - 1;
   std::fill(out, out + L, 0.0);
-  if (segments < 1) return 1;
+  if (segments < 1) return STATUS_BAD_CONDITION;
   std::vector<fcomplex> seg(static_cast<std::size_t>(L));
   FFTPlan plan{};
   if (int st = fft_makep_c(plan, L, L, 1, 1, FFT_FORWARD, FFT_NONE, 1); st != 0) return st;
@@ -115,7 +115,7 @@ int RFIblock::CreateBuffers(int report) {
   const double T = pulse_.PulseLength, B = pulse_.Bandwidth, fs = pulse_.PulseSamplingRate;
   if (T == 0.0 || fs == 0.0) {
     ORV_REPORT("Can't find chirp parameters on the raw header file", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   report_ = report;
   F_ = genpow(samples_, 1);

@@ -1,6 +1,5 @@
 #include "core/stripmlook.h"
 
-#include <climits>
 #include <cmath>
 #include <complex>
 #include <new>
@@ -47,7 +46,9 @@ bool openInput(BufferFile& file, const GeneralSAR& record, const std::string& na
 
 }  // namespace
 
-ATstripmlook::ATstripmlook() { createElementsVector(10); }
+ATstripmlook::ATstripmlook() : ProcessingTool("ATstripmlook", "ATstripmlook.report") {
+  createElementsVector(10);
+}
 ATstripmlook::~ATstripmlook() {
   if (recordRead_) {
     input.GSdestroy();
@@ -56,11 +57,7 @@ ATstripmlook::~ATstripmlook() {
 }
 
 void ATstripmlook::refreshParameters() {
-  addElementInt("Memory", &Memory, 1, 0, INT_MAX, true);
-  addElementString("ReportFilename", &ReportFilename, true);
-  addElementInt("ReportLevel", &ReportLevel, 1, 0, 3, true);
-  addElementInt("Incore", &Incore, 1, 0, 1, true);
-  addElementInt("Verbose", &Verbose, 1, 0, 1, true);
+  addCommonElements();
   addElementString("SLCInput", &SLCInput, true);
   addElementInt("RangeMLFactor", &RangeMLFactor, 1, 0, 100, true);
   addElementInt("AzimuthMLFactor", &AzimuthMLFactor, 1, 0, 100, true);
@@ -69,29 +66,10 @@ void ATstripmlook::refreshParameters() {
   setAllocationFlag(true);
 }
 
-int ATstripmlook::readpar(const std::string& file, int channel) {
-  readAuxiliaryFile(file, channel, "ATstripmlook");
-  return 0;
-}
-
-int ATstripmlook::writepar(const std::string& file, int channel) {
-  return writeAuxiliaryFile(file, channel, "ATstripmlook");
-}
-
-int ATstripmlook::checkpar() {
-  checkAuxiliaryFile();
-  return 0;
-}
-
 int ATstripmlook::InitProcessing(const std::string& file, int channel) {
   init_report(0, "ATstripmlook REPORT", ReportLevel);
   if (int st = readpar(file, channel); st != 0) return ML_CALLED(st);
   if (int st = checkpar(); st != 0) return ML_CALLED(st);
-  return 0;
-}
-
-int ATstripmlook::FinalizeProcessing(const std::string&, int) {
-  exit_report();
   return 0;
 }
 
@@ -253,11 +231,11 @@ int ATstripmlook::coherml() {
   const int a = AzimuthMLFactor, r = RangeMLFactor;
   if (r < 1) {
     ORV_REPORT("Fast Undersampling factor must be >=1", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (a < 1) {
     ORV_REPORT("Slow Undersampling factor must be >=1", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (!recordRead_) return ML_FAIL("No input record read for " + SLCInput, STATUS_BAD_CONDITION);
   const int L = input.dataFile.NrOfLinesPerImage, S = input.dataFile.NrOfPixelsPerLine;

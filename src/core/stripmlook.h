@@ -9,28 +9,19 @@
 #include "product/general_sar.h"
 #include "product/general_sar_base.h"
 
-class ATstripmlook : public GeneralSAR_Base {
+class ATstripmlook : public ProcessingTool {
  public:
   ATstripmlook();
   ~ATstripmlook() override;
 
-  int readpar(const std::string& file, int channel);
-  int writepar(const std::string& file, int channel);
   // Opens the report "ATstripmlook REPORT", reads and checks the parameters.
   int InitProcessing(const std::string& file, int channel);
   // Records of SLCInput + ".hdr" (input and output copies). Status of GSread.
   int readSLCData();
   int run();
   int coherml();
-  int FinalizeProcessing(const std::string& file, int channel);
   // InitProcessing, readSLCData, coherml or run by CoherentFlag, FinalizeProcessing.
   int runall(const std::string& file, int channel);
-  int checkpar();
-  int createBuffers() override { return createBuffersDefault(); }
-  int destroyBuffers() override {
-    setAllocationFlag(false);
-    return 0;
-  }
   void refreshParameters() override;
 
   // Mean of each az x rg cell of a block of `lines` x `samples` samples
@@ -38,12 +29,7 @@ class ATstripmlook : public GeneralSAR_Base {
   // left out).
   static void Presum_data(const fcomplex* in, int lines, int samples, int az, int rg, fcomplex* out);
 
-  // Element table, in order.
-  int Memory = 256;
-  std::string ReportFilename = "ATstripmlook.report";
-  int ReportLevel = 1;
-  int Incore = 0;
-  int Verbose = 1;
+  // Element table, in order, after the common values of the tool.
   std::string SLCInput;
   int RangeMLFactor = 1;
   int AzimuthMLFactor = 1;

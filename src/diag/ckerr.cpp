@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "base/status.h"
 #include "diag/environment.h"
 #include "diag/report.h"
 
@@ -246,7 +247,7 @@ int write_debug(const char* path, const void* buffer, int type, int columns, int
   if (type < 0 || type >= static_cast<int>(std::size(kCellBytes)) || columns < 0 || rows < 0) {
     ORV_REPORT("write_debug: unknown cell type or negative size for " + std::string(path ? path : ""),
                REPORT_ERROR);
-    return 10;
+    return STATUS_BAD_PARAMETER;
   }
   std::unique_ptr<FILE, int (*)(FILE*)> file(std::fopen(path, "wb"), &std::fclose);
   if (!file) {

@@ -77,7 +77,7 @@ int orv_add_report(const std::string& message, int level, int line, const char* 
 int orv_check(int errnum, int line, const char* function, const char* file) {
   if (errnum == 0) return 0;
   orv_add_report(std::strerror(errnum), REPORT_ERROR, line, function, file);
-  return 1;
+  return STATUS_BAD_CONDITION;
 }
 
 int init_report(int /*unused*/, const char* /*title*/, int level) {

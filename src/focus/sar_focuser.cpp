@@ -1,5 +1,6 @@
 #include "focus/sar_focuser.h"
 
+#include <charconv>
 #include <cmath>
 #include <cstdio>
 #include <new>
@@ -34,18 +35,6 @@ int calledError(int status) {
 }
 
 double sincPi(double x) { return x == 0.0 ? 1.0 : std::sin(kPi * x) / (kPi * x); }
-
-bool opens(const std::string& name) {
-  if (name.empty()) return false;
-  std::FILE* f = std::fopen(name.c_str(), "rb");
-  if (!f) return false;
-  std::fclose(f);
-  return true;
-}
-
-void removeReported(const std::string& name) {
-  if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
-}
 
 // Values taken from the raw record for the kernels.
 struct ChainContext {
@@ -164,7 +153,26 @@ void readValue(const std::string& file, const std::string& section, const std::s
   readDouble(file, section, key, value);
 }
 
+// A value of the configuration document into the chain's block.
+void fromDocument(int& value, int document) { value = document; }
+void fromDocument(double& value, int document) { value = document; }
+void fromDocument(double& value, float document) { value = documentReal(document); }
+
 }  // namespace
+
+// ---- files ----------------------------------------------------------------------
+
+bool fileOpens(const std::string& name) {
+  if (name.empty()) return false;
+  std::FILE* f = std::fopen(name.c_str(), "rb");
+  if (!f) return false;
+  std::fclose(f);
+  return true;
+}
+
+void removeReported(const std::string& name) {
+  if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
+}
 
 // ---- kernels --------------------------------------------------------------------
 
@@ -187,6 +195,29 @@ int estimateCentroid(DcEstInput& input, DcEstState& state, double poly[7]) {
 int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
                  const AzimuthFocusConf& conf) {
   return azimuthfoc(files, scene, conf);
+}
+
+int centroidStep(const SARFocuser_conf& conf, DcEstInput& input, double fc, double fs,
+                 const fcomplex* inMemory, poly& dc) {
+  DcEstState state;
+  fillDcEstState(conf, fc, fs, state);
+  if (inMemory) {
+    state.inMemory = 1;
+    state.data = inMemory;
+  }
+  double c[7] = {0, 0, 0, 0, 0, 0, 0};
+  if (int st = estimateCentroid(input, state, c); st != 0) return st;
+  for (int i = 0; i < 7; ++i) dc.c[i] = c[i];
+  return 0;
+}
+
+int azimuthStep(const AzimuthFocusFiles& files, const AzimuthFocusConf& conf, const poly& dc,
+                const poly& fr, int samples, int lines, AzimuthFocusScene& scene) {
+  scene.samples = samples;
+  scene.lines = lines;
+  polyToFlat(dc, scene.polyDC);
+  polyToFlat(fr, scene.polyFR);
+  return focusAzimuth(files, scene, conf);
 }
 
 DcEstInput dcEstInput(const std::string& raster, const std::string& outDir, int samples, int lines,
@@ -240,6 +271,14 @@ AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, doubl
   return ac;
 }
 
+double documentReal(float value) {
+  char text[32];
+  const auto written = std::to_chars(text, text + sizeof text, value);
+  double result = value;
+  std::from_chars(text, written.ptr, result);
+  return result;
+}
+
 SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& c) {
   SARFocuser_conf conf;
   conf.clear();
@@ -251,11 +290,13 @@ SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& c) {
   conf.ReportFilename = common.ReportFilename;
 
   const DCestConf& d = c.dcestConf;
-  forEachDcEstValue([&](const char*, auto chain, auto document, auto) { conf.*chain = d.*document; });
+  forEachDcEstValue(
+      [&](const char*, auto chain, auto document, auto) { fromDocument(conf.*chain, d.*document); });
   for (int i = 0; i < 7; ++i) conf.Pol_Weights[i] = d.Pol_weights[i];
 
   const AzimuthConf& a = c.azimuthConf;
-  forEachAzimuthValue([&](const char*, auto chain, auto document, auto) { conf.*chain = a.*document; });
+  forEachAzimuthValue(
+      [&](const char*, auto chain, auto document, auto) { fromDocument(conf.*chain, a.*document); });
   conf.RangeOverlap = a.RangeOverlap / 2;
   conf.AzimuthOverlap = a.AzimuthOverlap / 2;
 
@@ -309,7 +350,7 @@ void SARFocuser_conf::clear() {
 
 int SARFocuser_conf::readpar(const std::string& file) {
   clear();
-  if (!opens(file)) {
+  if (!fileOpens(file)) {
     ORV_REPORT("File not opened! (" + file + ")", REPORT_ERROR);
     return STATUS_NOT_OPENED;
   }
@@ -326,7 +367,7 @@ int SARFocuser_conf::readpar(const std::string& file) {
 }
 
 int SARFocuser_conf::readconf(const std::string& file) {
-  if (!opens(file)) {
+  if (!fileOpens(file)) {
     ORV_REPORT("File not opened! (" + file + ")", REPORT_ERROR);
     return STATUS_NOT_OPENED;
   }
@@ -436,9 +477,9 @@ int SARFocuser::run() {
     ORV_REPORT("Focusing configuration not set", REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
-  if (opens(RawDataFile)) {
+  if (fileOpens(RawDataFile)) {
     ORV_REPORT("STRIPMAP RAW DATA DETECTED, FOCUSSING...", REPORT_CHECKPOINT);
-    if (!opens(ChirpFile)) {
+    if (!fileOpens(ChirpFile)) {
       ORV_REPORT(" Chirp file does not exists! (" + ChirpFile + ")", 17);
       return STATUS_BAD_PARAMETER;
     }
@@ -449,7 +490,7 @@ int SARFocuser::run() {
   }
 
   // Alternating polarisation: two channels "<raw>1" and "<raw>2".
-  if (!opens(RawDataFile + "1")) {
+  if (!fileOpens(RawDataFile + "1")) {
     ORV_REPORT("Raw Data file does not exists!", REPORT_IMAGE_MISSING);
     return STATUS_BAD_PARAMETER;
   }
@@ -458,7 +499,7 @@ int SARFocuser::run() {
   int status = 0;
   for (int k = 1; k <= 2 && status == 0; ++k) {
     const std::string n = std::to_string(k);
-    if (!opens(chirp + n)) {
+    if (!fileOpens(chirp + n)) {
       ORV_REPORT("Chirp file does not exists!", 17);
       status = STATUS_BAD_PARAMETER;
       break;
@@ -477,19 +518,38 @@ int SARFocuser::run() {
   return status;
 }
 
-int SARFocuser::process() {
-  SARFocuser_conf& conf = *conf_;
-  GeneralRAWData rawRecord;
+namespace {
+
+// One raster through the chain: the raw record and the values taken from it,
+// the replica, the range focuser's work, the Doppler polynomials and the
+// result of azimuth focusing, handed from one step to the next.
+struct ChainRun {
+  SARFocuser_conf& conf;
   ChainContext ctx;
+  GeneralRAWData rawRecord;
+  std::vector<fcomplex> chirp;
+  RangeFocParams rp;
+  RangeFocWork rw;
+  int rgSamples = 0;
+  int rgLines = 0;
+  polyDC dcPoly;
+  polyFR frPoly;
+  AzimuthFocusScene scene;
 
-  ctx.reportFile = conf.ReportFilename;
-  ctx.rawFile = RawDataFile;
-  ctx.chirpFile = ChirpFile;
-  ctx.outputFile = OutputFilename;
-  if (conf.Flag_rangefoc) ctx.rgfocFile = OutputFilename + ".rgfoc";
+  int readRawRecord(const std::string& raw);
+  int readReplica(const std::string& chirpName);
+  int rangeStep(const std::string& raw);
+  int dopplerStep();
+  int writeRangeFocusedRecord();
+  int azimuthStage();
+  int writeFocusedRecord();
+};
 
-  if (int st = rawRecord.readhdr(RawDataFile + ".hdr"); st != 0) {
-    ORV_REPORT("Cannot read the raw data record " + RawDataFile + ".hdr", REPORT_ERROR);
+// The raw record, the sampling and region values of the chain, the look
+// sign and the whole-image shift sentinels.
+int ChainRun::readRawRecord(const std::string& raw) {
+  if (int st = rawRecord.readhdr(raw + ".hdr"); st != 0) {
+    ORV_REPORT("Cannot read the raw data record " + raw + ".hdr", REPORT_ERROR);
     return calledError(st);
   }
 
@@ -510,7 +570,7 @@ int SARFocuser::process() {
   rawRecord.orbit().setLookSign(lookSign);
   ctx.antennaLength = conf.AntennaLength;
   if (ctx.frg_hz <= 0.0 || ctx.prf_hz <= 0.0 || ctx.lines < 1 || ctx.samples < 1) {
-    ORV_REPORT("Sampling values of the raw data record are wrong: " + RawDataFile + ".hdr",
+    ORV_REPORT("Sampling values of the raw data record are wrong: " + raw + ".hdr",
                REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
@@ -518,14 +578,16 @@ int SARFocuser::process() {
   // 1.0 is the sentinel of "the whole image".
   if (conf.ApplyAzShift == 1.0) conf.ApplyAzShift = ctx.lines;
   if (conf.ApplyRgShift == 1.0) conf.ApplyRgShift = ctx.samples;
+  return 0;
+}
 
-  // The whole replica in memory.
+// The whole replica in memory.
+int ChainRun::readReplica(const std::string& chirpName) {
   DataFile chirpFile;
-  if (int st = chirpFile.read_hdr(ChirpFile); st != 0) {
-    ORV_REPORT("Cannot read the chirp header " + ChirpFile + ".hdr", REPORT_ERROR);
+  if (int st = chirpFile.read_hdr(chirpName); st != 0) {
+    ORV_REPORT("Cannot read the chirp header " + chirpName + ".hdr", REPORT_ERROR);
     return calledError(st);
   }
-  std::vector<fcomplex> chirp;
   try {
     chirp.assign(std::max(chirpFile.NrOfPixelsPerLine, 0), fcomplex(0.0f, 0.0f));
   } catch (const std::bad_alloc&) {
@@ -539,8 +601,13 @@ int SARFocuser::process() {
     chirpFile.close();
     if (st != 0) return calledError(st);
   }
+  return 0;
+}
 
-  RangeFocParams rp;
+// Range focusing of the raw raster into ".rgfoc" (or into memory with
+// Incore); the raw raster, the report and the replica go when the chain
+// erases its inputs.
+int ChainRun::rangeStep(const std::string& raw) {
   rp.inputFile = ctx.rawFile;
   rp.outputFile = ctx.rgfocFile;
   rp.fs = ctx.frg_hz;
@@ -549,7 +616,6 @@ int SARFocuser::process() {
   rp.prf = ctx.prf_hz;
   rp.lines = ctx.lines;
   rp.samples = ctx.samples;
-  RangeFocWork rw;
   rw.verbose = conf.Verbose;
   rw.replica = chirp.data();
   rw.replicaLen = static_cast<int>(chirp.size());
@@ -557,13 +623,11 @@ int SARFocuser::process() {
   rw.prefix = rawRecord.dataFile.RowPrefix > 0 ? 1 : 0;
   rw.incore = conf.Incore;
   if (rawRecord.dataFile.RowPrefix != 0 && rawRecord.dataFile.RowPrefix != 4) {
-    ORV_REPORT("Raw raster rows must carry a 4-byte sampling window prefix: " + RawDataFile,
-               REPORT_ERROR);
+    ORV_REPORT("Raw raster rows must carry a 4-byte sampling window prefix: " + raw, REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
   if (rawRecord.dataFile.HeaderOffset != 0) {
-    ORV_REPORT("Raw raster with a header block cannot be range focused: " + RawDataFile,
-               REPORT_ERROR);
+    ORV_REPORT("Raw raster with a header block cannot be range focused: " + raw, REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
 
@@ -582,28 +646,25 @@ int SARFocuser::process() {
       removeReported(ctx.chirpFile + ".hdr");
     }
   }
-  const int rgSamples = rw.outSamples;
-  const int rgLines = rw.outLines;
+  rgSamples = rw.outSamples;
+  rgLines = rw.outLines;
+  return 0;
+}
 
-  // Doppler centroid and the geometric Doppler rate.
-  polyDC dcPoly;
-  polyFR frPoly;
+// Doppler centroid estimated from the range-focused raster and the
+// geometric Doppler rate, or both taken from an earlier product.
+int ChainRun::dopplerStep() {
   dcPoly.trg0 = ctx.swstMin;
   dcPoly.taz0 = ctx.azimuthStart;
   frPoly.trg0 = ctx.swstMin;
   frPoly.taz0 = ctx.azimuthStart;
   if (conf.Flag_dcest) {
     DcEstInput in = dcEstInput(ctx.rgfocFile, ".", rgSamples, rgLines, ctx.prf_hz, ctx.azimuthStart);
-    DcEstState state;
-    fillDcEstState(conf, ctx.fc_hz, ctx.frg_hz, state);
-    if (conf.Incore) {
-      state.inMemory = 1;
-      state.data = rw.data.data();
-    }
     ORV_REPORT("DC Estimation", REPORT_CHECKPOINT);
-    double c[7] = {0, 0, 0, 0, 0, 0, 0};
-    if (int st = estimateCentroid(in, state, c); st != 0) return calledError(st);
-    for (int i = 0; i < 7; ++i) dcPoly.c[i] = c[i];
+    if (int st = centroidStep(conf, in, ctx.fc_hz, ctx.frg_hz,
+                              conf.Incore ? rw.data.data() : nullptr, dcPoly);
+        st != 0)
+      return calledError(st);
 
     ORV_REPORT("GEOMETRIC POLYNOMIALS COMPUTATION", REPORT_CHECKPOINT);
     GeneralSAROrbit& orbit = rawRecord.orbit();
@@ -635,74 +696,72 @@ int SARFocuser::process() {
     frPoly.trg0 = conf.GivenFRref[0];
     frPoly.taz0 = conf.GivenFRref[1];
   }
+  return 0;
+}
 
-  // Record of the range-focused raster.
-  if (conf.Flag_rangefoc) {
-    GeneralSLCData rg;
-    rawRecord.dataSetInfo.clone(&rg.dataSetInfo);
-    rg.dataSetInfo.SWST_MIN = rg.dataSetInfo.SWST_MAX = ctx.swstMin;
-    rg.dataSetInfo.Description = "StripMap Range Focused Image File";
-    rg.dataSetInfo.ProcessingSoftware = "SARFocuser v1.0";
-    rg.dataSetInfo.ProcessingCenter = "Orvane - Lumbrao";
-    rg.dataSetInfo.Swath = rawRecord.dataSetInfo.Swath;
-    rg.dataSetInfo.OrbitConfiguration = rawRecord.dataSetInfo.OrbitConfiguration;
-    rg.dataSetInfo.Polarization = rawRecord.dataSetInfo.Polarization;
-    rg.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
-    rg.rasterName = ctx.rgfocFile;
-    setComplexRasterLayout(rg.dataFile, ctx.rgfocFile, rgSamples, rgLines);
-    rg.roi.SetFastAxe(ctx.swstMin, rawRoi.FastTimeDelta, rgSamples);
-    rg.roi.SetSlowAxe(ctx.azimuthStart, rawRoi.SlowTimeDelta, rgLines);
-    rg.polynomials.CreatePolys(1, 1);
-    rg.polynomials.DC[0] = dcPoly;
-    rg.polynomials.FR[0] = frPoly;
-    rg.attitude.Eq_speed = kEqSpeedPlaceholder;
-    rg.attitude.Mean_DC = -1.0;
-    rg.attitude.SquintAngle = -1.0;
-    setHammingWindows(rg.spectralWindows, conf);
-    rawRecord.orbit().clone(&rg.orbit());
-    if (int st = rg.orbit().SVGetGeoCoords(&rg.geoCoords, &rg.roi); st != 0)
-      return calledError(st);
-    rawRecord.sampling.clone(&rg.sampling);
-    rawRecord.pulse.clone(&rg.pulse);
-    rawRecord.swath.clone(&rg.swath);
-    if (int st = rg.writehdr(); st != 0) return calledError(st);
-    rg.destroyAll();
+// Record of the range-focused raster.
+int ChainRun::writeRangeFocusedRecord() {
+  const ROI_Obj& rawRoi = rawRecord.roi;
+  GeneralSLCData rg;
+  rawRecord.dataSetInfo.clone(&rg.dataSetInfo);
+  rg.dataSetInfo.SWST_MIN = rg.dataSetInfo.SWST_MAX = ctx.swstMin;
+  rg.dataSetInfo.Description = "StripMap Range Focused Image File";
+  rg.dataSetInfo.ProcessingSoftware = "SARFocuser v1.0";
+  rg.dataSetInfo.ProcessingCenter = "Orvane - Lumbrao";
+  rg.dataSetInfo.Swath = rawRecord.dataSetInfo.Swath;
+  rg.dataSetInfo.OrbitConfiguration = rawRecord.dataSetInfo.OrbitConfiguration;
+  rg.dataSetInfo.Polarization = rawRecord.dataSetInfo.Polarization;
+  rg.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_RANGE_FOCUSED);
+  rg.rasterName = ctx.rgfocFile;
+  setComplexRasterLayout(rg.dataFile, ctx.rgfocFile, rgSamples, rgLines);
+  rg.roi.SetFastAxe(ctx.swstMin, rawRoi.FastTimeDelta, rgSamples);
+  rg.roi.SetSlowAxe(ctx.azimuthStart, rawRoi.SlowTimeDelta, rgLines);
+  rg.polynomials.CreatePolys(1, 1);
+  rg.polynomials.DC[0] = dcPoly;
+  rg.polynomials.FR[0] = frPoly;
+  rg.attitude.Eq_speed = kEqSpeedPlaceholder;
+  rg.attitude.Mean_DC = -1.0;
+  rg.attitude.SquintAngle = -1.0;
+  setHammingWindows(rg.spectralWindows, conf);
+  rawRecord.orbit().clone(&rg.orbit());
+  if (int st = rg.orbit().SVGetGeoCoords(&rg.geoCoords, &rg.roi); st != 0)
+    return calledError(st);
+  rawRecord.sampling.clone(&rg.sampling);
+  rawRecord.pulse.clone(&rg.pulse);
+  rawRecord.swath.clone(&rg.swath);
+  if (int st = rg.writehdr(); st != 0) return calledError(st);
+  rg.destroyAll();
+  return 0;
+}
+
+// Azimuth focusing of the range-focused raster into the output; the
+// range-focused raster goes when the chain erases its inputs.
+int ChainRun::azimuthStage() {
+  const SamplingConstants_Obj& smp = rawRecord.sampling;
+  if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
+  const AzimuthFocusFiles files =
+      azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
+  scene.verbose = conf.Verbose;
+  scene.DCref = conf.DCref;
+  scene.inCore = conf.Incore;
+  scene.buffer = conf.Incore ? rw.data.data() : nullptr;
+  const AzimuthFocusConf ac = azimuthFocusConf(conf, ctx.frg_hz, ctx.prf_hz);
+  ORV_REPORT("Azimuth Focusing", REPORT_CHECKPOINT);
+  char text[64];
+  std::snprintf(text, sizeof text, "DCref: %f", conf.DCref);
+  ORV_REPORT(text, REPORT_MESSAGE);
+  if (int st = azimuthStep(files, ac, dcPoly, frPoly, rgSamples, rgLines, scene); st != 0)
+    return calledError(st);
+  if (conf.DeleteTempFiles) {
+    removeReported(ctx.rgfocFile);
+    removeReported(ctx.rgfocFile + ".hdr");
   }
+  return 0;
+}
 
-  AzimuthFocusScene scene;
-  if (conf.Flag_azimuthfoc) {
-    if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
-    const AzimuthFocusFiles files =
-        azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
-    scene.verbose = conf.Verbose;
-    scene.samples = rgSamples;
-    scene.lines = rgLines;
-    polyToFlat(dcPoly, scene.polyDC);
-    polyToFlat(frPoly, scene.polyFR);
-    scene.DCref = conf.DCref;
-    scene.inCore = conf.Incore;
-    scene.buffer = conf.Incore ? rw.data.data() : nullptr;
-    const AzimuthFocusConf ac = azimuthFocusConf(conf, ctx.frg_hz, ctx.prf_hz);
-    ORV_REPORT("Azimuth Focusing", REPORT_CHECKPOINT);
-    char text[64];
-    std::snprintf(text, sizeof text, "DCref: %f", conf.DCref);
-    ORV_REPORT(text, REPORT_MESSAGE);
-    if (int st = focusAzimuth(files, scene, ac); st != 0) return calledError(st);
-    if (conf.DeleteTempFiles) {
-      removeReported(ctx.rgfocFile);
-      removeReported(ctx.rgfocFile + ".hdr");
-    }
-  }
-
-  if (conf.Incore) {
-    RangeFocParams out = rp;
-    out.outputFile = ctx.outputFile;
-    rw.outSamples = scene.outSamples;
-    rw.outLines = scene.outLines;
-    if (int st = dest_buffer(out, rw); st != 0) return calledError(st);
-  }
-
-  // Record of the focused product.
+// Record of the focused product, written beside it.
+int ChainRun::writeFocusedRecord() {
+  const ROI_Obj& rawRoi = rawRecord.roi;
   GeneralSAR product;
   rawRecord.dataSetInfo.clone(&product.dataSetInfo);
   DataSetInfo_Obj& info = product.dataSetInfo;
@@ -751,7 +810,43 @@ int SARFocuser::process() {
     product.GSenable(o);
   if (int st = product.GSwrite(ctx.outputFile + ".hdr"); st != 0) return calledError(st);
   product.GSdestroy();
-  rawRecord.destroyAll();
+  return 0;
+}
+
+}  // namespace
+
+int SARFocuser::process() {
+  ChainRun run{.conf = *conf_};
+  SARFocuser_conf& conf = run.conf;
+  ChainContext& ctx = run.ctx;
+
+  ctx.reportFile = conf.ReportFilename;
+  ctx.rawFile = RawDataFile;
+  ctx.chirpFile = ChirpFile;
+  ctx.outputFile = OutputFilename;
+  if (conf.Flag_rangefoc) ctx.rgfocFile = OutputFilename + ".rgfoc";
+
+  if (int st = run.readRawRecord(RawDataFile); st != 0) return st;
+  if (int st = run.readReplica(ChirpFile); st != 0) return st;
+  if (int st = run.rangeStep(RawDataFile); st != 0) return st;
+  if (int st = run.dopplerStep(); st != 0) return st;
+  if (conf.Flag_rangefoc) {
+    if (int st = run.writeRangeFocusedRecord(); st != 0) return st;
+  }
+  if (conf.Flag_azimuthfoc) {
+    if (int st = run.azimuthStage(); st != 0) return st;
+  }
+
+  if (conf.Incore) {
+    RangeFocParams out = run.rp;
+    out.outputFile = ctx.outputFile;
+    run.rw.outSamples = run.scene.outSamples;
+    run.rw.outLines = run.scene.outLines;
+    if (int st = dest_buffer(out, run.rw); st != 0) return calledError(st);
+  }
+
+  if (int st = run.writeFocusedRecord(); st != 0) return st;
+  run.rawRecord.destroyAll();
 
   if (conf.Multilook) {
     if (int st = stripmlookFocusedProduct(ctx.outputFile, conf.Memory, conf.Verbose,

@@ -173,6 +173,11 @@ int SetParFloat(const std::string& file, const std::string& key, int count, cons
 int SetParDouble(const std::string& file, const std::string& key, int count, const double* value,
                  int flag, const std::string& section);
 
+// True when the file opens for reading.
+bool fileOpens(const std::string& name);
+// Removes a file; a failure is reported ("Cannot remove file") and passed over.
+void removeReported(const std::string& name);
+
 // Polynomial in the flat layout of the azimuth focuser: c0..c6, trg0, taz0.
 void polyToFlat(const poly& p, double out[9]);
 void polyFromFlat(const double in[9], poly& p);
@@ -183,7 +188,7 @@ int estimateCentroid(DcEstInput& input, DcEstState& state, double poly[7]);
 int focusAzimuth(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
                  const AzimuthFocusConf& conf);
 
-// Set-up shared by the chain and the modular steps.
+// Steps and set-up shared by the whole-run chain and the modular steps.
 // Input of the centroid estimation of a range-focused raster.
 DcEstInput dcEstInput(const std::string& raster, const std::string& outDir, int samples, int lines,
                       double prf, double timeOrigin);
@@ -197,8 +202,25 @@ void fillDcEstState(const SARFocuser_conf& conf, double fc, double fs, DcEstStat
 // Azimuth focusing values of the block; bandwidth fractions become hertz.
 AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, double prf);
 // The block of a processing configuration document (overlaps halved, as at
-// reading a profile).
+// reading a profile). The document keeps its reals in single precision; each
+// comes back as the decimal it was written with (see documentReal), so that
+// both ways of working hand the kernels the same values.
 SARFocuser_conf chainConfFrom(const GeneralSAR_configuration& configuration);
+// A single-precision real of a configuration document as the shortest
+// decimal that reads back to it, in double precision: 4e-05f gives 4e-05,
+// not 3.9999998989515007e-05.
+double documentReal(float value);
+// Doppler centroid of a range-focused raster: the estimator set up from the
+// block with carrier fc and range rate fs, run on the raster of `input` or,
+// when inMemory is given, on those samples; the coefficients go to dc.
+int centroidStep(const SARFocuser_conf& conf, DcEstInput& input, double fc, double fs,
+                 const fcomplex* inMemory, poly& dc);
+// Azimuth focusing of a range-focused raster of samples x lines with the
+// centroid and rate polynomials dc and fr; the scene's other inputs (report,
+// reference Doppler, raster in memory) are the caller's, its results are
+// returned in it.
+int azimuthStep(const AzimuthFocusFiles& files, const AzimuthFocusConf& conf, const poly& dc,
+                const poly& fr, int samples, int lines, AzimuthFocusScene& scene);
 // "HAMMING" windows with the coefficients and look bandwidths of the block.
 void setHammingWindows(SpectralWindows_Obj& windows, const SARFocuser_conf& conf);
 // Raster layout, region (deltas of `deltas`), type, range start, attitude and

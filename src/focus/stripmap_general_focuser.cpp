@@ -41,18 +41,6 @@ int checkFocusInputs(GeneralSAR& record, bool needRate) {
   return STATUS_BAD_CONDITION;
 }
 
-void removeReported(const std::string& name) {
-  if (std::remove(name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
-}
-
-
-bool fileOpens(const std::string& name) {
-  std::FILE* f = std::fopen(name.c_str(), "rb");
-  if (!f) return false;
-  std::fclose(f);
-  return true;
-}
-
 bool directoryOpens(const std::string& name) {
   DIR* d = opendir(name.c_str());
   if (!d) return false;
@@ -210,13 +198,14 @@ int stripmapGeneralFocuserModular::setConfFile(const std::string& file, int chan
   if (int st = configuration.GSread(file, channel); st != 0) return calledError(st);
   Memory = configuration.generalConf.Memory;
   Incore = configuration.generalConf.Incore;
+  *conf_ = chainConfFrom(configuration);
   return 0;
 }
 
 int stripmapGeneralFocuserModular::rangefoc(const std::string& raw, const std::string& chirp,
                                             const std::string& output) {
-  const generalProcessingConf& g = configuration.generalConf;
-  if (!g.Flag_rangefoc) return 0;
+  const SARFocuser_conf& c = *conf_;
+  if (!c.Flag_rangefoc) return 0;
   GeneralSAR record;
   record.GSread(raw + ".hdr");
   if (!record.GSexists(GeneralSAR::GS_DATAFILE)) {
@@ -230,16 +219,16 @@ int stripmapGeneralFocuserModular::rangefoc(const std::string& raw, const std::s
   rf.Memory = Memory;
   rf.DataToSkip = 0;
   rf.DataToProcess = 0;
-  rf.Flag_ortog = g.Flag_ortog;
+  rf.Flag_ortog = c.Flag_ortog;
   if (int st = rf.run(); st != 0) return calledError(st);
-  if (g.EraseTemp) {
+  if (c.DeleteTempFiles) {
     for (const std::string& f : {raw, raw + ".hdr", chirp, chirp + ".hdr"}) removeReported(f);
   }
   return 0;
 }
 
 int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
-  if (!configuration.generalConf.Flag_dcest) return 0;
+  if (!conf_->Flag_dcest) return 0;
   std::string dir;
   findDir(file, dir);
   GeneralSAR record;
@@ -249,19 +238,16 @@ int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
     return STATUS_BAD_CONDITION;
   }
   record.polynomials.CreatePolys(1, 1);
-  SARFocuser_conf conf = chainConfFrom(configuration);
-  conf.Memory = Memory;
+  conf_->Memory = Memory;
   DcEstInput in = dcEstInput(file, dir, record.dataFile.NrOfPixelsPerLine,
                              record.dataFile.NrOfLinesPerImage, record.sampling.prf_hz,
                              record.roi.roi.SlowStartTime);
   in.byteOrder = record.dataFile.ByteOrder;
   in.headerOffset = record.dataFile.HeaderOffset;
-  DcEstState state;
-  fillDcEstState(conf, record.sampling.fc_hz, record.sampling.frg_hz, state);
-  double c[7] = {0, 0, 0, 0, 0, 0, 0};
-  if (int st = estimateCentroid(in, state, c); st != 0) return calledError(st);
   polyDC& dc = record.polynomials.DC[0];
-  for (int i = 0; i < 7; ++i) dc.c[i] = c[i];
+  if (int st = centroidStep(*conf_, in, record.sampling.fc_hz, record.sampling.frg_hz, nullptr, dc);
+      st != 0)
+    return calledError(st);
   dc.trg0 = record.roi.roi.FastStartTime;
   dc.taz0 = record.roi.roi.SlowStartTime;
   record.GSenable(GeneralSAR::GS_POLYNOMIALS);
@@ -271,7 +257,7 @@ int stripmapGeneralFocuserModular::dcEst(const std::string& file) {
 }
 
 int stripmapGeneralFocuserModular::frEst(const std::string& file) {
-  if (!configuration.generalConf.Flag_dcest) return 0;
+  if (!conf_->Flag_dcest) return 0;
   GeneralSAR record;
   record.GSread(file + ".hdr");
   if (int st = checkFocusInputs(record, false); st != 0) return st;
@@ -292,11 +278,11 @@ int stripmapGeneralFocuserModular::frEst(const std::string& file) {
 
 int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::string& output,
                                          double azimuthShift) {
-  if (!configuration.generalConf.Flag_azimuthfoc) return 0;
+  if (!conf_->Flag_azimuthfoc) return 0;
   GeneralSAR record;
   record.GSread(input + ".hdr");
   if (int st = checkFocusInputs(record, true); st != 0) return st;
-  const SARFocuser_conf conf = chainConfFrom(configuration);
+  const SARFocuser_conf& conf = *conf_;
   const SamplingConstants_Obj& smp = record.sampling;
   const ROI_Obj& roi = record.roi.roi;
   const int lines = record.dataFile.NrOfLinesPerImage;
@@ -305,17 +291,16 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
   const AzimuthFocusFiles files =
       azimuthFocusFiles(input, output, smp, roi.FastStartTime, roi.SlowStartTime);
   AzimuthFocusScene scene;
-  scene.samples = samples;
-  scene.lines = lines;
-  polyToFlat(record.polynomials.DC[0], scene.polyDC);
-  polyToFlat(record.polynomials.FR[0], scene.polyFR);
   AzimuthFocusConf ac = azimuthFocusConf(conf, smp.frg_hz, smp.prf_hz);
   ac.ApplyAzShift = conf.ApplyAzShift * lines;
   ac.ApplyRgShift = conf.ApplyRgShift * samples;
   // The extra shift enlarges the magnitude on the side of the shift's sign.
   ac.ApplyAzShift =
       ac.ApplyAzShift < 0.0 ? ac.ApplyAzShift - azimuthShift : ac.ApplyAzShift + azimuthShift;
-  if (int st = focusAzimuth(files, scene, ac); st != 0) return calledError(st);
+  if (int st = azimuthStep(files, ac, record.polynomials.DC[0], record.polynomials.FR[0], samples,
+                          lines, scene);
+      st != 0)
+    return calledError(st);
 
   GeneralSAR product;
   if (int st = product.GSread(input + ".hdr"); st != 0) return calledError(st);
@@ -332,7 +317,7 @@ int stripmapGeneralFocuserModular::azfoc(const std::string& input, const std::st
     product.GSenable(o);
   if (int st = product.GSwrite(output + ".hdr"); st != 0) return calledError(st);
   product.GSdestroy();
-  if (configuration.generalConf.EraseTemp) {
+  if (conf.DeleteTempFiles) {
     removeReported(input);
     removeReported(input + ".hdr");
   }

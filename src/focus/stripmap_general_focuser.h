@@ -92,7 +92,8 @@ class stripmapGeneralFocuserModular : public stripmapGeneralFocuser {
   int run_modular();
 
   // Reads the processing configuration of file; copies its Memory and
-  // Incore.
+  // Incore and takes the chain's block from it, once: the steps below read
+  // their flags and values from that block, as the whole-run chain does.
   int setConfFile(const std::string& file, int channel);
 
   int rangefoc(const std::string& raw, const std::string& chirp, const std::string& output);
@@ -135,5 +136,7 @@ class stripmapGeneralFocuserModular : public stripmapGeneralFocuser {
   int Memory = 256;
   int Incore = 0;
   FocuserWork work;
+  // The document as setConfFile read it; the steps work on the chain's block
+  // taken from it there.
   GeneralSAR_configuration configuration;
 };

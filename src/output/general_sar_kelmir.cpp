@@ -166,10 +166,10 @@ int Service_kelmir::take(const tesv_description_section& header, const std::stri
 
 int Service_kelmir::take(const tesv_description_section& header, const std::string& field,
                          std::vector<std::string>& values, bool mandatory) {
-  return takeWith(header, field, mandatory, [&values](const tesv_description_field& f) {
+  return takeWith(header, field, mandatory, [&values](const tesv_description_field& f) -> int {
     std::vector<std::string> out(static_cast<std::size_t>(f.numberOfElements()));
     for (std::size_t i = 0; i < out.size(); ++i)
-      if (f.getString(out[i], static_cast<int>(i)) != 0) return 1;
+      if (f.getString(out[i], static_cast<int>(i)) != 0) return STATUS_BAD_CONDITION;
     values = std::move(out);
     return 0;
   });

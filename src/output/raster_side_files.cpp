@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/environment.h"
 #include "diag/report.h"
@@ -45,7 +46,7 @@ int WriteKmlOverlay(const tesv_description_section& h, const std::string& kmlNam
   const double lat = 0.5 * (north + south), lon = 0.5 * (east + west);
   const double metresPerDegree = 111320.0;
   const double extent = std::hypot((north - south) * metresPerDegree,
-                                   (east - west) * metresPerDegree * std::cos(lat * M_PI / 180.0));
+                                   (east - west) * metresPerDegree * std::cos(lat * consts::kPi / 180.0));
   std::FILE* f = std::fopen(kmlName.c_str(), "w");
   if (!f) {
     ORV_REPORT("File not opened! " + kmlName, REPORT_ERROR);

@@ -51,7 +51,7 @@ int ReadMapKeys(const tesv_description_section& h, MapKeys& k, std::string& erro
   const std::string cs = "CartographicSystem.";
   if (!headerString(h, cs + "State", k.State) || !known(mapStates(), k.State)) {
     error = "State specified in the Image header or GCP File is invalid.";
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   headerString(h, cs + "Hemisphere", k.Hemisphere);
   headerString(h, cs + "Projection", k.Projection);
@@ -61,7 +61,7 @@ int ReadMapKeys(const tesv_description_section& h, MapKeys& k, std::string& erro
   long long zone = 0;
   if (h.getField(cs + "Zone") && !headerInt(h, cs + "Zone", zone)) {
     error = "Wrong map field. Please check.";
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   k.Zone = int(zone);
   const std::string rc = "RegistrationCoordinates.";
@@ -69,17 +69,17 @@ int ReadMapKeys(const tesv_description_section& h, MapKeys& k, std::string& erro
       !headerDouble(h, rc + "PixelSpacingLonEast", k.PixelSpacingLonEast) ||
       !headerDouble(h, rc + "PixelSpacingLatNorth", k.PixelSpacingLatNorth)) {
     error = "Wrong map field. Please check.";
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (k.State == "GEO-GLOBAL" || k.State == "NONE") return 0;
   if (k.State == "UTM-GLOBAL") {
     if (!k.Hemisphere.empty() && k.Hemisphere != "NORTH" && k.Hemisphere != "SOUTH") {
       error = "Hemisphere not found [" + k.Hemisphere + "]";
-      return 1;
+      return STATUS_BAD_CONDITION;
     }
     if (k.Zone < 1 || k.Zone > 60) {
       error = "Zone not found [" + std::to_string(k.Zone) + "]";
-      return 1;
+      return STATUS_BAD_CONDITION;
     }
     return 0;
   }
@@ -106,7 +106,7 @@ int ReadMapKeys(const tesv_description_section& h, MapKeys& k, std::string& erro
     if (GetMyProfileString(section, c.prefix + *c.value, value, list) != 0) {
       error = std::string(c.message) + *c.value + "]";
       FreeProfile(list);
-      return 1;
+      return STATUS_BAD_CONDITION;
     }
   }
   FreeProfile(list);

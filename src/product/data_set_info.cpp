@@ -1,5 +1,6 @@
 #include "product/data_set_info.h"
 
+#include "base/status.h"
 #include "product/record_io.h"
 #include "product/time_base.h"
 
@@ -120,7 +121,7 @@ int DataSetInfo_Obj::readhdr(const std::string& file) {
   r.required("RangeBandwidth", RangeBandwidth, 5);
   r.required("ExternalCalibrationFactor", &ExternalCalibrationFactor);
   r.required("Projection", &Projection);
-  if (r.failed()) return 1;
+  if (r.failed()) return STATUS_BAD_CONDITION;
   r.optional("ImageType", &ImageType);
   r.optional("RGAntenna_flag", &RGAntenna_flag);
   r.optional("AZAntenna_flag", &AZAntenna_flag);

@@ -1,5 +1,7 @@
 #include "product/general_sar_base.h"
 
+#include <climits>
+
 #include "base/status.h"
 #include "diag/report.h"
 
@@ -230,4 +232,35 @@ void GeneralSAR_BaseConfiguration::cloneConf(GeneralSAR_BaseConfiguration& targe
   target.Verbose = Verbose;
   target.ReportLevel = ReportLevel;
   target.ReportFilename = ReportFilename;
+}
+
+// ---- processing tools -------------------------------------------------------------
+
+int ProcessingTool::readpar(const std::string& file, int channel) {
+  readAuxiliaryFile(file, channel, className_);
+  return 0;
+}
+
+int ProcessingTool::writepar(const std::string& file, int channel) {
+  return writeAuxiliaryFile(file, channel, className_);
+}
+
+int ProcessingTool::FinalizeProcessing(const std::string&, int) {
+  exit_report();
+  return 0;
+}
+
+bool ProcessingTool::namesOtherConfiguration(const std::string& file, int channel) {
+  std::string target = ReportFilename;
+  if (!getConfigurationFile(file, channel, className_, target)) return false;
+  ReportFilename = target;
+  return true;
+}
+
+void ProcessingTool::addCommonElements() {
+  addElementInt("Memory", &Memory, 1, 0, INT_MAX, true);
+  addElementString("ReportFilename", &ReportFilename, true);
+  addElementInt("ReportLevel", &ReportLevel, 1, 0, 3, true);
+  addElementInt("Incore", &Incore, 1, 0, 1, true);
+  addElementInt("Verbose", &Verbose, 1, 0, 1, true);
 }

@@ -138,6 +138,49 @@ class GeneralSAR_Base : public GeneralSAR_BaseXML {
   virtual int readhdr(const std::string& file);
 };
 
+// A processing tool: its element table opens with the five common values
+// (memory budget in MB, report file and level, in-core and verbose flags),
+// its block in a parameter document is named after the tool, and the
+// life-pattern calls that are the same for every tool stand here.
+class ProcessingTool : public GeneralSAR_Base {
+ public:
+  ProcessingTool(std::string className, std::string reportFilename)
+      : ReportFilename(std::move(reportFilename)), className_(std::move(className)) {}
+
+  int createBuffers() override { return createBuffersDefault(); }
+  int destroyBuffers() override {
+    setAllocationFlag(false);
+    return 0;
+  }
+  int checkpar() {
+    checkAuxiliaryFile();
+    return 0;
+  }
+  // The tool's block of the document; a block that cannot be read leaves
+  // the values as they were and still gives 0.
+  int readpar(const std::string& file, int channel);
+  int writepar(const std::string& file, int channel);
+  // Closes the report; 0.
+  int FinalizeProcessing(const std::string& file, int channel);
+  // True, with ReportFilename set to it, when the tool's block names a
+  // ConfigurationFile of its own (the tool then does not run).
+  bool namesOtherConfiguration(const std::string& file, int channel);
+
+  int Memory = 256;
+  std::string ReportFilename;
+  int ReportLevel = 1;
+  int Incore = 0;
+  int Verbose = 1;
+
+ protected:
+  // Registers the five common values, first in the table.
+  void addCommonElements();
+  const std::string& toolName() const { return className_; }
+
+ private:
+  std::string className_;
+};
+
 // The five values every processing configuration class carries, read and
 // written at "<group>/<key>" of a channel of a parameter document
 // (the common group is "generalProcessingConf").

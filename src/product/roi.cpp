@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cmath>
 
+#include "base/status.h"
 #include "product/profile.h"
 
 int roundHalfAway(double x) {
@@ -142,7 +143,7 @@ int ROI_Coords::readhdr(const std::string& file) {
       GetProfileDoubleArray(section, "DownRight", downRight, 2, file) != 0 ||
       GetProfileDoubleArray(section, "Latitude_SamplingStep", &SlowTimeDelta, 1, file) != 0 ||
       GetProfileDoubleArray(section, "Longitude_SamplingStep", &FastTimeDelta, 1, file) != 0)
-    return 1;
+    return STATUS_BAD_CONDITION;
   SlowStartTime = upLeft[0];
   FastStartTime = upLeft[1];
   SlowTimeLength = upRight[0] - SlowStartTime;

@@ -2,6 +2,7 @@
 
 #include "focus/sensors/level0_chain.h"
 #include "focus/sar_focuser.h"
+#include "product/general_sar_configuration.h"
 #include "focus_fixture.h"
 
 namespace {
@@ -72,6 +73,23 @@ TEST_F(ChainConfiguration, SensorChainsGetMemoryAndTheFixedValues) {
   writeText(path("m.hdr"), "[sarfocuserConfiguration]\nMemory = 900\n");
   ASSERT_EQ(configureLevel0Chain(c, path("m.hdr"), true), 0);
   EXPECT_EQ(c.Memory, 900);
+}
+
+TEST_F(ChainConfiguration, DocumentRealsReachTheChainAsWritten) {
+  // The document holds single-precision reals; the chain gets the decimals a
+  // profile with the same text would give.
+  GeneralSAR_configuration doc;
+  doc.dcestConf.Dftstep = 0.00004f;
+  doc.azimuthConf.AzimuthLookBandwidth = 0.8f;
+  doc.azimuthConf.AzimuthOverlap = 2561;
+  doc.generalConf.EraseTemp = 1;
+  const SARFocuser_conf c = chainConfFrom(doc);
+  EXPECT_EQ(c.Dftstep, 4e-05);
+  EXPECT_EQ(c.AzimuthLookBandwidth, 0.8);
+  EXPECT_EQ(c.RgBand, 0.72);
+  EXPECT_EQ(c.AzimuthOverlap, 1280);
+  EXPECT_EQ(c.DeleteTempFiles, 1);
+  EXPECT_EQ(documentReal(-20.0f), -20.0);
 }
 
 }  // namespace

@@ -128,7 +128,11 @@ const SensorDriver kEnvisatSensor = {.platform = "ENVISAT",
                                      .multiFileProducts = false,
                                      .multiFileGeoTiff = false};
 
-envisatLevel0Focuser::envisatLevel0Focuser() : extractor_(std::make_unique<enviextractor>()) {}
+envisatLevel0Focuser::envisatLevel0Focuser()
+    : level0SceneFocuser({.extractorMissing = "enviextractor object not allocated!",
+                          .extracted = "Extraction completed",
+                          .announceMemoryDefault = true}),
+      extractor_(std::make_unique<enviextractor>()) {}
 envisatLevel0Focuser::~envisatLevel0Focuser() = default;
 
 int envisatLevel0Focuser::nameStages() {
@@ -155,45 +159,27 @@ int envisatLevel0Focuser::nameStages() {
   return 0;
 }
 
-int envisatLevel0Focuser::initialize() {
-  if (int st = stripmapGeneralFocuser::initialize(); st != 0) return st;
-  if (int st = nameStages(); st != 0) return st;
-  if (int st = configureLevel0Chain(conf(), configurationFilename, true); st != 0) return st;
-  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
-  return 0;
-}
-
-int envisatLevel0Focuser::initialize_modular() {
-  if (int st = stripmapGeneralFocuserModular::initialize_modular(); st != 0) return st;
-  if (int st = nameStages(); st != 0) return st;
+void envisatLevel0Focuser::prepareModularExtraction() {
   extractor_->conf.Verbose = 0;
   extractor_->conf.Memory = Memory;
-  if (int st = setConfFile(configurationFilename, 0); st != 0) return level0CalledError(st);
-  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
-  return 0;
 }
 
-int envisatLevel0Focuser::ingestion(const std::string& raw, const std::string& chirp,
-                                    const std::string& antenna) {
-  if (outputSelected_) return STATUS_BAD_CONDITION;
-  work.rawFile = raw;
-  work.chirpFile = chirp;
+void envisatLevel0Focuser::redirectExtraction(const std::string& raw, const std::string& chirp,
+                                              const std::string& antenna) {
   work.antennaFile = antenna;
   extractor_->output.OutputRawFile = raw;
   extractor_->output.OutputChirpFile = chirp;
   extractor_->output.OutputAntennaPatternFile = antenna;
-  return ingestion();
 }
 
-int envisatLevel0Focuser::ingestion() {
-  ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
-  if (!extractor_) {
-    ORV_REPORT("enviextractor object not allocated!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
+int envisatLevel0Focuser::extract() {
   if (int st = extractor_->conf.checkpar(); st != 0) return level0CalledError(st);
   if (int st = extractor_->input.checkpar(); st != 0) return level0CalledError(st);
   if (int st = extractor_->run(); st != 0) return level0CalledError(st);
+  return 0;
+}
+
+int envisatLevel0Focuser::readRecords() {
   // Alternating polarisation gives one raster set per channel ("<name>1",
   // "<name>2"): the records of the first channel describe the scene.
   const std::string names[3] = {work.rawFile, work.chirpFile, work.antennaFile};
@@ -204,9 +190,7 @@ int envisatLevel0Focuser::ingestion() {
   }
   const int read = readWorkRecords(work, true);
   work.rawFile = names[0], work.chirpFile = names[1], work.antennaFile = names[2];
-  if (read != 0) return read;
-  ORV_REPORT("Extraction completed", REPORT_CHECKPOINT);
-  return 0;
+  return read;
 }
 
 int envisatLevel0Focuser::preprocessing() {

@@ -6,23 +6,18 @@
 #include <string>
 
 #include "focus/sensor_registry.h"
-#include "focus/stripmap_general_focuser.h"
+#include "focus/sensors/level0_chain.h"
 
 class enviextractor;
 
-class envisatLevel0Focuser : public stripmapGeneralFocuserModular {
+class envisatLevel0Focuser : public level0SceneFocuser {
  public:
   envisatLevel0Focuser();
   ~envisatLevel0Focuser() override;
 
-  int initialize() override;
   int finalize() override { return 0; }
-  int ingestion(const std::string& raw, const std::string& chirp,
-                const std::string& antenna) override;
-  int ingestion() override;
   int preprocessing() override;
   int postprocessing() override;
-  int initialize_modular() override;
   int finalize_modular() override { return 0; }
 
   std::string ASA_INSFilename;
@@ -31,7 +26,13 @@ class envisatLevel0Focuser : public stripmapGeneralFocuserModular {
   enviextractor* extractor() { return extractor_.get(); }
 
  private:
-  int nameStages();
+  int nameStages() override;
+  bool hasExtractor() const override { return extractor_ != nullptr; }
+  int extract() override;
+  void redirectExtraction(const std::string& raw, const std::string& chirp,
+                          const std::string& antenna) override;
+  void prepareModularExtraction() override;
+  int readRecords() override;
   std::unique_ptr<enviextractor> extractor_;
 };
 

@@ -85,22 +85,15 @@ const SensorDriver kErsSensor = {.platform = "ERS",
                                  .multiFileProducts = false,
                                  .multiFileGeoTiff = false};
 
-ersLevel0Focuser::ersLevel0Focuser() : extractor_(std::make_unique<ATERSExtractor>()) {}
+ersLevel0Focuser::ersLevel0Focuser()
+    : level0SceneFocuser({.extractorMissing = "ATERSExtractor object not allocated!",
+                          .extracted = "ERS image extracted",
+                          .announceMemoryDefault = false}),
+      extractor_(std::make_unique<ATERSExtractor>()) {}
 ersLevel0Focuser::~ersLevel0Focuser() = default;
 
 int ersLevel0Focuser::nameStages() {
-  if (LEAFilename.empty()) {
-    ORV_REPORT("LEA filename not selected!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
-  if (!extractor_) {
-    ORV_REPORT("ATERSExtractor object not allocated!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
-  if (!fileOpens(LEAFilename)) {
-    ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
+  if (int st = checkLeader(LEAFilename); st != 0) return st;
   nameLevel0Stages(work, focuser(), outputFilename, "", false);
   ATERSExtractor& x = *extractor_;
   x.ImgFilename = level0Filename;
@@ -113,44 +106,20 @@ int ersLevel0Focuser::nameStages() {
   return 0;
 }
 
-int ersLevel0Focuser::initialize() {
-  if (int st = stripmapGeneralFocuser::initialize(); st != 0) return st;
-  if (int st = nameStages(); st != 0) return st;
-  if (int st = configureLevel0Chain(conf(), configurationFilename, false); st != 0) return st;
-  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
-  return 0;
-}
-
-int ersLevel0Focuser::initialize_modular() {
-  if (int st = stripmapGeneralFocuserModular::initialize_modular(); st != 0) return st;
-  if (int st = nameStages(); st != 0) return st;
+void ersLevel0Focuser::prepareModularExtraction() {
   extractor_->Verbose = 0;
   extractor_->Memory = Memory;
-  if (int st = setConfFile(configurationFilename, 0); st != 0) return level0CalledError(st);
-  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
-  return 0;
 }
 
-int ersLevel0Focuser::ingestion(const std::string& raw, const std::string& chirp,
-                                const std::string&) {
-  if (outputSelected_) return STATUS_BAD_CONDITION;
-  work.rawFile = raw;
-  work.chirpFile = chirp;
+void ersLevel0Focuser::redirectExtraction(const std::string& raw, const std::string& chirp,
+                                          const std::string&) {
   extractor_->OutputFile = raw;
   extractor_->ChirpFile = chirp;
-  return ingestion();
 }
 
-int ersLevel0Focuser::ingestion() {
-  ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
-  if (!extractor_) {
-    ORV_REPORT("ATERSExtractor object not allocated!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
+int ersLevel0Focuser::extract() {
   if (int st = extractor_->checkpar(); st != 0) return level0CalledError(st);
   if (int st = extractor_->run(); st != 0) return level0CalledError(st);
-  if (int st = readWorkRecords(work, false); st != 0) return st;
-  ORV_REPORT("ERS image extracted", REPORT_CHECKPOINT);
   return 0;
 }
 

@@ -6,30 +6,30 @@
 #include <vector>
 
 #include "focus/sensor_registry.h"
-#include "focus/stripmap_general_focuser.h"
+#include "focus/sensors/level0_chain.h"
 
 class ATERSExtractor;
 
-class ersLevel0Focuser : public stripmapGeneralFocuserModular {
+class ersLevel0Focuser : public level0SceneFocuser {
  public:
   ersLevel0Focuser();
   ~ersLevel0Focuser() override;
 
-  int initialize() override;
   int finalize() override;
-  int ingestion(const std::string& raw, const std::string& chirp,
-                const std::string& antenna) override;
-  int ingestion() override;
   int preprocessing() override;
   int postprocessing() override;
-  int initialize_modular() override;
   int finalize_modular() override;
 
   std::string LEAFilename;  // CEOS leader file
   ATERSExtractor* extractor() { return extractor_.get(); }
 
  private:
-  int nameStages();
+  int nameStages() override;
+  bool hasExtractor() const override { return extractor_ != nullptr; }
+  int extract() override;
+  void redirectExtraction(const std::string& raw, const std::string& chirp,
+                          const std::string& antenna) override;
+  void prepareModularExtraction() override;
   std::unique_ptr<ATERSExtractor> extractor_;
 };
 

@@ -2,18 +2,11 @@
 
 #include <cstdio>
 
+#include "base/status.h"
 #include "diag/report.h"
 #include "focus/sar_focuser.h"
 #include "focus/stripmap_general_focuser.h"
 #include "product/profile.h"
-
-bool fileOpens(const std::string& name) {
-  if (name.empty()) return false;
-  std::FILE* f = std::fopen(name.c_str(), "rb");
-  if (!f) return false;
-  std::fclose(f);
-  return true;
-}
 
 int level0CalledError(int status) {
   ORV_REPORT_CALLED_ERROR();
@@ -60,5 +53,55 @@ int configureLevel0Chain(SARFocuser_conf& conf, const std::string& profile, bool
   conf.Flag_swstal = 1;
   conf.Flag_ortog = 1;
   conf.Incore = 0;
+  return 0;
+}
+
+int level0SceneFocuser::checkLeader(const std::string& leader) const {
+  const char* failure = leader.empty()       ? "LEA filename not selected!"
+                        : !hasExtractor()    ? texts_.extractorMissing
+                        : !fileOpens(leader) ? "LEA file does not exist!"
+                                             : nullptr;
+  if (!failure) return 0;
+  ORV_REPORT(failure, REPORT_ERROR);
+  return STATUS_BAD_CONDITION;
+}
+
+int level0SceneFocuser::initialize() {
+  if (int st = stripmapGeneralFocuser::initialize(); st != 0) return st;
+  if (int st = nameStages(); st != 0) return st;
+  if (int st = configureLevel0Chain(conf(), configurationFilename, texts_.announceMemoryDefault);
+      st != 0)
+    return st;
+  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
+  return 0;
+}
+
+int level0SceneFocuser::initialize_modular() {
+  if (int st = stripmapGeneralFocuserModular::initialize_modular(); st != 0) return st;
+  if (int st = nameStages(); st != 0) return st;
+  prepareModularExtraction();
+  if (int st = setConfFile(configurationFilename, 0); st != 0) return level0CalledError(st);
+  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
+  return 0;
+}
+
+int level0SceneFocuser::ingestion(const std::string& raw, const std::string& chirp,
+                                  const std::string& antenna) {
+  if (outputSelected_) return STATUS_BAD_CONDITION;
+  work.rawFile = raw;
+  work.chirpFile = chirp;
+  redirectExtraction(raw, chirp, antenna);
+  return ingestion();
+}
+
+int level0SceneFocuser::ingestion() {
+  ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
+  if (!hasExtractor()) {
+    ORV_REPORT(texts_.extractorMissing, REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  if (int st = extract(); st != 0) return st;
+  if (int st = readRecords(); st != 0) return st;
+  ORV_REPORT(texts_.extracted, REPORT_CHECKPOINT);
   return 0;
 }

@@ -35,15 +35,15 @@ std::string palsarLevel0Focuser::sceneName(int index) const {
 int palsarLevel0Focuser::nameStages(const std::string& scene, const std::string& root) {
   if (leaderFilename.empty()) {
     ORV_REPORT("LEA filename not selected!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (!extractor_) {
     ORV_REPORT("ATPalExtractor object not allocated!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (!fileOpens(leaderFilename)) {
     ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   // No range antenna pattern is extracted: the chain applies none.
   nameLevel0Stages(work, focuser(), root, ".rgpatt", false);
@@ -85,7 +85,7 @@ int palsarLevel0Focuser::initialize() {
 }
 
 int palsarLevel0Focuser::ingestion(const std::string& raw, const std::string& chirp, const std::string&) {
-  if (outputSelected_) return 1;
+  if (outputSelected_) return STATUS_BAD_CONDITION;
   work.rawFile = raw;
   work.chirpFile = chirp;
   extractor_->OutputFile = raw;
@@ -97,7 +97,7 @@ int palsarLevel0Focuser::ingestion() {
   ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
   if (!extractor_) {
     ORV_REPORT("ATPalExtractor object not allocated!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   if (int st = extractor_->checkpar(); st != 0) return level0CalledError(st);
   if (int st = extractor_->run(); st != 0) return level0CalledError(st);
@@ -145,7 +145,7 @@ int palsarMultiPolLevel0Focuser::initialize() {
 int palsarMultiPolLevel0Focuser::initializeUsingDoppler(const std::string& header) {
   if (!initialized_) {
     ORV_REPORT("function initialize() hasn't been called before calling initializeUsingDoppler()", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   ++currentScene;
   const std::string scene = sceneName(currentScene);

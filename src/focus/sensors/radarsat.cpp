@@ -46,22 +46,15 @@ const SensorDriver kRadarsatSensor = {.platform = "RADARSAT",
                                       .multiFileProducts = false,
                                       .multiFileGeoTiff = false};
 
-radarsatLevel0Focuser::radarsatLevel0Focuser() : extractor_(std::make_unique<radarextract>()) {}
+radarsatLevel0Focuser::radarsatLevel0Focuser()
+    : level0SceneFocuser({.extractorMissing = "radarextract object not allocated!",
+                          .extracted = "RADARSAT image extracted",
+                          .announceMemoryDefault = false}),
+      extractor_(std::make_unique<radarextract>()) {}
 radarsatLevel0Focuser::~radarsatLevel0Focuser() = default;
 
 int radarsatLevel0Focuser::nameStages() {
-  if (leaderFilename.empty()) {
-    ORV_REPORT("LEA filename not selected!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
-  if (!extractor_) {
-    ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
-  if (!fileOpens(leaderFilename)) {
-    ORV_REPORT("LEA file does not exist!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
+  if (int st = checkLeader(leaderFilename); st != 0) return st;
   nameLevel0Stages(work, focuser(), outputFilename, "", false);
   radarextract& x = *extractor_;
   x.DataFile = level0Filename;
@@ -74,42 +67,15 @@ int radarsatLevel0Focuser::nameStages() {
   return 0;
 }
 
-int radarsatLevel0Focuser::initialize() {
-  if (int st = stripmapGeneralFocuser::initialize(); st != 0) return st;
-  if (int st = nameStages(); st != 0) return st;
-  if (int st = configureLevel0Chain(conf(), configurationFilename, false); st != 0) return st;
-  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
-  return 0;
-}
-
-int radarsatLevel0Focuser::initialize_modular() {
-  if (int st = stripmapGeneralFocuserModular::initialize_modular(); st != 0) return st;
-  if (int st = nameStages(); st != 0) return st;
-  if (int st = setConfFile(configurationFilename, 0); st != 0) return level0CalledError(st);
-  ORV_REPORT("Initialization completed", REPORT_CHECKPOINT);
-  return 0;
-}
-
-int radarsatLevel0Focuser::ingestion(const std::string& raw, const std::string& chirp,
-                                     const std::string&) {
-  if (outputSelected_) return STATUS_BAD_CONDITION;
-  work.rawFile = raw;
-  work.chirpFile = chirp;
+void radarsatLevel0Focuser::redirectExtraction(const std::string& raw, const std::string& chirp,
+                                               const std::string&) {
   extractor_->OutputRawFile = raw;
   extractor_->OutputChirpFile = chirp;
-  return ingestion();
 }
 
-int radarsatLevel0Focuser::ingestion() {
-  ORV_REPORT("Starting ingestion", REPORT_CHECKPOINT);
-  if (!extractor_) {
-    ORV_REPORT("radarextract object not allocated!", REPORT_ERROR);
-    return STATUS_BAD_CONDITION;
-  }
+int radarsatLevel0Focuser::extract() {
   if (int st = extractor_->checkpar(); st != 0) return level0CalledError(st);
   if (int st = extractor_->run(); st != 0) return level0CalledError(st);
-  if (int st = readWorkRecords(work, false); st != 0) return st;
-  ORV_REPORT("RADARSAT image extracted", REPORT_CHECKPOINT);
   return 0;
 }
 

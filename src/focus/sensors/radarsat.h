@@ -5,30 +5,29 @@
 #include <string>
 
 #include "focus/sensor_registry.h"
-#include "focus/stripmap_general_focuser.h"
+#include "focus/sensors/level0_chain.h"
 
 class radarextract;
 
-class radarsatLevel0Focuser : public stripmapGeneralFocuserModular {
+class radarsatLevel0Focuser : public level0SceneFocuser {
  public:
   radarsatLevel0Focuser();
   ~radarsatLevel0Focuser() override;
 
-  int initialize() override;
   int finalize() override;
-  int ingestion(const std::string& raw, const std::string& chirp,
-                const std::string& antenna) override;
-  int ingestion() override;
   int preprocessing() override;
   int postprocessing() override;
-  int initialize_modular() override;
   int finalize_modular() override;
 
   std::string leaderFilename;
   radarextract* extractor() { return extractor_.get(); }
 
  private:
-  int nameStages();
+  int nameStages() override;
+  bool hasExtractor() const override { return extractor_ != nullptr; }
+  int extract() override;
+  void redirectExtraction(const std::string& raw, const std::string& chirp,
+                          const std::string& antenna) override;
   std::unique_ptr<radarextract> extractor_;
 };
 

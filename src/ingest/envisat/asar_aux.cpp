@@ -85,7 +85,7 @@ int fbaq_decode84_f(const unsigned char* data, float* out, int bytes, int sample
   const int lineBytes = fbaq_line_bytes(samples);
   if (lineBytes <= 0 || bytes % lineBytes != 0) {
     if (asar_reports_on()) ORV_REPORT(" window length and packet size do not match!", REPORT_ERROR);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   const int count = bytes / lineBytes;
   const int full = samples / 63, tailSamples = samples - 63 * full;
@@ -120,7 +120,7 @@ int fbaq_decode84fe(const unsigned char* data, float* out, int bytes, int sample
   const int lineBytes = (samples + 1) / 2 * 2;
   if (lineBytes <= 0 || bytes % lineBytes != 0) {
     if (asar_reports_on()) ORV_REPORT(" window length and packet size do not match!", REPORT_WARNING);
-    return 1;
+    return STATUS_BAD_CONDITION;
   }
   const int count = bytes / lineBytes;
   float* o = out;

@@ -549,12 +549,13 @@ int Walk::decodeEcho(int s) {
   const int samples = par_[s].samples;
   const long bytes = head_.dataBytes();
   const int lineBytes = fbaq_line_bytes(samples);
-  if (bytes <= 0 || bytes % lineBytes != 0 || !file_.has(pos_, head_.packetBytes())) return 1;
+  if (bytes <= 0 || bytes % lineBytes != 0 || !file_.has(pos_, head_.packetBytes()))
+    return STATUS_BAD_CONDITION;
   scratch_.resize(std::size_t(bytes / lineBytes) * 2 * std::size_t(samples));
   int floats = 0, lines = 0;
   if (fbaq_decode84_f(file_.data() + pos_ + kPacketHeadBytes, scratch_.data(), int(bytes), samples, 1, &floats,
                       &lines) != 0)
-    return 1;
+    return STATUS_BAD_CONDITION;
   const float* g = droop_.data();
   for (int k = 0; k < samples; ++k) {
     const float inv = 1.0f / g[std::min(k, kDroopSamples - 1)];

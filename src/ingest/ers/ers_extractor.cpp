@@ -2,7 +2,6 @@
 #include "ingest/ers/ers_extractor.h"
 
 #include <algorithm>
-#include <climits>
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
@@ -64,43 +63,20 @@ std::string vectorStartText(int day, int month, const std::string& year, double 
 
 }  // namespace
 
-ATERSExtractor::ATERSExtractor() { createElementsVector(10); }
+ATERSExtractor::ATERSExtractor() : ProcessingTool("ATERSExtractor", "ATERSExtractor.report") {
+  createElementsVector(10);
+}
 
 ATERSExtractor::~ATERSExtractor() = default;
 
 void ATERSExtractor::refreshParameters() {
-  addElementInt("Memory", &Memory, 1, 0, INT_MAX, true);
-  addElementString("ReportFilename", &ReportFilename, true);
-  addElementInt("ReportLevel", &ReportLevel, 1, 0, 3, true);
-  addElementInt("Incore", &Incore, 1, 0, 1, true);
-  addElementInt("Verbose", &Verbose, 1, 0, 1, true);
+  addCommonElements();
   addElementString("ImgFilename", &ImgFilename, true);
   addElementString("LeaFilename", &LeaFilename, true);
   addElementString("OrbitFilename", &OrbitFilename, true);
   addElementString("OutputFile", &OutputFile, true);
   addElementString("ChirpFile", &ChirpFile, true);
   setAllocationFlag(true);
-}
-
-int ATERSExtractor::createBuffers() { return createBuffersDefault(); }
-
-int ATERSExtractor::destroyBuffers() {
-  setAllocationFlag(false);
-  return 0;
-}
-
-int ATERSExtractor::checkpar() {
-  checkAuxiliaryFile();
-  return 0;
-}
-
-int ATERSExtractor::readpar(const std::string& file, int channel) {
-  readAuxiliaryFile(file, channel, "ATERSExtractor");
-  return 0;
-}
-
-int ATERSExtractor::writepar(const std::string& file, int channel) {
-  return writeAuxiliaryFile(file, channel, "ATERSExtractor");
 }
 
 int ATERSExtractor::InitProcessing(const std::string& file, int channel) {
@@ -110,17 +86,8 @@ int ATERSExtractor::InitProcessing(const std::string& file, int channel) {
   return 0;
 }
 
-int ATERSExtractor::FinalizeProcessing(const std::string&, int) {
-  exit_report();
-  return 0;
-}
-
 int ATERSExtractor::runall(const std::string& file, int channel) {
-  std::string target = ReportFilename;
-  if (getConfigurationFile(file, channel, "ATERSExtractor", target)) {
-    ReportFilename = target;
-    return STATUS_BAD_CONDITION;
-  }
+  if (namesOtherConfiguration(file, channel)) return STATUS_BAD_CONDITION;
   if (int st = InitProcessing(file, channel); st != 0) return ERS_CALLED(st);
   if (int st = run(); st != 0) return ERS_CALLED(st);
   if (int st = FinalizeProcessing(file, channel); st != 0) return ERS_CALLED(st);

@@ -9,23 +9,17 @@
 #include "product/general_sar_base.h"
 #include "product/product_aggregates.h"
 
-class ATERSExtractor : public GeneralSAR_Base {
+class ATERSExtractor : public ProcessingTool {
  public:
   ATERSExtractor();
   ~ATERSExtractor() override;
 
-  int createBuffers() override;
-  int destroyBuffers() override;
   void refreshParameters() override;
-  int checkpar();
-  int readpar(const std::string& file, int channel);
-  int writepar(const std::string& file, int channel);
   // Opens the report "ATERSExtractor REPORT", reads and checks the parameters.
   int InitProcessing(const std::string& file, int channel);
   // Leader, orbit, image pass and raster, record header, chirp. 0 or the
   // status of the first failure (9 not opened, 4 short read, 7 memory).
   int run();
-  int FinalizeProcessing(const std::string& file, int channel);
   // 1 and nothing done when the document names a ConfigurationFile;
   // otherwise InitProcessing, run, FinalizeProcessing.
   int runall(const std::string& file, int channel);
@@ -47,12 +41,7 @@ class ATERSExtractor : public GeneralSAR_Base {
   int getVectorLength() const { return vectorsReady_ ? static_cast<int>(swstVector.size()) : 0; }
   int getMissingLines() const { return missingLines_; }
 
-  // Element table, in order.
-  int Memory = 256;
-  std::string ReportFilename = "ATERSExtractor.report";
-  int ReportLevel = 1;
-  int Incore = 0;
-  int Verbose = 1;
+  // Element table, in order, after the common values of the tool.
   std::string ImgFilename;
   std::string LeaFilename;
   std::string OrbitFilename;

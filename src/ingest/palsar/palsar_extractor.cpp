@@ -79,15 +79,13 @@ bool readFile(const std::string& name, std::vector<char>& bytes) {
 
 }  // namespace
 
-ATPalExtractor::ATPalExtractor() { createElementsVector(14); }
+ATPalExtractor::ATPalExtractor() : ProcessingTool("ATPalExtractor", "ATPalExtractor.report") {
+  createElementsVector(14);
+}
 ATPalExtractor::~ATPalExtractor() = default;
 
 void ATPalExtractor::refreshParameters() {
-  addElementInt("Memory", &Memory, 1, 0, INT_MAX, true);
-  addElementString("ReportFilename", &ReportFilename, true);
-  addElementInt("ReportLevel", &ReportLevel, 1, 0, 3, true);
-  addElementInt("Incore", &Incore, 1, 0, 1, true);
-  addElementInt("Verbose", &Verbose, 1, 0, 1, true);
+  addCommonElements();
   addElementString("LeaFileName", &LeaFileName, true);
   addElementString("RawDataName", &RawDataName, true);
   addElementString("Orbit_Filename", &Orbit_Filename, true);
@@ -101,38 +99,14 @@ void ATPalExtractor::refreshParameters() {
   setAllocationFlag(true);
 }
 
-int ATPalExtractor::createBuffers() { return createBuffersDefault(); }
-int ATPalExtractor::destroyBuffers() {
-  setAllocationFlag(false);
-  return 0;
-}
-int ATPalExtractor::checkpar() {
-  checkAuxiliaryFile();
-  return 0;
-}
-int ATPalExtractor::readpar(const std::string& file, int channel) {
-  readAuxiliaryFile(file, channel, "ATPalExtractor");
-  return 0;
-}
-int ATPalExtractor::writepar(const std::string& file, int channel) {
-  return writeAuxiliaryFile(file, channel, "ATPalExtractor");
-}
 int ATPalExtractor::InitProcessing(const std::string& file, int channel) {
   if (int st = readpar(file, channel); st != 0) return PAL_CALLED(st);
   init_report(0, "ATPalExtractor REPORT", ReportLevel);
   if (int st = checkpar(); st != 0) return PAL_CALLED(st);
   return 0;
 }
-int ATPalExtractor::FinalizeProcessing(const std::string&, int) {
-  exit_report();
-  return 0;
-}
 int ATPalExtractor::runall(const std::string& file, int channel) {
-  std::string target = ReportFilename;
-  if (getConfigurationFile(file, channel, "ATPalExtractor", target)) {
-    ReportFilename = target;
-    return 1;
-  }
+  if (namesOtherConfiguration(file, channel)) return STATUS_BAD_CONDITION;
   if (int st = InitProcessing(file, channel); st != 0) return PAL_CALLED(st);
   if (int st = run(); st != 0) return PAL_CALLED(st);
   if (int st = FinalizeProcessing(file, channel); st != 0) return PAL_CALLED(st);
@@ -441,7 +415,7 @@ int ATPalExtractor::walkImage(bool ersdac) {
 }
 
 int ATPalExtractor::extract_chirp(int channel, std::vector<fcomplex>& chirp) const {
-  if (channel < 0 || channel >= numberOfChannels) return 1;
+  if (channel < 0 || channel >= numberOfChannels) return STATUS_BAD_CONDITION;
   const double T = record.pulse.PulseLength, fs = record.sampling.frg_hz, B = record.pulse.Bandwidth;
   if (!(T > 0.0) || !(fs > 0.0) || !(B > 0.0)) return PAL_FAIL("Bad pulse parameters for the PALSAR chirp", STATUS_BAD_PARAMETER);
   const double x = T * fs;
@@ -489,13 +463,13 @@ int ATPalExtractor::write_chirp(const std::string& header, const std::string& ou
 }
 
 int ATPalExtractor::getOutputFilename(int channel, std::string& name) const {
-  if (channel < 0 || channel >= numberOfChannels) return 1;
+  if (channel < 0 || channel >= numberOfChannels) return STATUS_BAD_CONDITION;
   name = numberOfChannels > 1 ? OutputFile + std::to_string(channel) : OutputFile;
   return 0;
 }
 
 int ATPalExtractor::getPolarization(int channel, std::string& pol) const {
-  if (channel < 0 || channel >= numberOfChannels) return 1;
+  if (channel < 0 || channel >= numberOfChannels) return STATUS_BAD_CONDITION;
   pol = polarization_;
   return 0;
 }

@@ -11,19 +11,13 @@
 #include "product/general_sar_base.h"
 #include "product/product_aggregates.h"
 
-class ATPalExtractor : public GeneralSAR_Base {
+class ATPalExtractor : public ProcessingTool {
  public:
   ATPalExtractor();
   ~ATPalExtractor() override;
 
-  int createBuffers() override;
-  int destroyBuffers() override;
   void refreshParameters() override;
-  int checkpar();
-  int readpar(const std::string& file, int channel);
-  int writepar(const std::string& file, int channel);
   int InitProcessing(const std::string& file, int channel);
-  int FinalizeProcessing(const std::string& file, int channel);
   int runall(const std::string& file, int channel);
   // Raw_Focused 0: extract(); 1: extract_l11(); anything else: nothing.
   int run();
@@ -52,12 +46,7 @@ class ATPalExtractor : public GeneralSAR_Base {
   int getNpol() const { return npol_; }
   int getMissingLines() const { return missingLines_; }
 
-  // Element table, in order.
-  int Memory = 256;
-  std::string ReportFilename = "ATPalExtractor.report";
-  int ReportLevel = 1;
-  int Incore = 0;
-  int Verbose = 1;
+  // Element table, in order, after the common values of the tool.
   std::string LeaFileName;
   std::string RawDataName;
   std::string Orbit_Filename;

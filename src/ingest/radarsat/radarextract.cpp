@@ -12,6 +12,7 @@
 #include <fstream>
 #include <new>
 
+#include "base/constants.h"
 #include "base/status.h"
 #include "diag/ckerr.h"
 #include "diag/report.h"
@@ -98,7 +99,7 @@ long positionRecordOffset(const std::vector<char>& b) {
 double greenwichAngle(double sec85) {
   const double d = sec85 / 86400.0 + 2446066.5 - 2451545.0;  // days from J2000.0
   const double deg = 280.46061837 + 360.98564736629 * d;
-  return std::fmod(deg, 360.0) * M_PI / 180.0;
+  return std::fmod(deg, 360.0) * consts::kPi / 180.0;
 }
 
 }  // namespace
