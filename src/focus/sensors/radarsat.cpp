@@ -108,6 +108,14 @@ int radarsatLevel0Focuser::ingestion() {
   }
   if (int st = extractor_->checkpar(); st != 0) return level0CalledError(st);
   if (int st = extractor_->run(); st != 0) return level0CalledError(st);
+  // An SLC product is extracted as it stands and goes no further: the chain
+  // focuses raw echoes.
+  if (extractor_->productLevel == 1) {
+    ORV_REPORT("RADARSAT SLC product extracted into " + work.rawFile +
+                   ": the stripmap chain focuses raw data only",
+               REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
   if (int st = readWorkRecords(work, false); st != 0) return st;
   ORV_REPORT("RADARSAT image extracted", REPORT_CHECKPOINT);
   return 0;
