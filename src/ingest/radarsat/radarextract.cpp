@@ -587,7 +587,8 @@ int radarextract::finishRecord(int source) {
 // prefix, earliest line first. Products whose leader says the line time
 // decreases (ascending passes delivered north up) are turned over here. The
 // sampling rate and PRF come from the data set summary, the slant range of
-// the first pixel and the line times from the record heads.
+// the first pixel and the line times from the record heads. Pixels are taken
+// in increasing range, as the slant-range products are delivered.
 int radarextract::extractSLC() {
   CheckedCall cc("radarextract::extractSLC()");
   std::ifstream in;
