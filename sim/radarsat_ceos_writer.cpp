@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdio>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -28,6 +29,9 @@ constexpr SimBeam kBeams[] = {{"S1", 1, 7},  {"S2", 2, 7},  {"S3", 3, 8},  {"S4"
                               {"F2", 17, 8}, {"F3", 18, 9}, {"F4", 19, 9}, {"F5", 20, 9}};
 // Six ADC periods and one ADC period of each rate code, s.
 constexpr double kUnits[3][2] = {{1.8566e-07, 3.094e-08}, {3.2491e-07, 5.415e-08}, {4.6415e-07, 7.736e-08}};
+// Replica window of 44.559 us at the ADC clock of each rate code (129.2683 MHz
+// over 4, 7 and 10), in complex samples; the 42 us chirp is centred in it.
+constexpr int kReplicaWindows[3] = {1440, 822, 576};
 constexpr double kBandwidths[3] = {30.0e6, 17.28e6, 11.58e6};
 
 const unsigned char kTypeFdr[4] = {0x3F, 0xC0, 0x12, 0x12};
@@ -122,7 +126,7 @@ SceneDescription RadarsatSceneWriter::adjusted(SceneDescription d, RadarsatOptio
     d.lineWindowStarts[std::size_t(k)] = (code + 5) * unit - kOffset + pulses * pri;
   }
   d.nearRangeTime = d.lineWindowStarts.front();
-  replicaSamples = static_cast<int>(std::lround(kPulse * d.samplingRateHz));
+  replicaSamples = kReplicaWindows[o.rateCode];
   return d;
 }
 
@@ -176,7 +180,7 @@ void RadarsatSceneWriter::packAux(int line, bool replica, unsigned char* a) cons
   a[49] = static_cast<unsigned char>((replica ? 0x40 : 0) | (gainCodeOf(line) & 63));
 }
 
-std::vector<char> RadarsatSceneWriter::buildLeader() const {
+std::vector<char> RadarsatSceneWriter::buildLeader(bool slc, bool timeDecreasing) const {
   const SceneDescription& d = sim_.scene();
   const double duration = d.lines / d.prfHz;
   const double interval = 8.0;
@@ -187,9 +191,15 @@ std::vector<char> RadarsatSceneWriter::buildLeader() const {
   char* r = b.data();
   putCeosRecordHead(r, 1, kTypeFdr, 720);
   putText(r, 16, 12, "CEOS-SAR-CCT");
-  putText(r, 48, 16, "RSAT-1-SAR-RAW");
+  putText(r, 48, 16, slc ? "RSAT-1-SAR-SLC" : "RSAT-1-SAR-RAW");
   r = b.data() + 720;
   putCeosRecordHead(r, 2, kTypeDss, 4096);
+  if (slc) {
+    putFormat(r, 710, 16, "%16.7f", d.samplingRateHz / 1.0e6);
+    putFormat(r, 934, 16, "%16.7f", d.prfHz);
+    putText(r, 1526, 8, "INCREASE");
+    putText(r, 1534, 8, timeDecreasing ? "DECREASE" : "INCREASE");
+  }
   putText(r, 20, 16, "SIM" + std::to_string(d.orbitNumber));
   putText(r, 68, 17, simCompactDateText(d.startTime + 0.5 * duration));
   putText(r, 100, 16, "DESCENDING");
@@ -249,15 +259,23 @@ int RadarsatSceneWriter::write(const std::string& outDir, std::string& error) co
     return 5;
   }
 
-  // The replica as the instrument loops it back: the chirp centred on the pulse.
+  // The replica as the instrument loops it back: the 42 us chirp centred in
+  // the replica window, the smallest levels of either sign around it.
   const double K = 2.0 * d.chirpCoefficient, fs = d.samplingRateHz;
+  const int pulse = pulseSamples();
+  const int lead = (replicaSamples_ - pulse) / 2;
   std::vector<unsigned char> replica(2 * std::size_t(replicaSamples_));
   auto code = [table](int v) { return static_cast<unsigned char>(table ? v + 16 : (v & 0x0F)); };
   for (int j = 0; j < replicaSamples_; ++j) {
-    const double u = (j - 0.5 * (replicaSamples_ - 1)) / fs;
-    const double ph = consts::kPi * K * u * u;
-    replica[2 * std::size_t(j)] = code(level4(static_cast<float>(6.0 * std::cos(ph))));
-    replica[2 * std::size_t(j) + 1] = code(level4(static_cast<float>(6.0 * std::sin(ph))));
+    float re = (j & 1) ? 0.0f : -1.0f, im = (j & 2) ? 0.0f : -1.0f;
+    if (j >= lead && j < lead + pulse) {
+      const double u = (j - lead - 0.5 * (pulse - 1)) / fs;
+      const double ph = consts::kPi * K * u * u;
+      re = static_cast<float>(6.0 * std::cos(ph));
+      im = static_cast<float>(6.0 * std::sin(ph));
+    }
+    replica[2 * std::size_t(j)] = code(level4(re));
+    replica[2 * std::size_t(j) + 1] = code(level4(im));
   }
   std::vector<char> rec(static_cast<std::size_t>(recordLength));
   std::vector<fcomplex> echoes;
@@ -300,4 +318,89 @@ int RadarsatSceneWriter::write(const std::string& outDir, std::string& error) co
   o.close();
   if (opt_.truncateBytes > 0) std::filesystem::resize_file(path, std::uintmax_t(opt_.truncateBytes), ec);
   return sim_.writeTruth(outDir + "/truth.txt", error);
+}
+
+int RadarsatSceneWriter::writeSlc(const std::string& outDir, bool timeDecreasing, std::string& error) const {
+  const SceneDescription& d = sim_.scene();
+  std::error_code ec;
+  std::filesystem::create_directories(outDir + "/" + d.sceneDir, ec);
+  const std::vector<char> leader = buildLeader(true, timeDecreasing);
+  std::ofstream l(leaderPath(outDir), std::ios::binary);
+  if (!l.write(leader.data(), std::streamsize(leader.size()))) {
+    error = "cannot write " + leaderPath(outDir);
+    return 5;
+  }
+  const int recordLength = kHead + 4 * d.samples;
+  std::vector<char> descriptor(kDescriptor, ' ');
+  putCeosRecordHead(descriptor.data(), 1, kTypeFdr, kDescriptor);
+  putText(descriptor.data(), 48, 16, "RSAT-1-SAR-SLC");
+  putInt(descriptor.data(), 180, 6, "%6ld", d.lines);
+  putInt(descriptor.data(), 186, 6, "%6ld", recordLength);
+  const std::string path = dataPath(outDir);
+  std::ofstream o(path, std::ios::binary);
+  o.write(descriptor.data(), kDescriptor);
+  std::vector<char> rec(static_cast<std::size_t>(recordLength));
+  for (int k = 0; k < d.lines; ++k) {
+    const int line = timeDecreasing ? d.lines - 1 - k : k;
+    std::fill(rec.begin(), rec.end(), 0);
+    putCeosRecordHead(rec.data(), std::uint32_t(k + 2), kTypeSignal, std::uint32_t(recordLength));
+    putBE32(rec.data() + 12, std::uint32_t(k + 1));
+    const double t = sim_.lineTime(line);
+    const CivilTime c = simCivil(t);
+    putBE32(rec.data() + 36, std::uint32_t(c.year));
+    putBE32(rec.data() + 40, std::uint32_t(simDayOfYear(c.year, c.month, c.day)));
+    putBE32(rec.data() + 44,
+            std::uint32_t(std::lround(1000.0 * (t - simSec85(CivilTime{c.year, c.month, c.day, 0, 0, 0.0})))));
+    putBE32(rec.data() + 64, std::uint32_t(std::lround(0.5 * kC * d.nearRangeTime)));
+    for (int j = 0; j < d.samples; ++j) {
+      int i = 0, q = 0;
+      slcPixel(line, j, i, q);
+      char* px = rec.data() + kHead + 4 * j;
+      px[0] = char((i >> 8) & 255), px[1] = char(i & 255), px[2] = char((q >> 8) & 255), px[3] = char(q & 255);
+    }
+    o.write(rec.data(), recordLength);
+  }
+  if (!o) {
+    error = "cannot write " + path;
+    return 5;
+  }
+  return 0;
+}
+
+int RadarsatSceneWriter::writeTextOrbit(const std::string& path, std::string& error) const {
+  const SceneDescription& d = sim_.scene();
+  const CivilTime c = simCivil(d.startTime);
+  const double midnight = simSec85(CivilTime{c.year, c.month, c.day, 0, 0, 0.0});
+  const int doy = simDayOfYear(c.year, c.month, c.day);
+  const double g0 = 100.375;  // degrees at midnight: any value, the file carries it
+  const double w = 7.292115189334571e-5;
+  auto stamp = [&](double t) {
+    const double sod = t - midnight;
+    const int h = static_cast<int>(sod / 3600.0), m = static_cast<int>((sod - 3600.0 * h) / 60.0);
+    char text[64];
+    std::snprintf(text, sizeof text, "%04d %03d %02d:%02d:%09.6f", c.year, doy, h, m, sod - 3600.0 * h - 60.0 * m);
+    return std::string(text);
+  };
+  std::ostringstream o;
+  o << "RADARSAT-1 DEFINITIVE ORBIT\nGENERATION TIME: " << stamp(midnight + 3600.0) << "\nORBIT NUMBER: "
+    << d.orbitNumber << "\nGREENWICH ANGLE: " << stamp(midnight) << " " << g0
+    << "\nFIRST MODEL: GEOPOTENTIAL 70X70\nSECOND MODEL: DRAG\n";
+  const double first = std::floor(d.startTime / 60.0) * 60.0 - 600.0;
+  const double last = d.startTime + d.lines / d.prfHz + 600.0;
+  for (double t = first; t <= last; t += 60.0) {
+    const StateVector sv = sim_.orbit().at(t);
+    const double g = g0 * M_PI / 180.0 + w * (t - midnight), cg = std::cos(g), sg = std::sin(g);
+    const double px = sv.pos[0], py = sv.pos[1];
+    const double ux = sv.vel[0] - w * py, uy = sv.vel[1] + w * px;
+    char line[256];
+    std::snprintf(line, sizeof line, "STATE VECTOR: %s %.6f %.6f %.6f %.9f %.9f %.9f\n", stamp(t).c_str(),
+                  cg * px - sg * py, sg * px + cg * py, sv.pos[2], cg * ux - sg * uy, sg * ux + cg * uy, sv.vel[2]);
+    o << line;
+  }
+  std::ofstream f(path);
+  if (!(f << o.str())) {
+    error = "cannot write " + path;
+    return 5;
+  }
+  return 0;
 }

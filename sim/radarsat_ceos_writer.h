@@ -49,7 +49,9 @@ class RadarsatSceneWriter {
   double firstUnit() const { return unit_; }
   int windowCodeOf(int line) const;
   int gainCodeOf(int line) const;
+  // Replica window and the chirp centred in it, complex samples.
   int replicaSamples() const { return replicaSamples_; }
+  int pulseSamples() const { return static_cast<int>(42.0e-6 * sim_.scene().samplingRateHz + 0.5); }
   int recordSlots() const { return replicaSamples_ + sim_.scene().samples; }
 
   // Writes <outDir>/<sceneDir>/{LEA_01.001, DAT_01.001} and <outDir>/truth.txt.
@@ -57,8 +59,24 @@ class RadarsatSceneWriter {
   int write(const std::string& outDir, std::string& error) const;
   std::string leaderPath(const std::string& outDir) const;
   std::string dataPath(const std::string& outDir) const;
-  // The leader alone (vectors every 8 s over the scene and 30 s around it).
-  std::vector<char> buildLeader() const;
+  // The leader alone (vectors every 8 s over the scene and 30 s around it);
+  // an SLC product's leader names its level and gives the sampling rate, the
+  // PRF and the direction of the line time in the data set summary.
+  std::vector<char> buildLeader(bool slc = false, bool timeDecreasing = false) const;
+  // An SLC product of the scene's size in place of the raw one: the image
+  // file holds per line the 192-byte head (line time, slant range of the
+  // first pixel) and big-endian 16-bit I and Q of slcPixel(); with
+  // timeDecreasing the last line comes first.
+  int writeSlc(const std::string& outDir, bool timeDecreasing, std::string& error) const;
+  // A RADARSAT text orbit file of the scene's orbit: the named blocks, then
+  // one "STATE VECTOR:" line per minute over 10 minutes either side of the
+  // scene, inertial (true of date) through the Greenwich angle the file
+  // gives at midnight of the scene's day.
+  int writeTextOrbit(const std::string& path, std::string& error) const;
+  static void slcPixel(int line, int sample, int& i, int& q) {
+    i = (line * 31 + sample * 7) % 4001 - 2000;
+    q = 1000 - (line * 13 + sample * 11) % 3001;
+  }
   // The 50-byte auxiliary head of a line in the public layout.
   void packAux(int line, bool replica, unsigned char* aux) const;
 

@@ -82,6 +82,12 @@ int interp_orb_l_v2(const std::string& path, double t, int n, double dt, double*
   OrbitRecords rec;
   int st = read_radarsat_orbit(path, rec);
   if (st != 0) return st;
-  return interp_orb_records(rec, t, t - (n - 1) / 2.0 * dt, dt, n, pos, vel);
+  // The table must lie inside the file's vectors: no extrapolation.
+  const double first = t - (n - 1) / 2.0 * dt, last = t + (n - 1) / 2.0 * dt;
+  if (first < rec.times.front() || last > rec.times.back()) {
+    ORV_REPORT("The RADARSAT orbit file " + path + " does not cover the scene", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  return interp_orb_records(rec, t, first, dt, n, pos, vel);
 }
 

@@ -3,6 +3,7 @@
 // executable: every target against the simulator's truth.
 #include <gtest/gtest.h>
 
+#include "product/data_file.h"
 #include "product/general_sar.h"
 #include "sim/radarsat_ceos_writer.h"
 #include "support/files.h"
@@ -118,5 +119,56 @@ TEST(RadarsatEndToEnd, BeamCodeOutsideTheTableEndsTheJobWithTheStageFailure) {
   EXPECT_FALSE(run.signalled);
   EXPECT_EQ(run.errorCode, 130560) << run.errorFile << run.log;
   EXPECT_TRUE(contains(run.log, "Beam code 23 outside 1 to 20")) << run.log;
+  EXPECT_FALSE(fs::exists(dir / "out_slc"));
+}
+
+// SKIP LINES and EXTRACT LINES of a RADARSAT job count raw lines (not a part
+// in percent as for ERS): the product starts at the skipped line's time and
+// its target stays at its truth.
+TEST(RadarsatEndToEnd, SkipAndExtractLinesCountRawLines) {
+  TempFolder dir("skip");
+  SceneDescription scene = rsatScene({"S3", 1, 1, 2400, 8.0 / 1300.0 + 0.0004});
+  scene.lines = 4096;
+  scene.pixelTargets = {{2100.5, 700.0, 0.0, 4.0}};
+  RadarsatOptions o;
+  o.beam = "S3";
+  std::string error;
+  const RadarsatSceneWriter writer(scene, o);
+  ASSERT_EQ(writer.write(dir / "sim", error), 0) << error;
+  Job job = rsatJob(writer, dir);
+  job[16] = "400";
+  job[17] = "3400";
+  job[18] = "NotOK";  // keep the extracted raster
+  writeJob(dir / "job.txt", job);
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  ASSERT_EQ(run.errorCode, 0) << run.log << run.trace.substr(0, 3000);
+  DataFile raw;
+  ASSERT_EQ(raw.read_hdr(dir / "out.extracted"), 0);
+  EXPECT_EQ(raw.NrOfLinesPerImage, 3400);
+  const std::string product = dir / "out_slc";
+  GeneralSAR record;
+  ASSERT_EQ(record.GSread(product + ".TessivorParameterExtracted"), 0);
+  EXPECT_GE(record.roi.roi.SlowStartTime, writer.simulator().lineTime(400) - 1e-6);
+  EXPECT_LT(record.roi.roi.SlowStartTime, writer.simulator().lineTime(2100));
+  const PtaReport pta =
+      analyseProduct(dir.str(), product, product + ".TessivorParameterExtracted", dir / "sim/truth.txt");
+  ASSERT_EQ(pta.exitStatus, 0) << pta.table;
+  expectTruthPositions(pta);
+}
+
+// An SLC product is extracted, then the job ends with a clear message.
+TEST(RadarsatEndToEnd, SlcProductEndsTheJobAfterItsExtraction) {
+  TempFolder dir("slc");
+  SceneDescription scene = rsatScene({"S3", 1, 1, 900, 8.0 / 1300.0 + 0.0004});
+  scene.lines = 64;
+  scene.pixelTargets.clear();
+  std::string error;
+  const RadarsatSceneWriter writer(scene, RadarsatOptions{});
+  ASSERT_EQ(writer.writeSlc(dir / "sim", false, error), 0) << error;
+  writeJob(dir / "job.txt", rsatJob(writer, dir));
+  const FocuserRun run = runFocuser(dir.str(), dir / "job.txt");
+  EXPECT_FALSE(run.signalled);
+  EXPECT_EQ(run.errorCode, 130560) << run.errorFile << run.log;
+  EXPECT_TRUE(contains(run.log + run.trace, "the stripmap chain focuses raw data only")) << run.log;
   EXPECT_FALSE(fs::exists(dir / "out_slc"));
 }

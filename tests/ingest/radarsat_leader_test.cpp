@@ -11,21 +11,25 @@
 #include "ingest/radarsat/radarsat_format.h"
 #include "ingest_test_util.h"
 #include "orbit/general_sar_orbit.h"
+#include "support/files.h"
 
 namespace {
 
 const std::string kLeader = TESSIVOR_REALDATA_DIR "/ers1_ccrs_1996/23390_2925.ldr";
 
+class RadarsatLeader : public support::WorkingFolderTest {};
+
 }  // namespace
 
-TEST(RadarsatLeader, CanadianLeaderHasTooFewVectorsInertialOneIsTurnedEarthFixed) {
+TEST_F(RadarsatLeader, CanadianLeaderHasTooFewVectorsInertialOneIsTurnedEarthFixed) {
   if (!std::filesystem::exists(kLeader)) GTEST_SKIP() << "no real data folder at " << kLeader;
   radarextract x;
   x.LeaderFile = kLeader;
   x.OrbitFile = kLeader;
   int source = -1;
-  EXPECT_EQ(x.orbit_source(&source), 1);  // "There are less than 3 state vectors in the leader file!"
+  EXPECT_EQ(x.orbit_source(&source), 1);
   EXPECT_EQ(source, 0);
+  EXPECT_TRUE(traced("There are less than 3 state vectors in the leader file!")) << trace();
   EXPECT_EQ(x.checklevel(), 0);
 
   DataSetInfo_Obj info;

@@ -2,6 +2,7 @@
 // vector, gain compensation, replica, missing lines and the damaged files.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <filesystem>
@@ -117,12 +118,23 @@ TEST_F(RadarsatSceneTest, FineBeamWithWindowGainChangesReplicaAndMissingLine) {
   EXPECT_NEAR(orbit.pos[0], sv.pos[0], 1e-6);
   EXPECT_NEAR(orbit.vel[2], sv.vel[2], 1e-9);
 
-  // Chirp file: the first replica, as the 4-bit levels of the line carried it.
+  // Chirp file: the 42 us pulse (1357 samples) centred in the 1440-sample
+  // replica window of the first replica line, as the 4-bit levels carried it.
+  ASSERT_EQ(w->replicaSamples(), 1440);
   const std::vector<float> chirp = floats(path("scene.chirp"));
-  ASSERT_EQ(static_cast<int>(chirp.size()), 2 * w->replicaSamples());
-  const double u0 = -0.5 * (w->replicaSamples() - 1) / sim.scene().samplingRateHz;
+  ASSERT_EQ(static_cast<int>(chirp.size()), 2 * 1357);
+  const double u0 = -0.5 * (1357 - 1) / sim.scene().samplingRateHz;
   const double ph = M_PI * sim.chirpRate() * u0 * u0;
   EXPECT_EQ(chirp[0], std::floor(static_cast<float>(6.0 * std::cos(ph))) + 0.5f);
+  // The echo of a replica line starts right after the whole replica window.
+  std::vector<fcomplex> echo;
+  sim.renderLines(100, 1, echo);
+  int shifted = 0;
+  for (int j = 0; j < samples; ++j) {
+    const float level = std::clamp(std::floor(echo[std::size_t(j)].real()), -8.0f, 7.0f) + 0.5f;
+    if (raster[row * 100 + 1 + 2 * std::size_t(j)] != level) ++shifted;
+  }
+  EXPECT_EQ(shifted, 0);
 
   // A part of the scene: the record time and first window follow the skip.
   radarextract part;
@@ -153,7 +165,7 @@ TEST_F(RadarsatSceneTest, DamagedFilesEndWithTheirReport) {
   const Case cases[] = {
       {"head", [](RadarsatOptions& o) { o.damagedHeadLine = 39; }, 4, "Main header read failed at line 40"},
       {"beam", [](RadarsatOptions& o) { o.badBeamCode = 23; }, 1, "Beam code 23 outside 1 to 20"},
-      {"truncated", [](RadarsatOptions& o) { o.truncateBytes = 16252 + 50 * 5394 + 1000; }, 4,
+      {"truncated", [](RadarsatOptions& o) { o.truncateBytes = 16252 + 50 * 5486 + 1000; }, 4,
        "Data read error at line 51"},
       {"table layout", [](RadarsatOptions& o) { o.layout = "table"; }, 4,
        "Auxiliary header read failed at line 1"},
@@ -185,4 +197,55 @@ TEST_F(RadarsatSceneTest, OrbitSourceOfTheJob) {
   x.OrbitFile.clear();  // the leader serves
   EXPECT_EQ(x.orbit_source(&source), 0);
   EXPECT_TRUE(support::contains(trace(), "No Orbit file is present!"));
+
+  // A text orbit file: inertial vectors a minute apart, turned Earth-fixed
+  // and interpolated around the scene centre.
+  std::string error;
+  x.OrbitFile = path("rsat.orb");
+  ASSERT_EQ(w->writeTextOrbit(x.OrbitFile, error), 0) << error;
+  EXPECT_EQ(x.orbit_source(&source), 0);
+  EXPECT_EQ(source, 2);
+  ASSERT_EQ(x.run(), 0);
+  GeneralSAROrbit& orbit = x.rawData.orbit();
+  EXPECT_EQ(orbit.nSV, 5);
+  for (int k = 0; k < orbit.nSV; ++k) {
+    const StateVector sv = w->simulator().orbit().at(orbit.t0 + k * orbit.dt);
+    for (int a = 0; a < 3; ++a) {
+      EXPECT_NEAR(orbit.pos[std::size_t(3 * k + a)], sv.pos[std::size_t(a)], 2e-3);
+      EXPECT_NEAR(orbit.vel[std::size_t(3 * k + a)], sv.vel[std::size_t(a)], 2e-5);
+    }
+  }
+}
+
+TEST_F(RadarsatSceneTest, SlcProductWithDecreasingLineTimeIsExtractedInTimeOrder) {
+  SceneDescription s = scene(40);
+  s.pixelTargets.clear();
+  const RadarsatSceneWriter w(s, RadarsatOptions{});
+  std::string error;
+  ASSERT_EQ(w.writeSlc(path("sim"), true, error), 0) << error;
+  radarextract x;
+  aim(x, w);
+  x.LinesToSkip = 5;
+  x.LinesToExtract = 10;
+  ASSERT_EQ(x.run(), 0);
+  EXPECT_EQ(x.productLevel, 1);
+  const std::vector<float> raster = floats(path("scene.extracted"));
+  const std::size_t row = 2 * 1800;
+  ASSERT_EQ(raster.size(), row * 10);
+  // Row r holds line 5 + r of the scene, in time order.
+  for (int r : {0, 9})
+    for (int j : {0, 1799}) {
+      int i = 0, q = 0;
+      RadarsatSceneWriter::slcPixel(5 + r, j, i, q);
+      EXPECT_EQ(raster[row * std::size_t(r) + 2 * std::size_t(j)], float(i)) << r << " " << j;
+      EXPECT_EQ(raster[row * std::size_t(r) + 2 * std::size_t(j) + 1], float(q)) << r << " " << j;
+    }
+  const GeneralRAWData& rec = x.rawData;
+  EXPECT_EQ(rec.roi.Lines, 10);
+  EXPECT_EQ(rec.roi.Samples, 1800);
+  EXPECT_NEAR(rec.roi.SlowStartTime, w.simulator().lineTime(5), 0.0005);  // line times in ms
+  EXPECT_NEAR(rec.sampling.prf_hz, w.simulator().scene().prfHz, 1e-6);
+  EXPECT_NEAR(rec.sampling.frg_hz, w.simulator().scene().samplingRateHz, 0.1);
+  EXPECT_NEAR(rec.roi.FastStartTime, w.simulator().scene().nearRangeTime, 4e-9);  // range in whole metres
+  EXPECT_TRUE(support::contains(trace(), "First Azimuth time read"));
 }

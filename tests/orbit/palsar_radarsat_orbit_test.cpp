@@ -240,6 +240,14 @@ TEST(RadarsatOrbit, TextFileWithNamedBlocks) {
   ASSERT_EQ(read_radarsat_orbit(dir + "/rs.orb", rec), 0);
   ASSERT_EQ(rec.size(), 20);
   EXPECT_DOUBLE_EQ(rec.times[0], tg + 43200.0);
+  {  // each record turned back to the Earth-fixed truth, to the file's rounding
+    double p[3], v[3];
+    truth(tg + 43200.0 + 60.0 * 7, p, v);
+    for (int a = 0; a < 3; ++a) {
+      EXPECT_NEAR(rec.pos[std::size_t(21 + a)], p[a], 2e-6);
+      EXPECT_NEAR(rec.vel[std::size_t(21 + a)], v[a], 2e-9);
+    }
+  }
   const double tc = tg + 43200.0 + 500.0;
   GeneralSAROrbit o;
   ASSERT_EQ(o.GetStateVectorsRADAR(dir + "/rs.orb", tc, 8.0), 0);
@@ -257,6 +265,8 @@ TEST(RadarsatOrbit, TextFileWithNamedBlocks) {
   truth(tc, pt, vt);
   for (int a = 0; a < 3; ++a) EXPECT_NEAR(p[a], pt[a], 2e-3);
 
+  // A scene beyond the file's last vector is refused, not extrapolated.
+  EXPECT_EQ(o.GetStateVectorsRADAR(dir + "/rs.orb", tg + 43200.0 + 1200.0, 8.0), 1);
   writeText(dir + "/rs.orb", file(false));
   EXPECT_EQ(o.GetStateVectorsRADAR(dir + "/rs.orb", tc, 8.0), 1);  // SECOND MODEL missing
   writeText(dir + "/rs.orb", "GENERATION TIME: 2001 100 10:00:00.0\n");

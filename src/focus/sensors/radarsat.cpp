@@ -76,6 +76,14 @@ void radarsatLevel0Focuser::redirectExtraction(const std::string& raw, const std
 int radarsatLevel0Focuser::extract() {
   if (int st = extractor_->checkpar(); st != 0) return level0CalledError(st);
   if (int st = extractor_->run(); st != 0) return level0CalledError(st);
+  // An SLC product is extracted as it stands and goes no further: the chain
+  // focuses raw echoes.
+  if (extractor_->productLevel == 1) {
+    ORV_REPORT("RADARSAT SLC product extracted into " + work.rawFile +
+                   ": the stripmap chain focuses raw data only",
+               REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
   return 0;
 }
 

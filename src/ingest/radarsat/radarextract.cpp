@@ -141,6 +141,7 @@ int radarextract::run() {
   CheckedCall cc("radarextract::run()");
   const int level = checklevel();
   if (level != 0 && level != 1) return RS_CALLED(level);
+  productLevel = level;
   const int st = level == 1 ? extractSLC() : RADARExtract();
   if (st != 0) return RS_CALLED(st);
   return 0;
@@ -152,11 +153,6 @@ int radarextract::checklevel() {
   char text[16];
   if (!in.seekg(48) || !in.read(text, 16)) return RS_FAIL("File reading failed! " + LeaderFile, STATUS_READ_FAILED);
   return std::strncmp(text, "RSAT-1-SAR-SLC", 14) == 0 ? 1 : 0;
-}
-
-int radarextract::extractSLC() {
-  ORV_REPORT("RADARSAT SLC products are not extracted by the stripmap chain: " + LeaderFile, REPORT_ERROR);
-  return STATUS_BAD_CONDITION;
 }
 
 int radarextract::getOrbitConf(const std::string& leader, DataSetInfo_Obj* info) {
@@ -314,29 +310,52 @@ int radarextract::writeChirp(const std::vector<float>& replica, int samples) {
   return status;
 }
 
-int radarextract::RADARExtract() {
-  CheckedCall cc("radarextract::RADARExtract()");
+int radarextract::openProduct(std::ifstream& in, int& source, int& records, int& recordLength) {
   swstVector.clear();
   sequenceVector.clear();
   missingLines = replicaLines = gainChanges = windowChanges = 0;
   if (int st = readSceneDate(); st != 0) return RS_CALLED(st);
-  DataSetInfo_Obj& info = rawData.dataSetInfo;
-  if (int st = getOrbitConf(LeaderFile, &info); st != 0) return RS_CALLED(st);
-  int source = 0;
+  if (int st = getOrbitConf(LeaderFile, &rawData.dataSetInfo); st != 0) return RS_CALLED(st);
   if (int st = orbit_source(&source); st != 0) return RS_CALLED(st);
-
-  std::ifstream in(DataFile, std::ios::binary);
+  in.open(DataFile, std::ios::binary);
   if (DataFile.empty() || !in) return RS_FAIL("File not opened! " + DataFile, STATUS_NOT_OPENED);
   std::vector<char> descriptor(kDescriptorBytes);
   if (!in.read(descriptor.data(), kDescriptorBytes))
     return RS_FAIL("File reading failed! " + DataFile, STATUS_READ_FAILED);
-  const int records = ch2int(descriptor.data() + 180, 6);
-  const int recordLength = ch2int(descriptor.data() + 186, 6);
-  const int slots = (recordLength - kLineHeadBytes - kAuxBytes) / 2;
-  if (records < 1 || slots < 1)
-    return RS_FAIL("Bad record count or record length in the signal data file " + DataFile, STATUS_BAD_PARAMETER);
+  records = ch2int(descriptor.data() + 180, 6);
+  recordLength = ch2int(descriptor.data() + 186, 6);
+  if (records < 1) return RS_FAIL("Bad record count in the descriptor of " + DataFile, STATUS_BAD_PARAMETER);
   if (LinesToSkip < 0 || LinesToExtract < 0 || LinesToSkip >= records)
-    return RS_FAIL("Bad part of the scene to extract", STATUS_BAD_PARAMETER);
+    return RS_FAIL("Lines to skip " + std::to_string(LinesToSkip) + " and to extract " +
+                       std::to_string(LinesToExtract) + " do not fit the " + std::to_string(records) +
+                       " lines of " + DataFile,
+                   STATUS_BAD_PARAMETER);
+  return 0;
+}
+
+::DataFile& radarextract::outputRaster(int samples, int lines, int prefix) {
+  ::DataFile& out = rawData.dataFile;
+  out.filename = OutputRawFile;
+  out.NrOfPixelsPerLine = samples;
+  out.NrOfLinesPerImage = lines;
+  out.RowPrefix = prefix;
+  out.CellType = FLOAT_COMPLEX;
+  out.HeaderOffset = 0;
+  out.ByteOrder = host_byte_order();
+  out.buffersize = 0;
+  rawData.rasterName = OutputRawFile;
+  return out;
+}
+
+int radarextract::RADARExtract() {
+  CheckedCall cc("radarextract::RADARExtract()");
+  std::ifstream in;
+  int source = 0, records = 0, recordLength = 0;
+  if (int st = openProduct(in, source, records, recordLength); st != 0) return RS_CALLED(st);
+  DataSetInfo_Obj& info = rawData.dataSetInfo;
+  const int slots = (recordLength - kLineHeadBytes - kAuxBytes) / 2;
+  if (slots < 1)
+    return RS_FAIL("Bad record length in the signal data file " + DataFile, STATUS_BAD_PARAMETER);
   // Lines filled in for missing ones come on top of the records, so without
   // a count to extract the walk ends with the last record.
   const int lines = LinesToExtract > 0 ? LinesToExtract : INT_MAX;
@@ -361,23 +380,18 @@ int radarextract::RADARExtract() {
   const double fs = 1.0 / rate->secondUnit;
   const double pri = (ref.priCode + 2.0) * rate->firstUnit;
   const int samples = std::min(rxSamples(ref.rxCode), slots);
-  const int replicaSamples = static_cast<int>(std::lround(kReplicaDuration * fs));
+  // A replica line holds the whole replica window; the chirp file keeps the
+  // pulse centred in it.
+  const int replicaSamples = rate->replicaWindowSamples();
+  const int pulseSamples = std::min(replicaPulseSamples(fs), replicaSamples);
+  const int pulseOffset = replicaPulseOffset(replicaSamples, pulseSamples);
   in.seekg(kDescriptorBytes);
 
   ORV_REPORT(std::string(lineMessage("Starting extraction of %d samples per ", samples)) +
                  lineMessage("%d lines", LinesToExtract > 0 ? std::min(LinesToExtract, records - LinesToSkip)
                                                             : records - LinesToSkip),
              REPORT_CHECKPOINT);
-  ::DataFile& out = rawData.dataFile;
-  out.filename = OutputRawFile;
-  out.NrOfPixelsPerLine = samples;
-  out.NrOfLinesPerImage = records - LinesToSkip;
-  out.RowPrefix = 4;
-  out.CellType = FLOAT_COMPLEX;
-  out.HeaderOffset = 0;
-  out.ByteOrder = host_byte_order();
-  out.buffersize = 0;
-  rawData.rasterName = OutputRawFile;
+  ::DataFile& out = outputRaster(samples, records - LinesToSkip, 4);
   std::vector<float> row, replica;
   try {
     bytes.resize(2 * std::size_t(slots));
@@ -455,13 +469,15 @@ int radarextract::RADARExtract() {
     if (h.replica) {
       ORV_REPORT(lineMessage("Replica samples detected at line %d", lineNo), REPORT_CHECKPOINT);
       ++replicaLines;
-      if (!in.read(reinterpret_cast<char*>(bytes.data()), 2 * std::streamsize(replicaSamples))) {
+      if (replicaSamples > slots ||
+          !in.read(reinterpret_cast<char*>(bytes.data()), 2 * std::streamsize(replicaSamples))) {
         status = RS_FAIL(lineMessage("Replica read error at line %d", lineNo), STATUS_READ_FAILED);
         break;
       }
       if (replica.empty()) {
-        replica.resize(2 * std::size_t(replicaSamples));
-        for (int s = 0; s < 2 * replicaSamples; ++s) replica[std::size_t(s)] = sampleValue(bytes[std::size_t(s)]);
+        replica.resize(2 * std::size_t(pulseSamples));
+        for (int s = 0; s < 2 * pulseSamples; ++s)
+          replica[std::size_t(s)] = sampleValue(bytes[2 * std::size_t(pulseOffset) + std::size_t(s)]);
       }
       used = replicaSamples;
     }
@@ -495,10 +511,11 @@ int radarextract::RADARExtract() {
     if ((status = writeRow(swst, number)) != 0) break;
   }
   waitbar_close();
-  if (status == 0 && LinesToExtract > 0 && written < lines) {
-    status = RS_FAIL(lineMessage("Data read error at line %d", written + 1) + ": " + DataFile + " ends early",
-                     STATUS_READ_FAILED);
-  }
+  // More lines asked for than the file holds: the scene ends with its last line.
+  if (status == 0 && LinesToExtract > 0 && written < lines)
+    ORV_REPORT(lineMessage("%d lines extracted: ", written) + DataFile + " ends before " +
+                   std::to_string(LinesToExtract) + " lines after the skipped ones",
+               REPORT_WARNING);
   out.NrOfLinesPerImage = written;
   const int closed = out.close();
   if (status != 0) return status;
@@ -533,28 +550,141 @@ int radarextract::RADARExtract() {
   info.SWST_MIN = swstMin;
   info.SWST_MAX = swstMax;
   info.MissingLines = missingLines;
-  info.ProcessingCenter = "ORVANE - Lumbra";
-  info.ProcessingSoftware = "Varnelt v1.0";
   info.Description = "Radarsat RAW Data";
   info.SetImageType(DataSetInfo_Obj::IT_RAW_DATA);
   info.SetUnitType(DataSetInfo_Obj::UT_VOLT);
+  int st = finishRecord(source);
+  if (st != 0) return RS_CALLED(st);
+  if (!OutputChirpFile.empty()) {
+    st = replica.empty() ? pulse.writeChirp(OutputChirpFile) : writeChirp(replica, pulseSamples);
+    if (st != 0) return RS_CALLED(st);
+    ORV_REPORT("Chirp written to file", REPORT_CHECKPOINT);
+  }
+  return 0;
+}
+
+int radarextract::finishRecord(int source) {
+  DataSetInfo_Obj& info = rawData.dataSetInfo;
+  const ROI_Obj& roi = rawData.roi;
+  info.ProcessingCenter = "ORVANE - Lumbra";
+  info.ProcessingSoftware = "Varnelt v1.0";
   info.SetAcqMode(DataSetInfo_Obj::AM_STRIPMAP);
   info.SetSensorType(DataSetInfo_Obj::ST_RADARSAT);
   info.SetProjection(DataSetInfo_Obj::PR_SLANT_RANGE);
   info.StampProcessingDate();
-  info.SetSenseDate(firstTime);
-
+  info.SetSenseDate(roi.SlowStartTime);
   // Orbit: the leader's vectors, or a RADARSAT text orbit around the scene centre.
   const std::string orbitPath = OrbitFile.empty() ? LeaderFile : OrbitFile;
-  int st = source == 2 ? rawData.orbit().GetStateVectorsRADAR(orbitPath, firstTime + 0.5 * roi.SlowTimeLength,
+  int st = source == 2 ? rawData.orbit().GetStateVectorsRADAR(orbitPath, roi.SlowStartTime + 0.5 * roi.SlowTimeLength,
                                                               roi.SlowTimeLength)
                        : readLeaderVectors(orbitPath);
   if (st != 0) return RS_CALLED(st);
   if ((st = rawData.writehdr()) != 0) return RS_CALLED(st);
-  if (!OutputChirpFile.empty()) {
-    st = replica.empty() ? pulse.writeChirp(OutputChirpFile) : writeChirp(replica, replicaSamples);
-    if (st != 0) return RS_CALLED(st);
-    ORV_REPORT("Chirp written to file", REPORT_CHECKPOINT);
+  return 0;
+}
+
+// SLC products: the lines of complex 16-bit big-endian samples behind the
+// 192-byte head of each record go into a float complex raster without a
+// prefix, earliest line first. Products whose leader says the line time
+// decreases (ascending passes delivered north up) are turned over here. The
+// sampling rate and PRF come from the data set summary, the slant range of
+// the first pixel and the line times from the record heads. Pixels are taken
+// in increasing range, as the slant-range products are delivered.
+int radarextract::extractSLC() {
+  CheckedCall cc("radarextract::extractSLC()");
+  std::ifstream in;
+  int source = 0, records = 0, recordLength = 0;
+  if (int st = openProduct(in, source, records, recordLength); st != 0) return RS_CALLED(st);
+  DataSetInfo_Obj& info = rawData.dataSetInfo;
+  std::vector<char> leader;
+  if (!slurp(LeaderFile, leader)) return RS_FAIL("File not opened! " + LeaderFile, STATUS_NOT_OPENED);
+  double fsMHz = 0.0, prf = 0.0;
+  if (leader.size() < 2262 || !leaderReal(leader, 1430, 16, fsMHz) || !leaderReal(leader, 1654, 16, prf) ||
+      !(fsMHz > 0.0) || !(prf > 0.0))
+    return RS_FAIL("Bad sampling rate or PRF in the data set summary of " + LeaderFile, STATUS_BAD_PARAMETER);
+  const bool decreasing = ceosText(leader.data() + 2254, 8).rfind("DECREASE", 0) == 0;
+  const int pixels = (recordLength - kLineHeadBytes) / 4;
+  if (pixels < 1) return RS_FAIL("Bad record length in the image file " + DataFile, STATUS_BAD_PARAMETER);
+  const int lines = LinesToExtract > 0 ? std::min(LinesToExtract, records - LinesToSkip) : records - LinesToSkip;
+  ORV_REPORT(lineMessage("Starting extraction of %d samples per ", pixels) + lineMessage("%d lines", lines),
+             REPORT_CHECKPOINT);
+
+  ::DataFile& out = outputRaster(pixels, lines, 0);
+  std::vector<unsigned char> head(kLineHeadBytes), bytes;
+  std::vector<float> row;
+  try {
+    bytes.resize(4 * std::size_t(pixels));
+    row.resize(2 * std::size_t(pixels));
+    sequenceVector.assign(std::size_t(lines), 0);
+  } catch (const std::bad_alloc&) {
+    return RS_FAIL("Memory allocation failed for the RADARSAT line buffers", STATUS_NO_MEMORY);
   }
+  if (int st = out.open(1); st != 0) return RS_CALLED(st);
+  int status = 0;
+  double firstTime = -1.0, nearRange = 0.0;
+  waitbar_open("Extracting Radarsat SLC Data");
+  for (int pos = 0; pos < records; ++pos) {
+    const int lineNo = pos + 1;
+    waitbar_update(0, static_cast<float>(100.0 * pos / records));
+    if (!in.read(reinterpret_cast<char*>(head.data()), kLineHeadBytes) ||
+        !std::equal(kSignalRecordType.begin(), kSignalRecordType.end(), head.begin() + 4)) {
+      status = RS_FAIL(lineMessage("Main header read failed at line %d", lineNo) + " of " + DataFile,
+                       STATUS_READ_FAILED);
+      break;
+    }
+    if (static_cast<int>(be32(head.data() + 12)) != lineNo) {
+      status = RS_FAIL(lineMessage("Line index is wrong at line %d, extraction ended", lineNo), STATUS_BAD_CONDITION);
+      break;
+    }
+    if (!in.read(reinterpret_cast<char*>(bytes.data()), 4 * std::streamsize(pixels))) {
+      status = RS_FAIL(lineMessage("Data read error at line %d", lineNo) + " of " + DataFile, STATUS_READ_FAILED);
+      break;
+    }
+    const int r = (decreasing ? records - 1 - pos : pos) - LinesToSkip;  // row in time order
+    if (r < 0 || r >= lines) continue;
+    if (r == 0) {
+      const int year = static_cast<int>(be32(head.data() + 36)), day = static_cast<int>(be32(head.data() + 40));
+      char text[40];
+      std::snprintf(text, sizeof text, "01-JAN-%04d 00:00:00.000000", year);
+      firstTime = ascii2sec85(text) + (day - 1) * 86400.0 + be32(head.data() + 44) / 1000.0;
+      nearRange = static_cast<std::int32_t>(be32(head.data() + 64));
+      ORV_REPORT("First Azimuth time read", REPORT_CHECKPOINT);
+    }
+    for (std::size_t k = 0; k < row.size(); ++k)
+      row[k] = static_cast<std::int16_t>((bytes[2 * k] << 8) | bytes[2 * k + 1]);
+    if ((status = out.seek(out.rowstart(r), SEEK_SET)) != 0 ||
+        (status = out.write(row.data(), static_cast<int64_t>(row.size() * sizeof(float)))) != 0) {
+      status = RS_CALLED(status);
+      break;
+    }
+    sequenceVector[std::size_t(r)] = lineNo;
+  }
+  waitbar_close();
+  const int closed = out.close();
+  if (status != 0) return status;
+  if (closed != 0) return RS_CALLED(closed);
+
+  ROI_Obj& roi = rawData.roi;
+  SamplingConstants_Obj& smp = rawData.sampling;
+  smp.fc_hz = kCarrierHz;
+  smp.lambda_m = kWavelength;
+  smp.frg_hz = fsMHz * 1.0e6;
+  smp.Trg_s = 1.0 / smp.frg_hz;
+  smp.prf_hz = smp.brf_hz = prf;
+  smp.pri_s = 1.0 / prf;
+  roi.SlowStartTime = firstTime;
+  roi.SlowTimeDelta = 1.0 / prf;
+  roi.SlowTimeLength = (lines - 1) / prf;
+  roi.Lines = lines;
+  roi.Samples = pixels;
+  roi.FastStartTime = 2.0 * nearRange / 299792458.0;
+  roi.FastTimeDelta = smp.Trg_s;
+  roi.FastTimeLength = pixels * smp.Trg_s;
+  rawData.swath.Acquisition_Start_Time = firstTime;
+  info.SWST_MIN = info.SWST_MAX = roi.FastStartTime;
+  info.Description = "Radarsat SLC Data";
+  info.SetImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
+  info.SetUnitType(DataSetInfo_Obj::UT_VOLT);
+  if (int st = finishRecord(source); st != 0) return RS_CALLED(st);
   return 0;
 }

@@ -4,6 +4,7 @@
 // raster (each line prefixed with its sampling window start as a 32-bit
 // float) with its ".hdr" and the chirp file made of the replica the lines
 // carry.
+#include <fstream>
 #include <string>
 #include <vector>
 
@@ -16,8 +17,10 @@ class radarextract {
   // missing.
   int readpar(const std::string& file);
   int checkpar() const;
-  // raw data: RADARExtract(); SLC product: extractSLC().
+  // raw data: RADARExtract(); SLC product: extractSLC(). productLevel keeps
+  // what checklevel() found.
   int run();
+  int productLevel = 0;
   // 1 for an SLC product, 0 for raw; 9 or 4 when the leader cannot be read.
   int checklevel();
   int RADARExtract();
@@ -62,6 +65,14 @@ class radarextract {
 
  private:
   int readSceneDate();
+  // Leader date, orbit configuration and source; the data file opened past
+  // its descriptor, with its record count and length; the part to extract
+  // checked against them.
+  int openProduct(std::ifstream& in, int& source, int& records, int& recordLength);
+  // The output raster's layout in the record.
+  ::DataFile& outputRaster(int samples, int lines, int prefix);
+  // Common fields of the record, the orbit of the source, the ".hdr".
+  int finishRecord(int source);
   int writeChirp(const std::vector<float>& replica, int samples);
   double sceneMidnight_ = -1.0;
 };

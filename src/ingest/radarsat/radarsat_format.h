@@ -25,8 +25,11 @@ inline constexpr double kCarrierHz = 5300432425.742575;
 inline constexpr double kWavelength = 0.05656;
 inline constexpr double kPulseLength = 4.2e-05;
 inline constexpr double kWindowOffset = 4.2e-06;
-// Length of the chirp replica carried in a line, seconds.
-inline constexpr double kReplicaDuration = 4.2e-05;
+// A line that carries the chirp replica starts with a replica window of
+// 44.559 us: longer than the 42 us pulse, so the loop-back catches the whole
+// chirp. Reading only 42 us of it would leave the last 83 replica samples
+// (at 32.3 MHz) in front of the echo and shift every such line in range.
+inline constexpr double kReplicaWindow = 44.559e-06;
 
 // Decoded auxiliary head (offsets of the public layout, from the sync marker).
 struct AuxHead {
@@ -48,9 +51,14 @@ struct AuxHead {
 AuxHead decodeAux(const unsigned char* aux);
 
 struct RateEntry {
+  // Bytes of the replica window, I and Q: 44.559 us at the ADC clock of the
+  // sampling master oscillator (129.2683 MHz divided by 4, 7 or 10),
+  // truncated, twice: 1440, 822 and 576 complex samples. (The rounded second
+  // unit would give 575 at the lowest rate, one short of what was recorded.)
   int referenceSamples;
   double firstUnit;   // PRI, window start and duration step, s (6 ADC periods)
   double secondUnit;  // ADC sampling period, s
+  int replicaWindowSamples() const { return referenceSamples / 2; }
 };
 // Rate codes 0..2; nullptr for any other.
 const RateEntry* rateEntry(int code);
@@ -71,6 +79,10 @@ double waveformBandwidth(int code);
 double auxSecondsOfDay(const AuxHead& h);
 // Sampling window start of a line, two-way seconds.
 double windowStart(int windowCode, int priCode, const RateEntry& rate, int pulsesInFlight);
+// Where the 42 us chirp sits in a replica window of W samples: centred, its
+// first sample at (W - P) / 2 for P = round(42 us * fs) pulse samples.
+inline int replicaPulseSamples(double fs) { return static_cast<int>(kPulseLength * fs + 0.5); }
+inline int replicaPulseOffset(int windowSamples, int pulseSamples) { return (windowSamples - pulseSamples) / 2; }
 // Samples of a line of reception-duration code c: 6 (c + 1).
 inline int rxSamples(int rxCode) { return 6 * (rxCode + 1); }
 
