@@ -389,7 +389,7 @@ int RadarsatSceneWriter::writeTextOrbit(const std::string& path, std::string& er
   const double last = d.startTime + d.lines / d.prfHz + 600.0;
   for (double t = first; t <= last; t += 60.0) {
     const StateVector sv = sim_.orbit().at(t);
-    const double g = g0 * M_PI / 180.0 + w * (t - midnight), cg = std::cos(g), sg = std::sin(g);
+    const double g = g0 * consts::kPi / 180.0 + w * (t - midnight), cg = std::cos(g), sg = std::sin(g);
     const double px = sv.pos[0], py = sv.pos[1];
     const double ux = sv.vel[0] - w * py, uy = sv.vel[1] + w * px;
     char line[256];
