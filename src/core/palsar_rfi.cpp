@@ -164,11 +164,14 @@ double medianOf(std::vector<double>& values) {
 
 }  // namespace
 
-// The expected spectrum is measured on the block itself rather than taken
-// from the ideal chirp: the echoes' spectrum carries the receiver's filter
-// roll-off and the chirp's Fresnel ripples, and comparing it with an ideal
-// one marks clean bins near the band edges in every line, whose notches then
-// raise the range sidelobes of every target.
+// The clean spectrum is measured on the block itself rather than taken from
+// the ideal chirp, which the echoes follow only roughly (receiver roll-off,
+// Fresnel ripples near the band edges). Persistent interferers are taken
+// out of each line before the line's own search: left in, a strong tone is
+// found again in every line together with the main lobe of its periodogram
+// bins, and the notches, tens of bins wide at fixed frequencies in every
+// line, raise the range sidelobes of every target. The median over lines
+// keeps a burst of one line out of the persistent search.
 int RFIblock::correct() {
   const std::size_t F = std::size_t(F_), P = std::size_t(P_);
   // 1. Spectra of the lines.

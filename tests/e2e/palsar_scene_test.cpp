@@ -209,6 +209,12 @@ std::string profileWith(const TempFolder& dir, int removeInterferences) {
 // Focuses the HH image of a simulation in-process; the product's record is
 // "<root>.hdr".
 PtaReport focusAndMeasure(const TempFolder& dir, const PalsarSceneFiles& f, const std::string& root, int remove) {
+  // The Doppler log goes to the working folder: the scratch folder's.
+  struct InFolder {
+    fs::path back = fs::current_path();
+    explicit InFolder(const std::string& folder) { fs::current_path(folder); }
+    ~InFolder() { fs::current_path(back); }
+  } in(dir.path());
   rfiGaussianReset();
   palsarLevel0Focuser focuser;
   focuser.level0Filename = f.images[0];
