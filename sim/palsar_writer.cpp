@@ -12,6 +12,7 @@
 
 #include "base/constants.h"
 #include "product/time_base.h"
+#include "ingest/palsar/palsar_ceos_layout.h"
 #include "sim/ers_ceos_writer.h"
 
 namespace {
@@ -21,12 +22,17 @@ constexpr double kWavelength = 0.2361;
 constexpr double kPulse = 27e-6;
 constexpr int kLeaderFd = 720, kDssLength = 4096, kPprLength = 4680, kVectors = 28;
 constexpr int kLeaderLength = 20000;
+constexpr double kInterferenceBins = 256.0;
+
+namespace dss = palsar_leader::dss;
+namespace desc = palsar_image::descriptor;
+namespace sig = palsar_image::signal;
 
 const char* const kLabels[4] = {"HH", "HV", "VH", "VV"};
 // Transmit and receive codes of each polarisation (0 H, 1 V).
 constexpr int kTx[4] = {0, 0, 1, 1}, kRx[4] = {0, 1, 0, 1};
 
-void putF16(char* r, int off, double v) { putFormat(r, off, 16, "%16.7f", v); }
+void putF16(char* r, CeosField field, double v) { putFormat(r, field, "%16.7f", v); }
 
 struct PalCivilTime {
   int year = 0, month = 0, day = 0, doy = 0;
@@ -65,47 +71,47 @@ std::vector<char> buildLeader(const RawSceneSimulator& sim, const PalsarSimConfi
   const double t0 = d.startTime, t1 = sim.lineTime(d.lines - 1);
   const Vec3 p0 = sim.orbit().at(t0).pos, p1 = sim.orbit().at(t1).pos;
   const bool ascending = p1[2] > p0[2];
-  putText(r, 740, 32, "ALPSRP" + std::to_string(d.orbitNumber) + "0" + std::to_string(d.frame));
-  putInt(r, 1108, 4, "%4ld", channels);
+  putText(s, dss::kSceneId, "ALPSRP" + std::to_string(d.orbitNumber) + "0" + std::to_string(d.frame));
+  putInt(s, dss::kChannelCount, "%4ld", channels);
   std::string sensor = "ALOS -L -1.0";
   sensor += plr ? "62" : "60";
   sensor += std::string("-") + (channels == 1 ? "HH" : channels == 2 ? "DP" : "QP");
-  putText(r, 1132, 32, sensor);
-  putF16(r, 1028, 8.9);
-  putInt(r, 1164, 8, "%8ld", d.orbitNumber);
+  putText(s, dss::kSensorId, sensor);
+  putFormat(r, 1028, 16, "%16.7f", 8.9);
+  putInt(s, dss::kOrbitNumber, "%8ld", d.orbitNumber);
   double lat0, lon0, h0, lat1, lon1, h1;
   ecefToGeodetic(p0, lat0, lon0, h0);
   ecefToGeodetic(p1, lat1, lon1, h1);
   double heading = std::atan2(lon1 - lon0, lat1 - lat0) * 180.0 / consts::kPi;
   if (heading < 0.0) heading += 360.0;
-  putFormat(r, 1188, 8, "%8.3f", heading);
-  putF16(r, 1220, sim.wavelength());
-  putF16(r, 1238, 1.0);
+  putFormat(s, dss::kHeading, "%8.3f", heading);
+  putF16(s, dss::kWavelength, sim.wavelength());
+  putFormat(r, 1238, 16, "%16.7f", 1.0);
   const double bandwidth = std::fabs(2.0 * d.chirpCoefficient * d.pulseLength);
-  putFormat(r, 1254, 16, "%16.8E", bandwidth / d.pulseLength);
-  putFormat(r, 1270, 16, "%16.8E", 0.0);
-  putInt(r, 1422, 8, "%8ld", cfg.maxMissingLines);
-  putF16(r, 1430, d.samplingRateHz / 1e6);
-  putF16(r, 1446, sim.swst() * 1e6);
-  putF16(r, 1462, d.pulseLength * 1e6);
-  putF16(r, 1486, 0.0);
-  putF16(r, 1502, 0.0);
+  putFormat(s, dss::kChirpSlope, "%16.8E", bandwidth / d.pulseLength);
+  putFormat(s, dss::kChirpSlopeSecond, "%16.8E", 0.0);
+  putInt(s, dss::kMaxMissingLines, "%8ld", cfg.maxMissingLines);
+  putF16(s, dss::kSamplingRateMHz, d.samplingRateHz / 1e6);
+  putF16(s, dss::kWindowStartUs, sim.swst() * 1e6);
+  putF16(s, dss::kPulseLengthUs, d.pulseLength * 1e6);
+  putF16(s, dss::kGainHDb, 0.0);
+  putF16(s, dss::kGainVDb, 0.0);
   putInt(r, 1518, 8, "%8ld", 0);
-  putF16(r, 1538, 15.5);
-  putF16(r, 1554, 15.5);
+  putF16(s, dss::kBiasI, 15.5);
+  putF16(s, dss::kBiasQ, 15.5);
   // Polarimetric leaders carry twice the PRF: H and V transmissions alternate.
-  putF16(r, 1654, d.prfHz * 1000.0 * (plr ? 2.0 : 1.0));
-  putText(r, 1766, 16, cfg.ersdac() ? "ERSDAC-SIM" : "SIM-STATION");
+  putF16(s, dss::kPrfMilliHz, d.prfHz * 1000.0 * (plr ? 2.0 : 1.0));
+  putText(s, dss::kStation, cfg.ersdac() ? "ERSDAC-SIM" : "SIM-STATION");
   const PalCivilTime c0 = civil(t0);
   char date[16];
   std::snprintf(date, sizeof date, "%04d%02d%02d", c0.year, c0.month, c0.day);
-  putText(r, 1782, 8, date);
-  putText(r, 1830, 11, "UNPROCESSED");
-  putText(r, 2254, 1, ascending ? "A" : "D");
-  putText(r, 820, 1, ascending ? "A" : "D");
-  putText(r, 2550, 4, "   0");
-  putInt(r, 2574, 4, "%4ld", cfg.beam);
-  if (cfg.ersdac()) putText(r, 2606, 6, "VEXCEL");
+  putText(s, dss::kAcquisitionDate, date);
+  putText(s, dss::kProcessingLevel, "UNPROCESSED");
+  putText(s, dss::kDirection, ascending ? "A" : "D");
+  putText(s, dss::kErsdacDirection, ascending ? "A" : "D");
+  putText(s, dss::kChirpDigits, "   0");
+  putInt(s, dss::kBeamNumber, "%4ld", cfg.beam);
+  if (cfg.ersdac()) putText(s, dss::kErsdacFacility, "VEXCEL");
 
   // Platform position record: vectors 60 s apart around the scene.
   char* p = r + kLeaderFd + kDssLength;
@@ -143,13 +149,13 @@ std::vector<char> buildImageDescriptor(const PalsarSimConfig& cfg, int records, 
   putText(r, 12, 4, "A");
   putText(r, 16, 12, "CEOS-SAR-CCT");
   putText(r, 48, 16, "IMG-SIMPALSAR");
-  putInt(r, 180, 6, "%6ld", records);
-  putInt(r, 186, 6, "%6ld", recordLength);
+  putInt(r, desc::kRecordCount, "%6ld", records);
+  putInt(r, desc::kRecordLength, "%6ld", recordLength);
   // ERSDAC counts the product's channels as 1, 3 (dual) or 6 (quad).
   const int channels = cfg.ersdac() ? (cfg.channels() == 1 ? 1 : cfg.channels() == 2 ? 3 : 6) : 1;
-  putInt(r, 232, 4, "%4ld", channels);
-  putInt(r, 236, 8, "%8ld", records);
-  putInt(r, 248, 8, "%8ld", samples);
+  putInt(r, desc::kChannels, "%4ld", channels);
+  putInt(r, desc::kSignalRecords, "%8ld", records);
+  putInt(r, desc::kPixels, "%8ld", samples);
   return D;
 }
 
@@ -157,8 +163,9 @@ std::vector<char> buildImageDescriptor(const PalsarSimConfig& cfg, int records, 
 // a burst is a tone at 0.17 fs on its line.
 void addInterference(const PalsarSimConfig& cfg, int line, double clutterPower, double fs, fcomplex* row, int samples) {
   auto add = [&](double freq, double db, double phase0) {
-    // Power in its own range-frequency bin over the clutter's power per bin.
-    const double a = std::sqrt(clutterPower * std::pow(10.0, db / 10.0) / samples);
+    // Power over the clutter's power in a range-frequency bin of a 256-bin
+    // spectrum of the line, whatever the line's length.
+    const double a = std::sqrt(clutterPower * std::pow(10.0, db / 10.0) / kInterferenceBins);
     for (int j = 0; j < samples; ++j) {
       const double phase = 2.0 * consts::kPi * freq * j / fs + phase0;
       row[j] += fcomplex(static_cast<float>(a * std::cos(phase)), static_cast<float>(a * std::sin(phase)));
@@ -249,6 +256,14 @@ int writePalsarScene(const SceneDescription& scene, const PalsarSimConfig& cfg, 
       for (SimPixelTarget& t : d.pixelTargets) t.amplitude *= k;
       d.clutterSigma *= k;
       d.seed = scene.seed + 7919u * std::uint64_t(ch);
+      // Polarimetric products alternate H and V transmissions: the V-transmit
+      // echoes are received half a pulse interval of a channel after the
+      // H-transmit ones. Their records carry the time of the pair's H line.
+      // Targets given by line keep their place on the ground.
+      if (plr && kTx[ch] == 1) {
+        d.startTime += 0.5 / scene.prfHz;
+        for (SimPixelTarget& t : d.pixelTargets) t.line -= 0.5;
+      }
       sims.emplace_back(d);
     }
     const RawSceneSimulator& sim0 = sims.front();
@@ -291,21 +306,21 @@ int writePalsarScene(const SceneDescription& scene, const PalsarSimConfig& cfg, 
           std::fill(rec.begin(), rec.end(), 0);
           char* r = rec.data();
           putCeosRecordHead(r, sequence++, type, std::uint32_t(recordLength));
-          putBE32(r + 12, std::uint32_t(i + 1));
-          putBE32(r + 24, std::uint32_t(d.samples));
+          putBE32(r + sig::kLineNumber.offset, std::uint32_t(i + 1));
+          putBE32(r + sig::kPixels.offset, std::uint32_t(d.samples));
           const PalCivilTime c = civil(sim0.lineTime(i));
-          putBE32(r + 36, std::uint32_t(c.year));
-          putBE32(r + 40, std::uint32_t(c.doy));
-          putBE32(r + 44, std::uint32_t(std::lround(c.secondsOfDay * 1000.0)));
-          putBE16(r + 52, std::uint16_t(kTx[ch]));
-          putBE16(r + 54, std::uint16_t(kRx[ch]));
-          putBE32(r + 56, std::uint32_t(std::lround(d.prfHz * 1000.0 * (plr ? 2.0 : 1.0))));
-          putBE32(r + 60, 1u);
+          putBE32(r + sig::kYear.offset, std::uint32_t(c.year));
+          putBE32(r + sig::kDayOfYear.offset, std::uint32_t(c.doy));
+          putBE32(r + sig::kMillisecond.offset, std::uint32_t(std::lround(c.secondsOfDay * 1000.0)));
+          putBE16(r + sig::kTransmit.offset, std::uint16_t(kTx[ch]));
+          putBE16(r + sig::kReceive.offset, std::uint16_t(kRx[ch]));
+          putBE32(r + sig::kPrfMilliHz.offset, std::uint32_t(std::lround(d.prfHz * 1000.0 * (plr ? 2.0 : 1.0))));
+          putBE32(r + sig::kScanId.offset, 1u);
           const double nearM = std::round(sim0.swstSeconds(sim0.swstCodeOf(i)) * kC / 2.0);
-          putBE32(r + 116, std::uint32_t(std::lround(nearM)));
-          putBE32(r + 120, std::uint32_t(std::lround(nearM + (d.samples - 1) * kC / (2.0 * d.samplingRateHz))));
+          putBE32(r + sig::kNearRangeM.offset, std::uint32_t(std::lround(nearM)));
+          putBE32(r + sig::kFarRangeM.offset, std::uint32_t(std::lround(nearM + (d.samples - 1) * kC / (2.0 * d.samplingRateHz))));
           // Instrument prefix: bit 2 of its byte 60 marks the 14 MHz chirp.
-          if (!ersdac && cfg.mode != "FBS") r[288 + 60] = 4;
+          if (!ersdac && cfg.mode != "FBS") r[sig::kChirpSelect.offset] = sig::kNarrowChirpBit;
           sims[std::size_t(ch)].quantiseLine(block.data() + std::size_t(i - first) * std::size_t(d.samples), iq.data());
           std::memcpy(r + prefix, iq.data(), iq.size());
           o.write(rec.data(), std::streamsize(rec.size()));

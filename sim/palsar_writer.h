@@ -5,7 +5,10 @@
 // 412-byte line prefix) or the ERSDAC layout (records from 16252, 292-byte
 // line prefix). The echoes come from RawSceneSimulator, one simulation per
 // polarisation with its own scattering; the first polarisation's truth is the
-// truth of the scene.
+// truth of the scene. Polarimetric products carry twice the PRF of a
+// channel in the leader and alternate H and V transmissions: the V-transmit
+// echoes are received half a channel PRI after the H-transmit ones, and
+// every record carries the time of its pair's H transmission.
 #include <string>
 #include <utility>
 #include <vector>
@@ -23,9 +26,9 @@ struct PalsarSimConfig {
 
   // Radio interference added to every polarisation before quantisation:
   // persistent tones (frequency from the band centre in Hz, power in dB
-  // over the clutter in the tone's range-frequency bin) across the whole
-  // scene, and bursts (raw line, dB over the clutter in the burst's bin) of
-  // one line each.
+  // over the clutter in the tone's bin of a 256-bin range spectrum) across
+  // the whole scene, and bursts (raw line, dB over the clutter in the
+  // burst's bin of that spectrum) of one line each.
   std::vector<std::pair<double, double>> tones;
   std::vector<std::pair<int, double>> bursts;
 

@@ -39,21 +39,6 @@ Uniform g_uniform;
 bool g_haveSpare = false;
 double g_spare = 0.0;
 
-// |FFT|^2 of n samples of a chirp exp(-j pi rate u^2), u = (i/n - 0.5) T,
-// zero-padded to `length`, divided by n and scaled by r.
-int idealSpectrum(int n, double T, double rate, int length, double r, std::vector<double>& out) {
-  std::vector<fcomplex> c(static_cast<std::size_t>(length), fcomplex(0.0f, 0.0f));
-  for (int i = 0; i < n && i < length; ++i) {
-    const double u = (double(i) / n - 0.5) * T;
-    const double phase = -consts::kPi * u * u * rate;
-    c[std::size_t(i)] = fcomplex(static_cast<float>(std::cos(phase)), static_cast<float>(std::sin(phase)));
-  }
-  if (int st = fft_c(length, length, 1, 1, FFT_FORWARD, FFT_NONE, c.data(), c.data()); st != 0) return st;
-  out.resize(std::size_t(length));
-  for (int f = 0; f < length; ++f) out[std::size_t(f)] = std::norm(c[std::size_t(f)]) / n * r;
-  return 0;
-}
-
 }  // namespace
 
 double rfiGaussian() {
@@ -112,23 +97,25 @@ RFIblock::RFIblock(const SARPulse_Obj& pulse, int lines, int samples, int period
 RFIblock::~RFIblock() { DestroyBuffers(); }
 
 int RFIblock::CreateBuffers(int report) {
-  const double T = pulse_.PulseLength, B = pulse_.Bandwidth, fs = pulse_.PulseSamplingRate;
+  const double T = pulse_.PulseLength, fs = pulse_.PulseSamplingRate;
   if (T == 0.0 || fs == 0.0) {
     ORV_REPORT("Can't find chirp parameters on the raw header file", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
   report_ = report;
   F_ = genpow(samples_, 1);
-  const double r = B / fs;
+  if (P_ < 4 || P_ > F_) {
+    ORV_REPORT("Periodogram of " + std::to_string(P_) + " bins does not fit lines of " + std::to_string(samples_) +
+                   " samples",
+               REPORT_ERROR);
+    return STATUS_BAD_PARAMETER;
+  }
   try {
-    const double x = T * fs;
-    const int n = static_cast<int>(x >= 0 ? std::floor(x + 0.5) : std::ceil(x - 0.5));
-    if (int st = idealSpectrum(n, T, B / T, F_, r, idealF_); st != 0) return calledError(st);
-    if (int st = idealSpectrum(P_, T, (P_ / T) * r / T, P_, r, idealP_); st != 0) return calledError(st);
-    meanPsd_.assign(std::size_t(F_), 0.0);
+    reference_.assign(std::size_t(F_), 0.0);
     power_.assign(std::size_t(lines_), 0.0);
     meanDb_.assign(std::size_t(lines_), 0.0);
     deviation_.assign(std::size_t(lines_), 0.0);
+    linePsd_.assign(std::size_t(lines_) * std::size_t(P_), 0.0);
     freq_.assign(std::size_t(lines_) * std::size_t(F_), fcomplex(0.0f, 0.0f));
     mask_.assign(report ? std::size_t(lines_) * std::size_t(F_) : 0, 0);
   } catch (const std::bad_alloc&) {
@@ -151,8 +138,42 @@ int RFIblock::DestroyBuffers() {
   return 0;
 }
 
+namespace {
+
+// Running median of `in` over `width` neighbouring bins (odd), the spectrum
+// taken as circular: follows the smooth shape of a spectrum (chirp band,
+// filter roll-off, antenna) and passes over interferers narrower than half
+// the width.
+void runningMedian(const std::vector<double>& in, int width, std::vector<double>& out) {
+  const int n = static_cast<int>(in.size()), half = width / 2;
+  std::vector<double> window(static_cast<std::size_t>(2 * half + 1));
+  out.resize(in.size());
+  for (int i = 0; i < n; ++i) {
+    for (int k = -half; k <= half; ++k) window[std::size_t(k + half)] = in[std::size_t(((i + k) % n + n) % n)];
+    std::nth_element(window.begin(), window.begin() + half, window.end());
+    out[std::size_t(i)] = window[std::size_t(half)];
+  }
+}
+
+double medianOf(std::vector<double>& values) {
+  if (values.empty()) return 0.0;
+  const auto mid = values.begin() + std::ptrdiff_t(values.size() / 2);
+  std::nth_element(values.begin(), mid, values.end());
+  return *mid;
+}
+
+}  // namespace
+
+// The clean spectrum is measured on the block itself rather than taken from
+// the ideal chirp, which the echoes follow only roughly (receiver roll-off,
+// Fresnel ripples near the band edges). Persistent interferers are taken
+// out of each line before the line's own search: left in, a strong tone is
+// found again in every line together with the main lobe of its periodogram
+// bins, and the notches, tens of bins wide at fixed frequencies in every
+// line, raise the range sidelobes of every target. The median over lines
+// keeps a burst of one line out of the persistent search.
 int RFIblock::correct() {
-  const std::size_t F = std::size_t(F_);
+  const std::size_t F = std::size_t(F_), P = std::size_t(P_);
   // 1. Spectra of the lines.
   for (int l = 0; l < lines_; ++l) {
     fcomplex* X = freq_.data() + std::size_t(l) * F;
@@ -160,17 +181,12 @@ int RFIblock::correct() {
     std::fill(X + samples_, X + F, fcomplex(0.0f, 0.0f));
     pfft_c(forward_, X, X);
   }
-  // 2. Line powers, mean spectrum and the power trend through the middle
-  // percentiles of the powers.
-  std::fill(meanPsd_.begin(), meanPsd_.end(), 0.0);
+  // 2. Line powers and the power trend through the middle percentiles of
+  // the powers.
   for (int l = 0; l < lines_; ++l) {
     const fcomplex* X = freq_.data() + std::size_t(l) * F;
     double sum = 0.0;
-    for (std::size_t f = 0; f < F; ++f) {
-      const double e = std::norm(X[f]) / F_;
-      sum += e;
-      meanPsd_[f] += e / lines_;
-    }
+    for (std::size_t f = 0; f < F; ++f) sum += std::norm(X[f]) / F_;
     power_[std::size_t(l)] = sum / F_;
   }
   std::vector<int> order(static_cast<std::size_t>(lines_));
@@ -190,80 +206,120 @@ int RFIblock::correct() {
   }
   a0_ = coeff[0];
   a1_ = coeff[1];
-  // 3. Persistent interferers: bins above the expected spectrum in the block.
-  const double Pm = trend(lines_ / 2);
-  std::vector<char> persistent(F, 0);
-  for (std::size_t f = 0; f < F; ++f)
-    persistent[f] = 10.0 * std::log10(meanPsd_[f] / (idealF_[f] * Pm)) > thresholdPersistent ? 1 : 0;
 
+  // 3. Persistent interferers: bins of the block's median spectrum (the
+  // median over the lines, which a burst on a few lines does not move)
+  // above its running median over frequency. Over a block of lines the
+  // median is steady to a fraction of a decibel, so the threshold finds
+  // tones without false alarms. The reference is kept at the mean level of
+  // a clean bin (the median of an exponential power is ln 2 of its mean).
+  std::vector<double> median(F), column(static_cast<std::size_t>(lines_));
+  for (std::size_t f = 0; f < F; ++f) {
+    for (int l = 0; l < lines_; ++l) column[std::size_t(l)] = std::norm(freq_[std::size_t(l) * F + f]) / F_;
+    median[f] = medianOf(column);
+  }
+  runningMedian(median, std::max(9, (F_ / 64) | 1), reference_);
+  std::vector<char> persistent(F, 0);
+  double referenceSum = 0.0;
+  for (std::size_t f = 0; f < F; ++f) {
+    persistent[f] = reference_[f] > 0.0 && 10.0 * std::log10(median[f] / reference_[f]) > thresholdPersistent;
+    reference_[f] /= std::log(2.0);
+    referenceSum += reference_[f];
+  }
+
+  // 4. Welch spectra of the lines without their persistent bins, each
+  // normalised by its in-band power; their median over the block is the
+  // shape a clean line follows.
   const double B = pulse_.Bandwidth, fs = pulse_.PulseSamplingRate;
-  const int m = static_cast<int>(std::lround(P_ * B / fs)), h = m / 2;
-  const double noiseTrend = trend(lines_);
-  std::vector<double> psd(static_cast<std::size_t>(P_));
-  std::vector<char> isolated(F);
+  const int m = std::clamp(static_cast<int>(std::lround(P_ * B / fs)), 2, P_), h = m / 2;
+  auto inBand = [&](std::size_t i) { return int(i) < h || int(i) >= P_ - h; };
   std::vector<fcomplex> time(F);
+  std::vector<double> linePower(static_cast<std::size_t>(lines_), 0.0);
+  for (int l = 0; l < lines_; ++l) {
+    if (power_[std::size_t(l)] == 0.0) continue;
+    const fcomplex* X = freq_.data() + std::size_t(l) * F;
+    for (std::size_t f = 0; f < F; ++f) time[f] = persistent[f] ? fcomplex(0.0f, 0.0f) : X[f];
+    pfft_c(backward_, time.data(), time.data());
+    double* psd = linePsd_.data() + std::size_t(l) * P;
+    PSD(time.data(), F_, psd, P_);
+    double sum = 0.0;
+    for (std::size_t i = 0; i < P; ++i)
+      if (inBand(i)) sum += psd[i];
+    linePower[std::size_t(l)] = sum;
+  }
+  std::vector<double> shape(P, 0.0);
+  for (std::size_t i = 0; i < P; ++i) {
+    column.clear();
+    for (int l = 0; l < lines_; ++l)
+      if (linePower[std::size_t(l)] > 0.0) column.push_back(linePsd_[std::size_t(l) * P + i] / linePower[std::size_t(l)]);
+    shape[i] = medianOf(column);
+  }
+
+  const double q = double(F_) / P_;
+  std::vector<char> isolated(F);
   for (int l = 0; l < lines_; ++l) {
     fcomplex* X = freq_.data() + std::size_t(l) * F;
     char* rep = report_ ? mask_.data() + std::size_t(l) * F : nullptr;
-    const double p = power_[std::size_t(l)], Pl = trend(l);
-    if (p == 0.0) {
+    if (power_[std::size_t(l)] == 0.0) {
       std::fill(X, X + F, fcomplex(0.0f, 0.0f));
       if (rep) std::fill(rep, rep + F, char(3));
       continue;
     }
-    // a. Welch spectrum of the line against the chirp's, in band.
-    std::copy(in + std::size_t(l) * std::size_t(samples_), in + std::size_t(l + 1) * std::size_t(samples_), time.begin());
-    std::fill(time.begin() + samples_, time.end(), fcomplex(0.0f, 0.0f));
-    PSD(time.data(), F_, psd.data(), P_);
+    // a. The line's spectrum against the shape, in band: mean and spread
+    // of the level in dB.
+    const double* psd = linePsd_.data() + std::size_t(l) * P;
+    const double Pl = linePower[std::size_t(l)];
+    auto levelDb = [&](std::size_t i) {
+      return shape[i] > 0.0 && psd[i] > 0.0 ? 10.0 * std::log10(psd[i] / (shape[i] * Pl)) : 0.0;
+    };
     double sum = 0.0, sum2 = 0.0;
-    for (int i = 0; i < P_; ++i) {
-      if (!(i < h || i >= P_ - h)) continue;
-      const double db = 10.0 * std::log10(psd[std::size_t(i)] / (idealP_[std::size_t(i)] * Pl));
+    for (std::size_t i = 0; i < P; ++i) {
+      if (!inBand(i)) continue;
+      const double db = levelDb(i);
       sum += db;
       sum2 += db * db;
     }
-    const double mean = m > 0 ? sum / m : 0.0;
-    const double dev = m > 0 ? std::sqrt(std::max(0.0, (sum2 - m * mean * mean) / m)) : 0.0;
+    const double mean = sum / m;
+    const double dev = std::sqrt(std::max(0.0, (sum2 - m * mean * mean) / m));
     meanDb_[std::size_t(l)] = mean;
     deviation_[std::size_t(l)] = dev;
-    // b. Isolated interferers of this line.
+    // b. Isolated interferers: periodogram bins above the shape, each
+    // masking the transform bins of its main lobe.
     const bool badLine = dev > thresholdStd;
-    if (badLine) {
-      std::fill(isolated.begin(), isolated.end(), char(1));
-    } else {
-      std::fill(isolated.begin(), isolated.end(), char(0));
-      const float scale = static_cast<float>(1.0 / std::pow(10.0, mean / 20.0));
-      for (std::size_t f = 0; f < F; ++f) X[f] *= scale;
-      const double q = double(F_) / P_;
-      for (int i = 1; i <= P_; ++i) {
-        const double level = psd[std::size_t(i - 1)] / std::pow(10.0, mean / 10.0) / (idealP_[std::size_t(i - 1)] * Pl);
-        if (10.0 * std::log10(level) <= thresholdIsolate) continue;
-        const long lo = std::clamp(std::lround(q * (i - 2) - q / 2), 0L, long(F_ - 1));
-        const long hi = std::clamp(std::lround(q * i + q / 2), 0L, long(F_ - 1));
-        for (long f = lo; f < hi; ++f) isolated[std::size_t(f)] = 1;
+    std::fill(isolated.begin(), isolated.end(), char(badLine ? 1 : 0));
+    if (!badLine)
+      for (std::size_t i = 0; i < P; ++i) {
+        if (levelDb(i) - mean <= thresholdIsolate) continue;
+        const long centre = std::lround(q * double(i));
+        const long reach = static_cast<long>(std::ceil(q));
+        for (long f = centre - reach; f <= centre + reach; ++f) isolated[std::size_t(((f % F_) + F_) % F_)] = 1;
       }
-    }
-    // c. Masked bins get noise of the expected spectrum.
-    for (std::size_t f = 0; f < F; ++f)
-      if (persistent[f] || isolated[f]) {
-        const double sigma = std::sqrt(idealF_[f] * noiseTrend * F_ / 2.0);
+    // c. A line hit all over is replaced by noise of the block's clean
+    // spectrum; otherwise the masked bins are emptied.
+    if (badLine) {
+      for (std::size_t f = 0; f < F; ++f) {
+        const double sigma = std::sqrt(reference_[f] * F_ / 2.0);
         const double re = rfiGaussian() * sigma, im = rfiGaussian() * sigma;
         X[f] = fcomplex(static_cast<float>(re), static_cast<float>(im));
       }
-    // d. The line's power back to its own, or to the trend when it is off.
-    const double d = 10.0 * std::log10(p / Pl);
-    const double target = std::fabs(d) >= thresholdPowerLoss ? Pl : p;
-    double e = 0.0;
-    for (std::size_t f = 0; f < F; ++f) e += std::norm(X[f]);
-    e /= F_;
-    if (e > 0.0) {
-      const float k = static_cast<float>(std::sqrt(target) * std::sqrt(double(F_)) / std::sqrt(e));
-      for (std::size_t f = 0; f < F; ++f) X[f] *= k;
-    }
-    // e. Good lines keep no energy in the masked bins.
-    if (!badLine)
+    } else {
+      // d. The power of the emptied bins is given back to the line when the
+      // loss passes the threshold: by the share of the block's spectrum
+      // they hold, not by the line's measured power, which the
+      // interference itself has raised.
+      double kept = 0.0;
       for (std::size_t f = 0; f < F; ++f)
-        if (persistent[f] || isolated[f]) X[f] = fcomplex(0.0f, 0.0f);
+        if (persistent[f] || isolated[f]) {
+          X[f] = fcomplex(0.0f, 0.0f);
+        } else {
+          kept += reference_[f];
+        }
+      const double loss = kept > 0.0 ? 10.0 * std::log10(referenceSum / kept) : 0.0;
+      if (loss >= thresholdPowerLoss) {
+        const float k = static_cast<float>(std::sqrt(referenceSum / kept));
+        for (std::size_t f = 0; f < F; ++f) X[f] *= k;
+      }
+    }
     if (rep) {
       for (std::size_t f = 0; f < F; ++f) rep[f] = isolated[f] ? 2 : 0;
       for (std::size_t f = 0; f < F; ++f)

@@ -1,9 +1,10 @@
 #pragma once
 // Radio-frequency interference removal for L-band raw data. Each line's
-// spectrum is compared with the spectrum the chirp should give at the line's
-// power: bins that stand out in the whole block (persistent interferers) or
-// in one line (isolated bursts) are replaced, and the line's power restored.
-// The raster is rewritten block by block with its line prefixes.
+// spectrum is compared with the spectrum a clean line of its block shows:
+// bins that stand out in the whole block (persistent interferers) or in one
+// line (isolated bursts) are emptied and the power they held is given back
+// to the line; a line hit all over is replaced by noise of the block's
+// spectrum. The raster is rewritten block by block with its line prefixes.
 #include <string>
 #include <vector>
 
@@ -30,7 +31,7 @@ class RFIblock {
   RFIblock(const RFIblock&) = delete;
   RFIblock& operator=(const RFIblock&) = delete;
 
-  // Ideal spectra and plans; 1 with a report when the pulse is unknown, 7
+  // Buffers and plans; 1 with a report when the pulse is unknown, 7
   // without memory.
   int CreateBuffers(int report);
   int DestroyBuffers();
@@ -54,7 +55,10 @@ class RFIblock {
   const SARPulse_Obj& pulse_;
   int lines_, samples_, P_, F_ = 0, report_ = 0;
   double a0_ = 0.0, a1_ = 0.0;
-  std::vector<double> meanPsd_, idealP_, idealF_, power_, meanDb_, deviation_;
+  // Clean spectrum of the block (running median over frequency of the
+  // median over lines), line powers, mean level and deviation of each line,
+  // and the lines' Welch spectra (lines x periodogram bins).
+  std::vector<double> reference_, power_, meanDb_, deviation_, linePsd_;
   std::vector<fcomplex> freq_;
   std::vector<char> mask_;
   FFTPlan forward_{}, backward_{};

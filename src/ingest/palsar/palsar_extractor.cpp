@@ -6,6 +6,7 @@
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
+#include <cstring>
 #include <ctime>
 #include <fstream>
 #include <new>
@@ -16,6 +17,7 @@
 #include "diag/report.h"
 #include "diag/waitbar.h"
 #include "ingest/ceos/ceos_fields.h"
+#include "ingest/palsar/palsar_ceos_layout.h"
 #include "orbit/general_sar_orbit.h"
 #include "product/buffer_io.h"
 #include "product/data_file.h"
@@ -23,10 +25,6 @@
 
 namespace {
 
-constexpr int kJaxaStart = 720, kErsdacStart = 16252;
-// Line prefixes: 412 bytes in JAXA products, 292 in genuine ERSDAC products.
-constexpr int kJaxaPrefix = 412, kErsdacPrefix = 292;
-constexpr int kInstrumentPrefix = 288;
 
 int failure(const std::string& message, int status, int line, const char* function) {
   orv_add_report(message, REPORT_ERROR, line, function, __FILE__);
@@ -44,11 +42,6 @@ std::string trimmed(const std::string& s) {
   if (first == std::string::npos) return {};
   return s.substr(first, s.find_last_not_of(' ') - first + 1);
 }
-
-std::uint32_t be32(const unsigned char* p) {
-  return (std::uint32_t(p[0]) << 24) | (std::uint32_t(p[1]) << 16) | (std::uint32_t(p[2]) << 8) | std::uint32_t(p[3]);
-}
-int be16(const unsigned char* p) { return (int(p[0]) << 8) | int(p[1]); }
 
 // Fixed decimal field: length - decimals - 1 characters of integer part
 // (blanks and minus skipped), the point, `decimals` characters of fraction;
@@ -68,6 +61,35 @@ double readF(const char* text, int length, int decimals) {
       break;
     }
   return negative ? -v : v;
+}
+
+// The next record of an image file into `rec`: 0, or 4 with a report when
+// the file ends inside it or its length lies outside [shortest, longest].
+int readRecord(std::ifstream& in, const std::string& name, int index, std::uint32_t shortest, std::uint32_t longest,
+               std::vector<unsigned char>& rec) {
+  const std::string which = name + ": record " + std::to_string(index + 1);
+  rec.resize(12);
+  if (!in.read(reinterpret_cast<char*>(rec.data()), 12))
+    return PAL_FAIL("File reading failed! " + which + " is missing", STATUS_READ_FAILED);
+  const std::uint32_t length = ceosBE32(rec.data(), ceos_head::kLength);
+  if (length < shortest || length > longest) return PAL_FAIL("File reading failed! " + which + " has a bad length", STATUS_READ_FAILED);
+  rec.resize(length);
+  if (!in.read(reinterpret_cast<char*>(rec.data()) + 12, std::streamsize(length - 12)))
+    return PAL_FAIL("File reading failed! " + which + " is short", STATUS_READ_FAILED);
+  return 0;
+}
+
+// The output raster of a channel: complex floats, each line after its
+// 4-byte window start.
+void prepareRaster(GeneralRAWData& record, const std::string& name) {
+  DataFile& out = record.dataFile;
+  out.filename = name;
+  out.RowPrefix = 4;
+  out.CellType = FLOAT_COMPLEX;
+  out.HeaderOffset = 0;
+  out.ByteOrder = host_byte_order();
+  out.buffersize = 0;
+  record.rasterName = name;
 }
 
 bool readFile(const std::string& name, std::vector<char>& bytes) {
@@ -137,49 +159,134 @@ int ATPalExtractor::extract_lea10Ersdac() { return readLeader(true); }
 int ATPalExtractor::extract_L10Jaxa() { return walkImage(false); }
 int ATPalExtractor::extract_L10Ersdac() { return walkImage(true); }
 
+// Level 1.1 (focused, single-look complex) products are a side path: the
+// leader is checked for the level, and one pass over the image file copies
+// the big-endian complex samples into an azimuth-focused raster whose lines
+// carry their window start, with the line numbers checked on the way. The
+// focusing chain never reads this raster.
 int ATPalExtractor::extract_l11() {
-  return PAL_FAIL("This is not a PALSAR level 1.1 dataset! (" + LeaFileName + ": level 1.1 is not read here)",
-                  STATUS_BAD_PARAMETER);
+  CheckedCall cc("ATPalExtractor::extract_l11()");
+  namespace sig = palsar_image::signal;
+  std::vector<char> L;
+  if (!readFile(LeaFileName, L)) return PAL_FAIL("File " + LeaFileName + " cannot be opened!", STATUS_NOT_OPENED);
+  const CeosRecord summary(L, palsar_leader::kDataSetSummary);
+  if (!summary.has(palsar_leader::dss::kProcessingLevel) ||
+      trimmed(summary.text(palsar_leader::dss::kProcessingLevel)).rfind("1.1", 0) != 0)
+    return PAL_FAIL("This is not a PALSAR level 1.1 dataset! (" + LeaFileName + ")", 1);
+  std::ifstream in(RawDataName, std::ios::binary);
+  if (RawDataName.empty() || !in) return PAL_FAIL("File " + RawDataName + " not found!", STATUS_NOT_OPENED);
+  std::vector<char> desc(static_cast<std::size_t>(palsar_image::kFirstSignalRecord));
+  if (!in.read(desc.data(), std::streamsize(desc.size())))
+    return PAL_FAIL("File reading failed! " + RawDataName + ": short file descriptor", STATUS_READ_FAILED);
+  const int records = CeosRecord(desc, 0).integer(palsar_image::descriptor::kSignalRecords);
+  if (records < 1) return PAL_FAIL("Bad number of records in the image file " + RawDataName, STATUS_BAD_PARAMETER);
+
+  prepareRaster(record, OutputFile);
+  DataFile& out = record.dataFile;
+  std::vector<unsigned char> rec(12);
+  std::vector<float> row;
+  int samples = 0, base = 0, status = 0, lines = 0;
+  double windowMin = 1.0;
+  waitbar_open("Extracting PALSAR level 1.1 Data...");
+  for (int idx = 0; idx < records && status == 0; ++idx) {
+    waitbar_update(0, static_cast<float>(100.0 * idx / records));
+    if ((status = readRecord(in, RawDataName, idx, sig::kNearRangeM.end(), 1u << 24, rec)) != 0) break;
+    const std::uint32_t length = std::uint32_t(rec.size());
+    const unsigned char* r = rec.data();
+    const int number = static_cast<int>(ceosBE32(r, sig::kLineNumber) & 0xFFFFFFu);
+    if (idx == 0) base = number;
+    if (number != base + idx) ORV_REPORT("Invalid Line Number!", REPORT_WARNING);
+    const int pixels = static_cast<int>(ceosBE32(r, sig::kPixels));
+    if (idx == 0) {
+      samples = pixels;
+      if (samples < 1 || 8L * samples > long(length) - sig::kNearRangeM.end()) {
+        status = PAL_FAIL("Bad number of data pixels in " + RawDataName, STATUS_BAD_PARAMETER);
+        break;
+      }
+      row.assign(1 + 2 * std::size_t(samples), 0.0f);
+      out.NrOfPixelsPerLine = samples;
+      record.roi.Samples = samples;
+      if (int st = out.open(1); st != 0) {
+        status = PAL_CALLED(st);
+        break;
+      }
+    } else if (pixels != samples) {
+      status = PAL_FAIL("Records of different lengths in the level 1.1 image file " + RawDataName, STATUS_BAD_PARAMETER);
+      break;
+    }
+    const double window = 2.0 * ceosBE32(r, sig::kNearRangeM) / consts::kSpeedOfLight;
+    if (idx == 0) ORV_REPORT("SWST read from echo prefix : " + std::to_string(window), REPORT_CHECKPOINT);
+    windowMin = std::min(windowMin, window);
+    row[0] = static_cast<float>(window);
+    // The samples close the record: big-endian 32-bit I and Q.
+    const unsigned char* iq = r + (length - 8u * std::uint32_t(samples));
+    for (int k = 0; k < 2 * samples; ++k) {
+      const std::uint32_t bits = ceosBE32(iq + 4 * k, {0, 4});
+      float v;
+      std::memcpy(&v, &bits, sizeof v);
+      row[1 + std::size_t(k)] = v;
+    }
+    if (int st = out.write(row.data(), static_cast<int64_t>(row.size() * sizeof(float))); st != 0) status = PAL_CALLED(st);
+    ++lines;
+  }
+  waitbar_close();
+  const int closed = samples > 0 ? out.close() : 0;
+  if (status != 0) return status;
+  if (closed != 0) return PAL_CALLED(closed);
+  out.NrOfLinesPerImage = lines;
+  record.roi.Lines = lines;
+  record.roi.FastStartTime = windowMin;
+  record.dataSetInfo.SetImageType(DataSetInfo_Obj::IT_AZIMUTH_FOCUSED);
+  record.dataSetInfo.SetSensorType(DataSetInfo_Obj::ST_PALSAR);
+  record.dataSetInfo.SetProjection(DataSetInfo_Obj::PR_SLANT_RANGE);
+  if (int st = record.writehdr(); st != 0) return PAL_CALLED(st);
+  return 0;
 }
 
 int ATPalExtractor::readLeader(bool ersdac) {
   CheckedCall cc("ATPalExtractor::readLeader()");
+  namespace dss = palsar_leader::dss;
   std::vector<char> L;
   if (!readFile(LeaFileName, L)) return PAL_FAIL("File " + LeaFileName + " cannot be opened!", STATUS_NOT_OPENED);
-  if (L.size() < 2612) return PAL_FAIL("File reading failed! " + LeaFileName + " is too short for a PALSAR leader", STATUS_READ_FAILED);
-  const char* d = L.data();
-  if (std::string(d + 1830, 11) != "UNPROCESSED")
+  const CeosRecord summary(L, palsar_leader::kDataSetSummary);
+  if (!summary.has(dss::kErsdacFacility))
+    return PAL_FAIL("File reading failed! " + LeaFileName + " is too short for a PALSAR leader", STATUS_READ_FAILED);
+  if (summary.text(dss::kProcessingLevel) != "UNPROCESSED")
     return PAL_FAIL("The CEOS fileset is not ALOS RAW DATA (" + LeaFileName + ")", STATUS_BAD_PARAMETER);
   auto bad = [this](const char* what) { return std::string("Bad ") + what + " in the leader file " + LeaFileName; };
+  auto fixed = [&summary](CeosField field, int decimals = dss::kDecimals) {
+    return readF(summary.at(field), field.width, decimals);
+  };
 
   SamplingConstants_Obj& smp = record.sampling;
   SARPulse_Obj& pulse = record.pulse;
   DataSetInfo_Obj& info = record.dataSetInfo;
   ROI_Obj& roi = record.roi;
-  info.AcquisitionStation = trimmed(ceosText(d + 1766, 16));
-  info.SceneID = trimmed(ceosText(d + 740, 32));
+  info.AcquisitionStation = trimmed(summary.text(dss::kStation));
+  info.SceneID = trimmed(summary.text(dss::kSceneId));
   if (ersdac) {
-    std::vector<char> img;
+    std::vector<char> head;
     std::ifstream in(RawDataName, std::ios::binary);
-    char field[4];
     if (!in) return PAL_FAIL("File " + RawDataName + " not found!", STATUS_NOT_OPENED);
-    if (!in.seekg(232) || !in.read(field, 4)) return PAL_FAIL("File reading failed! " + RawDataName, STATUS_READ_FAILED);
-    const int n = ch2int(field, 4);
+    head.resize(static_cast<std::size_t>(palsar_image::descriptor::kChannels.end()));
+    if (!in.read(head.data(), std::streamsize(head.size())))
+      return PAL_FAIL("File reading failed! " + RawDataName, STATUS_READ_FAILED);
+    const int n = CeosRecord(head, 0).integer(palsar_image::descriptor::kChannels);
     npol_ = n == 6 ? 4 : n == 3 ? 2 : 1;
   } else {
-    npol_ = ch2int(d + 1108, 4);
+    npol_ = summary.integer(dss::kChannelCount);
   }
-  const char m0 = d[1132 + 12], m1 = d[1132 + 13];
-  if (m0 != '6') {
+  const char* mode = summary.at(dss::kSensorMode);
+  if (mode[0] != '6') {
     return PAL_FAIL("Acquisition type not supported (Calibration, Noise, Direct Downlink)", 1);
   }
-  if (m1 == '0' || m1 == '3') {
+  if (mode[1] == '0' || mode[1] == '3') {
     acquisitionMode = npol_ == 1 ? 0 : 1;
     numberOfChannels = 1;
-  } else if (m1 == '1') {
+  } else if (mode[1] == '1') {
     acquisitionMode = 3;
     numberOfChannels = 5;
-  } else if (m1 == '2') {
+  } else if (mode[1] == '2') {
     acquisitionMode = 2;
     numberOfChannels = 1;
   } else {
@@ -187,35 +294,35 @@ int ATPalExtractor::readLeader(bool ersdac) {
   }
   if (acquisitionMode == 3)
     return PAL_FAIL("ScanSAR extraction is not available in this build (" + LeaFileName + ")", STATUS_BAD_PARAMETER);
-  const char direction = ersdac ? d[820] : d[2254];
+  const char direction = *summary.at(ersdac ? dss::kErsdacDirection : dss::kDirection);
   info.OrbitConfiguration = direction == 'A' ? "ASCENDING" : "DESCENDING";
-  info.OrbitNumber = trimmed(ceosText(d + 1164, 8));
-  info.SceneHeading = readF(d + 1188, 8, 3);
-  smp.lambda_m = readF(d + 1220, 16, 7);
+  info.OrbitNumber = trimmed(summary.text(dss::kOrbitNumber));
+  info.SceneHeading = fixed(dss::kHeading, dss::kHeadingDecimals);
+  smp.lambda_m = fixed(dss::kWavelength);
   if (!(smp.lambda_m > 0.0)) return PAL_FAIL(bad("wavelength"), STATUS_BAD_PARAMETER);
-  maxMissingLines = ch2int(d + 1422, 8);
-  smp.frg_hz = readF(d + 1430, 16, 7) * 1000000.0;
+  maxMissingLines = summary.integer(dss::kMaxMissingLines);
+  smp.frg_hz = fixed(dss::kSamplingRateMHz) * 1000000.0;
   if (!(smp.frg_hz > 0.0)) return PAL_FAIL(bad("sampling rate"), STATUS_BAD_PARAMETER);
   smp.Trg_s = 1.0 / smp.frg_hz;
   pulse.PulseSamplingRate = smp.frg_hz;
-  roi.FastStartTime = readF(d + 1446, 16, 7) / 1000000.0;
+  roi.FastStartTime = fixed(dss::kWindowStartUs) / 1000000.0;
   ORV_REPORT("SWST read from byte 727 to 731 of Leader File : " + std::to_string(roi.FastStartTime), REPORT_CHECKPOINT);
-  pulse.PulseLength = readF(d + 1462, 16, 7) / 1000000.0;
+  pulse.PulseLength = fixed(dss::kPulseLengthUs) / 1000000.0;
   if (!(pulse.PulseLength > 0.0)) return PAL_FAIL(bad("pulse length"), STATUS_BAD_PARAMETER);
-  double slope = FtoDouble2(d + 1254, 16);
-  if (slope == 0.0) slope = FtoDouble2(d + 1270, 16);
+  double slope = summary.realExp(dss::kChirpSlope);
+  if (slope == 0.0) slope = summary.realExp(dss::kChirpSlopeSecond);
   pulse.PulseKRate = std::fabs(slope);
   pulse.Bandwidth = pulse.PulseLength * pulse.PulseKRate;
   if (!(pulse.Bandwidth > 0.0)) return PAL_FAIL(bad("chirp slope"), STATUS_BAD_PARAMETER);
-  gainH = std::pow(10.0, readF(d + 1486, 16, 7) / 10.0);
-  gainV = std::pow(10.0, readF(d + 1502, 16, 7) / 10.0);
-  biasI = readF(d + 1538, 16, 7);
-  biasQ = readF(d + 1554, 16, 7);
-  smp.prf_hz = readF(d + 1654, 16, 7) / 1000.0;
+  gainH = std::pow(10.0, fixed(dss::kGainHDb) / 10.0);
+  gainV = std::pow(10.0, fixed(dss::kGainVDb) / 10.0);
+  biasI = fixed(dss::kBiasI);
+  biasQ = fixed(dss::kBiasQ);
+  smp.prf_hz = fixed(dss::kPrfMilliHz) / 1000.0;
   if (acquisitionMode == 2) smp.prf_hz *= 0.5;  // H and V transmissions alternate
   if (!(smp.prf_hz > 0.0)) return PAL_FAIL(bad("PRF"), STATUS_BAD_PARAMETER);
   smp.pri_s = 1.0 / smp.prf_hz;
-  info.Swath = std::to_string(ch2int(d + 2574, 4));
+  info.Swath = std::to_string(summary.integer(dss::kBeamNumber));
   return 0;
 }
 
@@ -225,11 +332,12 @@ int ATPalExtractor::walkImage(bool ersdac) {
   missingLines_ = 0;
   std::ifstream in(RawDataName, std::ios::binary);
   if (RawDataName.empty() || !in) return PAL_FAIL("File " + RawDataName + " not found!", STATUS_NOT_OPENED);
-  const int start = ersdac ? kErsdacStart : kJaxaStart;
-  const int prefix = ersdac ? kErsdacPrefix : kJaxaPrefix;
+  namespace sig = palsar_image::signal;
+  const long start = ersdac ? palsar_image::kErsdacFirstSignalRecord : palsar_image::kFirstSignalRecord;
+  const int prefix = ersdac ? palsar_image::kErsdacPrefix : palsar_image::kJaxaPrefix;
   std::vector<char> desc(static_cast<std::size_t>(start));
   if (!in.read(desc.data(), start)) return PAL_FAIL("File reading failed! " + RawDataName + ": short file descriptor", STATUS_READ_FAILED);
-  const int records = ch2int(desc.data() + 236, 8);
+  const int records = CeosRecord(desc, 0).integer(palsar_image::descriptor::kSignalRecords);
   if (records < 1) return PAL_FAIL("Bad number of records in the image file " + RawDataName, STATUS_BAD_PARAMETER);
   const int skip = static_cast<int>(static_cast<long long>(SkipLines) * records / 100);
   int keep = records - skip;
@@ -242,14 +350,8 @@ int ATPalExtractor::walkImage(bool ersdac) {
   SARPulse_Obj& pulse = record.pulse;
   DataSetInfo_Obj& info = record.dataSetInfo;
   ROI_Obj& roi = record.roi;
+  prepareRaster(record, OutputFile);
   DataFile& out = record.dataFile;
-  out.filename = OutputFile;
-  out.RowPrefix = 4;
-  out.CellType = FLOAT_COMPLEX;
-  out.HeaderOffset = 0;
-  out.ByteOrder = host_byte_order();
-  out.buffersize = 0;
-  record.rasterName = OutputFile;
   swst.clear();
   missing.clear();
   sequence.clear();
@@ -265,23 +367,10 @@ int ATPalExtractor::walkImage(bool ersdac) {
   for (int idx = 0; idx < records && static_cast<long>(swst.size()) < keep; ++idx) {
     const int percent = static_cast<int>(100.0 * idx / records);
     if (percent != lastPercent) waitbar_update(0, static_cast<float>(lastPercent = percent));
-    rec.resize(12);
-    if (!in.read(reinterpret_cast<char*>(rec.data()), 12)) {
-      status = PAL_FAIL("File reading failed! " + RawDataName + ": record " + std::to_string(idx + 1) + " is missing", STATUS_READ_FAILED);
-      break;
-    }
-    const std::uint32_t length = be32(rec.data() + 8);
-    if (length < std::uint32_t(prefix) || length > 1u << 20) {
-      status = PAL_FAIL("File reading failed! " + RawDataName + ": bad length of record " + std::to_string(idx + 1), STATUS_READ_FAILED);
-      break;
-    }
-    rec.resize(length);
-    if (!in.read(reinterpret_cast<char*>(rec.data()) + 12, std::streamsize(length - 12))) {
-      status = PAL_FAIL("File reading failed! " + RawDataName + ": record " + std::to_string(idx + 1) + " is short", STATUS_READ_FAILED);
-      break;
-    }
+    if ((status = readRecord(in, RawDataName, idx, std::uint32_t(prefix), 1u << 20, rec)) != 0) break;
+    const std::uint32_t length = std::uint32_t(rec.size());
     const unsigned char* r = rec.data();
-    const int number = static_cast<int>(be32(r + 12) & 0xFFFFFFu);
+    const int number = static_cast<int>(ceosBE32(r, sig::kLineNumber) & 0xFFFFFFu);
     if (idx == 0) base = number;
     const long expected = position;
     const long actual = number - base;
@@ -289,7 +378,7 @@ int ATPalExtractor::walkImage(bool ersdac) {
       ORV_REPORT("Invalid Line Number! A missing line is probably detected", REPORT_WARNING);
       continue;  // a repeated or earlier record: dropped
     }
-    const int pixels = static_cast<int>(be32(r + 24));
+    const int pixels = static_cast<int>(ceosBE32(r, sig::kPixels));
     if (samples == 0) {
       samples = pixels;
       if (samples < 1 || 2L * samples + prefix > long(length)) {
@@ -325,20 +414,23 @@ int ATPalExtractor::walkImage(bool ersdac) {
     position = actual + 1;
     if (actual < skip || static_cast<long>(swst.size()) >= keep) continue;
 
-    const double nearM = be32(r + 116);
+    const double nearM = ceosBE32(r, sig::kNearRangeM);
     const double window = 2.0 * nearM / consts::kSpeedOfLight;
-    const double t = ascii2sec85("01-JAN-" + std::to_string(be32(r + 36)) + " 00:00:00.000") +
-                     (double(be32(r + 40)) - 1.0) * 86400.0 + be32(r + 44) / 1000.0;
-    const int tx = be16(r + 52), rx = be16(r + 54);
+    const double t = ascii2sec85("01-JAN-" + std::to_string(ceosBE32(r, sig::kYear)) + " 00:00:00.000") +
+                     (double(ceosBE32(r, sig::kDayOfYear)) - 1.0) * 86400.0 + ceosBE32(r, sig::kMillisecond) / 1000.0;
+    const int tx = ceosBE16(r, sig::kTransmit), rx = ceosBE16(r, sig::kReceive);
     if (!opened) {
-      roi.SlowStartTime = t;
-      record.swath.Acquisition_Start_Time = t;
+      // A polarimetric line pair carries the time of its H transmission; the
+      // V transmission follows half a pulse interval of the channel later.
+      const double start = acquisitionMode == 2 && tx == 1 ? t + 0.5 * smp.pri_s : t;
+      roi.SlowStartTime = start;
+      record.swath.Acquisition_Start_Time = start;
       out.NrOfPixelsPerLine = samples;
       roi.Samples = samples;
       polarization_ = std::string(tx == 0 ? "H" : tx == 1 ? "V" : "H+V") + (rx == 0 ? "/H" : "/V");
       ORV_REPORT("SWST read from echo prefix of swath 1 : " + std::to_string(window), REPORT_CHECKPOINT);
       if (!ersdac && acquisitionMode == 2)
-        pulse.Bandwidth = (r[kInstrumentPrefix + 60] & 4) ? 14000000.0 : 28000000.0;
+        pulse.Bandwidth = (*(r + sig::kChirpSelect.offset) & sig::kNarrowChirpBit) ? 14000000.0 : 28000000.0;
       if (int st = out.open(1); st != 0) {
         status = PAL_CALLED(st);
         break;

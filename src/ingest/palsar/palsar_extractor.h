@@ -28,7 +28,9 @@ class ATPalExtractor : public ProcessingTool {
   int extract_L10Jaxa();
   int extract_lea10Ersdac();
   int extract_L10Ersdac();
-  // Level 1.1 is not read by this processor: a report and 1.
+  // Level 1.1 side path: the focused samples of the image file into an
+  // azimuth-focused raster "<OutputFile>" with its ".hdr"; 1 with a report
+  // when the leader is not of level 1.1.
   int extract_l11();
   // Chirp of a channel: N = T fs samples of exp(-j pi B/T t^2) / sqrt(fs/B).
   int extract_chirp(int channel, std::vector<fcomplex>& chirp) const;
