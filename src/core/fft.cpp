@@ -2,7 +2,6 @@
 #include "base/status.h"
 
 #include <fftw3.h>
-#include <sys/mman.h>
 
 #include <algorithm>
 #include <atomic>
@@ -561,19 +560,6 @@ int czt_c(const fcomplex* in, int M, fcomplex* out, int K, double a, double b, i
 // ------------------------------------------------------- aligned blocks
 
 void* fft_malloc(std::size_t bytes) {
-  // Blocks of many rows are walked down their columns by the azimuth
-  // transforms, one row (one page of small pages) per sample: such blocks
-  // are placed on huge pages where the system allows, so that a column walk
-  // does not miss the address translation cache at every row.
-  constexpr std::size_t kHuge = std::size_t(2) << 20;
-  if (bytes >= 2 * kHuge) {
-    const std::size_t rounded = (bytes + kHuge - 1) / kHuge * kHuge;
-    void* p = std::aligned_alloc(kHuge, rounded);
-#ifdef MADV_HUGEPAGE
-    if (p) madvise(p, rounded, MADV_HUGEPAGE);
-#endif
-    return p;
-  }
   constexpr std::size_t kAlign = 64;
   std::size_t rounded = (bytes + kAlign - 1) / kAlign * kAlign;
   if (rounded == 0) rounded = kAlign;
