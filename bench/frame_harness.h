@@ -299,20 +299,32 @@ inline FrameRun runFrame(const std::string& folder, const std::string& jobFile, 
   fs::remove(ledger);
 
   // Raster passes: written in the stage that wrote them, read in a stage
-  // that names them.
+  // that names them. A file of the size of an earlier one that is gone is
+  // that raster renamed, not written again.
+  auto renamed = [&](const std::string& name, const Raster& raster) {
+    for (const auto& [other, r] : rasters)
+      if (other != name && r.bytes == raster.bytes && r.writer <= raster.writer && !fs::exists(folder + other))
+        return true;
+    return false;
+  };
   for (const auto& [name, raster] : rasters) {
+    const bool written = raster.writer >= 0 && !renamed(name, raster);
+    std::vector<std::size_t> readers;
+    for (std::size_t s = 0; s < stages.size(); ++s)
+      for (const std::string& ending : stages[s].reads)
+        if (name.size() >= ending.size() && name.compare(name.size() - ending.size(), ending.size(), ending) == 0)
+          readers.push_back(s);
+    if (!written && readers.empty()) continue;
     double ww = 0.0, wc = 0.0, rw = 0.0, rc = 0.0;
     timeRasterPass(folder + "floor.scratch", raster.bytes, ww, wc, rw, rc);
-    if (raster.writer >= 0) {
+    if (written) {
       t.stages[raster.writer].ioWall += ww;
       t.stages[raster.writer].ioCpu += wc;
     }
-    for (std::size_t s = 0; s < stages.size(); ++s)
-      for (const std::string& ending : stages[s].reads)
-        if (name.size() >= ending.size() && name.compare(name.size() - ending.size(), ending.size(), ending) == 0) {
-          t.stages[s].ioWall += rw;
-          t.stages[s].ioCpu += rc;
-        }
+    for (std::size_t s : readers) {
+      t.stages[s].ioWall += rw;
+      t.stages[s].ioCpu += rc;
+    }
   }
   return t;
 }
