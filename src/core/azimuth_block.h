@@ -140,8 +140,9 @@ struct WKWeighting {
   // 1 transition, 2 outside (always 0 without an azimuth window).
   int azimuthPiece(double k, double kx) const;
   // azimuthTerm over the n wavenumbers k[i] of one row: exact on every
-  // eighth sample and the last one, linear in between where the window
-  // rule keeps its piece (within parts in 1e8, below float resolution),
+  // 32nd sample and the last one, linear in between where the window rule
+  // keeps its piece (a row's wavenumbers span a few parts in 1e3 of k0, so
+  // the terms are smooth in k: within parts in 1e7, float resolution),
   // exact elsewhere. term[i] and P[i] receive the two results.
   void azimuthRow(const double* k, int n, double kx, double* term, double* P) const;
 };
@@ -206,6 +207,36 @@ inline double wk_sin(double x) {
   const double z = r * r;
   const double v = (q & 1) ? wk_detail::cosPoly(z) : wk_detail::sinPoly(r, z);
   return (q & 2) ? -v : v;
+}
+
+// cos and sin of x[i], i < n, narrowed to float: the values of wk_sincos
+// (up to the sign of an exact zero), computed by a branch-free loop that the
+// compiler vectorises when every argument is below 1e6 in magnitude (else
+// element by element). The quadrant selects and signs are products with 0,
+// 1 or -1, which are exact.
+inline void wk_phasors(const double* x, int n, float* c, float* s) {
+  int large = 0;
+  for (int i = 0; i < n; ++i) large += !(std::fabs(x[i]) < 1.0e6);
+  if (large != 0) {
+    for (int i = 0; i < n; ++i) {
+      double sd, cd;
+      wk_sincos(x[i], sd, cd);
+      c[i] = static_cast<float>(cd);
+      s[i] = static_cast<float>(sd);
+    }
+    return;
+  }
+  for (int i = 0; i < n; ++i) {
+    int q;
+    const double r = wk_detail::reduce(x[i], q);
+    const double z = r * r;
+    const double sr = wk_detail::sinPoly(r, z), cr = wk_detail::cosPoly(z);
+    const double odd = static_cast<double>(q & 1);
+    const double ss = odd * cr + (1.0 - odd) * sr;
+    const double cc = odd * sr + (1.0 - odd) * cr;
+    s[i] = static_cast<float>(ss * static_cast<double>(1 - (q & 2)));
+    c[i] = static_cast<float>(cc * static_cast<double>(1 - ((q + 1) & 2)));
+  }
 }
 
 // x * exp(j phase), the rotation narrowed to float.

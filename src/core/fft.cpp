@@ -5,10 +5,12 @@
 
 #include <algorithm>
 #include <atomic>
+#include <chrono>
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
 #include <cstring>
+#include <fstream>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -42,7 +44,23 @@ struct AxisEntry {
   AxisKey key{};
   // Written under the service mutex, read without it by running transforms.
   std::atomic<fftwf_plan> variant[2][2] = {{nullptr, nullptr}, {nullptr, nullptr}};
+  // Ledger of executions of each variant (counted only when the ledger is on):
+  // how many, and the monotonic clock of the first and the last, in ns.
+  std::atomic<long long> runs[2][2] = {{0, 0}, {0, 0}};
+  std::atomic<long long> first[2][2] = {{0, 0}, {0, 0}};
+  std::atomic<long long> last[2][2] = {{0, 0}, {0, 0}};
 };
+
+// Set once when TESSIVOR_FFT_LEDGER names a file: every executed transform is
+// then counted by geometry, and the counts are written to the file when the
+// plans are released.
+std::atomic<bool> ledgerOn{false};
+
+long long monotonicNs() {
+  return std::chrono::duration_cast<std::chrono::nanoseconds>(
+             std::chrono::steady_clock::now().time_since_epoch())
+      .count();
+}
 
 struct Service {
   std::mutex mutex;  // FFTW's planner is not thread safe
@@ -52,7 +70,28 @@ struct Service {
   bool threadsReady = false;
   bool wisdomTried = false;
   std::string wisdomPath;  // rewritten after each newly measured plan
+  std::string ledgerPath;  // transform ledger, empty: none
+  // One line per executed variant: kind (0 complex, 1 real forward, 2 real
+  // backward), length, count per execution, strides and distances, sign,
+  // threads, in place, aligned, executions, first and last execution (ns of
+  // the monotonic clock).
+  void writeLedger() {
+    if (ledgerPath.empty()) return;
+    std::ofstream out(ledgerPath, std::ios::app);
+    for (const auto& [key, entry] : cache)
+      for (int ip = 0; ip < 2; ++ip)
+        for (int al = 0; al < 2; ++al) {
+          const long long runs = entry->runs[ip][al].load();
+          if (runs == 0) continue;
+          out << static_cast<int>(key.kind) << ' ' << key.n << ' ' << key.howmany << ' '
+              << key.istride << ' ' << key.idist << ' ' << key.ostride << ' ' << key.odist
+              << ' ' << key.sign << ' ' << key.threads << ' ' << ip << ' ' << al << ' ' << runs
+              << ' ' << entry->first[ip][al].load() << ' ' << entry->last[ip][al].load()
+              << '\n';
+        }
+  }
   void destroyPlans() {
+    writeLedger();
     for (auto& [key, entry] : cache)
       for (auto& inner : entry->variant)
         for (auto& p : inner)
@@ -99,6 +138,15 @@ void prepareService(Service& s) {
         fftwf_import_wisdom_from_filename(path);
         s.wisdomPath = path;
         s.measure = true;
+      }
+    }
+    if (const char* path = std::getenv("TESSIVOR_FFT_LEDGER")) {
+      if (*path) {
+        s.ledgerPath = path;
+        std::ofstream(path, std::ios::trunc)
+            << "# kind n howmany istride idist ostride odist sign threads inplace aligned runs "
+               "first_ns last_ns\n";
+        ledgerOn.store(true);
       }
     }
   }
@@ -200,6 +248,12 @@ fftwf_plan variantFor(AxisEntry* e, const void* in, void* out) {
   const bool aligned =
       fftwf_alignment_of(const_cast<float*>(static_cast<const float*>(in))) == 0 &&
       fftwf_alignment_of(static_cast<float*>(out)) == 0;
+  if (ledgerOn.load(std::memory_order_relaxed)) {
+    const long long now = monotonicNs();
+    if (e->runs[inPlace][aligned].fetch_add(1, std::memory_order_relaxed) == 0)
+      e->first[inPlace][aligned].store(now, std::memory_order_relaxed);
+    e->last[inPlace][aligned].store(now, std::memory_order_relaxed);
+  }
   if (fftwf_plan p = e->variant[inPlace][aligned].load(std::memory_order_acquire)) return p;
   AxisEntry* made = axisEntry(e->key, inPlace, aligned);
   return made ? made->variant[inPlace][aligned].load() : nullptr;

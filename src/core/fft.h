@@ -149,3 +149,8 @@ bool fft_export_wisdom(const std::string& path);
 void fft_set_measure(bool measure);
 // Releases every cached plan (records made before become invalid).
 void fft_cleanup();
+// Transform ledger, for the frame benchmarks: when TESSIVOR_FFT_LEDGER names a
+// file, every executed transform is counted by its geometry (length, batch,
+// strides, direction, threads, placement, alignment) with the steady-clock
+// times of its first and last execution, and the counts are written to the
+// file when the plans are released (fft_cleanup or exit).

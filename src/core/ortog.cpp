@@ -221,6 +221,10 @@ int Ortog::apply_ortog(const OrtogRaster& raster) {
 
 void ortogN_reset() { g_ortogN = OrtogNState{}; }
 
+namespace {
+double sum4(const double (&s)[4]) { return (s[0] + s[1]) + (s[2] + s[3]); }
+}  // namespace
+
 int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
   if (samples < 1) return 0;
   OrtogNState& st = g_ortogN;
@@ -231,35 +235,41 @@ int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
   for (int l = 0; l < lines; ++l) {
     fcomplex* row = data + static_cast<std::size_t>(l) * pitch;
     if (block == 0) st = OrtogNState{};
-    double si = 0.0, sq = 0.0;
+    // Sums over a line run in four interleaved partial sums (sample k into
+    // sum k mod 4, added pairwise at the end), so that the additions of
+    // neighbouring samples do not wait for each other.
+    double si4[4] = {}, sq4[4] = {};
     for (int k = 0; k < samples; ++k) {
       I[k] = row[k].real();
       Q[k] = row[k].imag();
-      si += I[k];
-      sq += Q[k];
+      si4[k & 3] += I[k];
+      sq4[k & 3] += Q[k];
     }
+    const double si = sum4(si4), sq = sum4(sq4);
     const double mi = si / samples, mq = sq / samples;
     if (mi == 0.0) continue;  // an empty line passes unchanged
     smooth(st.meanI, mi);
     smooth(st.meanQ, mq);
     const float smi = static_cast<float>(st.meanI), smq = static_cast<float>(st.meanQ);
-    double pi = 0.0, pq = 0.0;
+    double pi4[4] = {}, pq4[4] = {};
     for (int k = 0; k < samples; ++k) {
       I[k] -= smi;
       Q[k] -= smq;
-      pi += static_cast<double>(I[k]) * I[k];
-      pq += static_cast<double>(Q[k]) * Q[k];
+      pi4[k & 3] += static_cast<double>(I[k]) * I[k];
+      pq4[k & 3] += static_cast<double>(Q[k]) * Q[k];
     }
+    const double pi = sum4(pi4), pq = sum4(pq4);
     smooth(st.levelI, std::sqrt(pi / samples));
     smooth(st.levelQ, std::sqrt(pq / samples));
     const float ratio = st.levelQ > 1e-08 ? static_cast<float>(st.levelI / st.levelQ) : 1.0f;
-    double cross = 0.0, ii = 0.0, qq = 0.0;
+    double cross4[4] = {}, ii4[4] = {}, qq4[4] = {};
     for (int k = 0; k < samples; ++k) {
       Q[k] *= ratio;
-      cross += static_cast<double>(I[k]) * Q[k];
-      ii += static_cast<double>(I[k]) * I[k];
-      qq += static_cast<double>(Q[k]) * Q[k];
+      cross4[k & 3] += static_cast<double>(I[k]) * Q[k];
+      ii4[k & 3] += static_cast<double>(I[k]) * I[k];
+      qq4[k & 3] += static_cast<double>(Q[k]) * Q[k];
     }
+    const double cross = sum4(cross4), ii = sum4(ii4), qq = sum4(qq4);
     smooth(st.cross, cross);
     smooth(st.powI, ii);
     smooth(st.powQ, qq);

@@ -4,6 +4,7 @@
 #include <cmath>
 #include <complex>
 #include <cstddef>
+#include <cstring>
 #include <memory>
 #include <new>
 #include <string>
@@ -60,18 +61,61 @@ inline fcomplex mul(fcomplex a, fcomplex b) {
                   a.real() * b.imag() + a.imag() * b.real());
 }
 
-// std::round for |x| below 2^62 without the library call.
+// std::round for |x| below 2^62 without the library call, and without
+// branches: the fractions of the Stolt positions are random, and a branch on
+// them would be mispredicted half of the time.
 inline double roundHalfAway(double x) {
-  long long t = static_cast<long long>(x);
-  const double f = x - static_cast<double>(t);
-  if (f >= 0.5)
-    ++t;
-  else if (f <= -0.5)
-    --t;
-  return static_cast<double>(t);
+  const double t = static_cast<double>(static_cast<long long>(x));
+  const double f = x - t;
+  return t + static_cast<double>(f >= 0.5) - static_cast<double>(f <= -0.5);
 }
 
 inline fcomplex scaled(fcomplex x, float f) { return fcomplex(x.real() * f, x.imag() * f); }
+
+// Four floats: two complex samples.
+typedef float V4 __attribute__((vector_size(16)));
+struct Lanes {
+  V4 v;
+};
+
+// The least-squares filter table laid out for two taps per vector: for taps
+// 2p and 2p+1 of a row, (re, re, re', re') and (im, -im, im', -im'); rows of
+// an odd tap count end with a zero tap. Multiplied lane by lane with two
+// interleaved complex samples, the first gives (h.re s.re, h.re s.im) and the
+// second (h.im s.re, -h.im s.im): the sums of the lanes in the right places
+// make the complex product, so a tap pair costs two vector products.
+struct PairedTaps {
+  int pairs = 0;
+  std::vector<Lanes> re, im;
+  void make(const std::vector<fcomplex>& table, int rows, int taps) {
+    pairs = (taps + 1) / 2;
+    re.assign(static_cast<std::size_t>(rows) * pairs, Lanes{V4{0.0f, 0.0f, 0.0f, 0.0f}});
+    im.assign(re.size(), Lanes{V4{0.0f, 0.0f, 0.0f, 0.0f}});
+    for (int r = 0; r < rows; ++r)
+      for (int m = 0; m < taps; ++m) {
+        const fcomplex h = table[static_cast<std::size_t>(r) * taps + m];
+        V4& a = re[static_cast<std::size_t>(r) * pairs + m / 2].v;
+        V4& b = im[static_cast<std::size_t>(r) * pairs + m / 2].v;
+        const int lane = 2 * (m % 2);
+        a[lane] = a[lane + 1] = h.real();
+        b[lane] = h.imag();
+        b[lane + 1] = -h.imag();
+      }
+  }
+  // sum over the taps of row r of h[m] s[m]; reads 2 pairs samples of s.
+  fcomplex apply(int r, const fcomplex* s) const {
+    const Lanes* a = re.data() + static_cast<std::size_t>(r) * pairs;
+    const Lanes* b = im.data() + static_cast<std::size_t>(r) * pairs;
+    V4 p{0.0f, 0.0f, 0.0f, 0.0f}, q{0.0f, 0.0f, 0.0f, 0.0f};
+    for (int m = 0; m < pairs; ++m) {
+      V4 x;
+      std::memcpy(&x, s + 2 * m, sizeof x);
+      p += a[m].v * x;
+      q += b[m].v * x;
+    }
+    return fcomplex(p[0] + p[2] + q[1] + q[3], p[1] + p[3] + q[0] + q[2]);
+  }
+};
 
 // What both kernels derive from the block record before the row loop.
 struct StoltGrid {
@@ -187,6 +231,10 @@ class Zoom {
 struct RowBuffers {
   FFTBuffer a, b;
   std::vector<double> k, term, P;  // wavenumbers and azimuth weighting of the row
+  std::vector<double> phase;       // reference phase of each sample of the row
+  std::vector<float> cosv, sinv;   // and its phasor
+  std::vector<double> pos;         // input position of each output wavenumber
+  std::vector<float> weight;       // weight of each sample of the row
 };
 
 bool checkSizes(const AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
@@ -392,10 +440,16 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
     rowD.assign(nl, 0.0);
     buffers.resize(threadCount());
     for (RowBuffers& rb : buffers) {
-      rb.a.assign(static_cast<std::size_t>(guard) + padded + H, fcomplex(0.0f, 0.0f));
+      // One more zero for the zero tap that ends a row of paired taps.
+      rb.a.assign(static_cast<std::size_t>(guard) + padded + H + 1, fcomplex(0.0f, 0.0f));
       rb.b.assign(M, fcomplex(0.0f, 0.0f));
       rb.term.resize(padded);
       rb.P.resize(padded);
+      rb.phase.resize(padded);
+      rb.cosv.resize(padded);
+      rb.sinv.resize(padded);
+      rb.pos.resize(M);
+      rb.weight.assign(padded, 1.0f);
     }
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Out of memory in the least-squares Stolt kernel", REPORT_ERROR);
@@ -406,6 +460,13 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
   if (st != STATUS_OK) {
     ORV_REPORT_CALLED_ERROR();
     return st;
+  }
+  PairedTaps paired;
+  try {
+    paired.make(table, kFractions, taps);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("Out of memory in the least-squares Stolt kernel", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
   }
   const WKWeighting wt(par);
   const bool A = wt.active;
@@ -421,6 +482,13 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
     rwin.resize(padded);
     for (int i = 0; i < padded; ++i) rwin[i] = wt.rangeTerm(kin[i]);
   }
+  // The input samples inside the processed band, where the gain sums run.
+  int band0 = padded, band1 = 0;
+  for (int i = 0; i < padded; ++i)
+    if (std::fabs(kin[i] - grid.k0) < grid.inBand) {
+      band0 = std::min(band0, i);
+      band1 = i + 1;
+    }
   const double R2 = par.Req - po * grid.dr * std::cos(grid.sq);
   const double R3 = po * grid.dr * std::cos(grid.sq);
 
@@ -470,37 +538,54 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
       double* rowTerm = rb.term.data();
       double* rowP = rb.P.data();
       if (A) wt.azimuthRow(kin.data(), padded, kx[j], rowTerm, rowP);
+      double* phase = rb.phase.data();
+      const double kx2j = kx2[j];
       for (int i = 0; i < padded; ++i) {
-        fcomplex v = spectrum[i];
-        if (conj) v = std::conj(v);
         const double k = kin[i];
-        const double phase = (std::sqrt(k * k - kx2[j]) - kzc) * R2 - (k - k0) * rg + azPhase;
-        v = rotate(v, phase);
-        float W = 1.0f;
-        if (A) {
-          const double P = rowP[i];
-          const double aw = rowTerm[i];
-          const double rw = rwin.empty() ? 1.0 : rwin[i];
-          W = static_cast<float>(aw * rw);
-          if (std::fabs(k - k0) < grid.inBand) {
-            D += P;
-            N += P * W * W;
-          }
-        }
-        spectrum[i] = scaled(v, W * S);
+        phase[i] = (std::sqrt(k * k - kx2j) - kzc) * R2 - (k - k0) * rg + azPhase;
       }
+      const float* cs = rb.cosv.data();
+      const float* sn = rb.sinv.data();
+      wk_phasors(phase, padded, rb.cosv.data(), rb.sinv.data());
+      // Weights of the row (window and whitening; 1 without them), and the
+      // gain sums over the processed band in four partial sums added in a
+      // fixed order.
+      float* W = rb.weight.data();
+      if (A) {
+        for (int i = 0; i < padded; ++i)
+          W[i] = static_cast<float>(rowTerm[i] * (rwin.empty() ? 1.0 : rwin[i]));
+        double n4[4] = {0.0, 0.0, 0.0, 0.0}, d4[4] = {0.0, 0.0, 0.0, 0.0};
+        for (int i = band0; i < band1; ++i) {
+          const double P = rowP[i], w = W[i];
+          d4[i & 3] += P;
+          n4[i & 3] += P * w * w;
+        }
+        D = (d4[0] + d4[1]) + (d4[2] + d4[3]);
+        N = (n4[0] + n4[1]) + (n4[2] + n4[3]);
+      }
+      // Reference phase, weight and scale of every sample.
+      float* sp = reinterpret_cast<float*>(spectrum);
+      const float im = conj ? -1.0f : 1.0f;
+      for (int i = 0; i < padded; ++i) {
+        const float re = sp[2 * i], ii = im * sp[2 * i + 1];
+        const float ws = W[i] * S;
+        sp[2 * i] = (re * cs[i] - ii * sn[i]) * ws;
+        sp[2 * i + 1] = (re * sn[i] + ii * cs[i]) * ws;
+      }
+      // Input positions of the output wavenumbers first, in a loop of its
+      // own that the compiler vectorises.
+      double* pos = rb.pos.data();
+      const double* kzq = grid.kz.data();
+      for (int q = ilo; q <= ihi; ++q)
+        pos[q - ilo] = std::fabs(std::sqrt(kzq[q] * kzq[q] + kx2j) - kis) / dki;
       for (int q = ilo; q <= ihi; ++q) {
-        const double x = std::fabs(std::sqrt(grid.kz[q] * grid.kz[q] + kx2[j]) - kis) / dki;
+        const double x = pos[q - ilo];
         if (!(x < padded)) continue;  // also rows beyond the geometric limit
         const double u = roundHalfAway(x);
         const int iu = static_cast<int>(u);
         if (iu < 0 || iu >= padded) continue;
         const int r = static_cast<int>(roundHalfAway((x - u) / 0.01)) + 50;
-        const fcomplex* h = table.data() + static_cast<std::size_t>(r) * taps;
-        const fcomplex* s = buf + iu;
-        fcomplex y(0.0f, 0.0f);
-        for (int m = 0; m < taps; ++m) y += mul(h[m], s[m]);
-        line[grid.idx[q]] = mul(y, back[q]);
+        line[grid.idx[q]] = mul(paired.apply(r, buf + iu), back[q]);
       }
       pfft_c(inv, line, line);
     }

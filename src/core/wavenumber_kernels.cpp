@@ -149,7 +149,7 @@ int WKWeighting::azimuthPiece(double k, double kx) const {
 }
 
 void WKWeighting::azimuthRow(const double* k, int n, double kx, double* term, double* P) const {
-  constexpr int kCell = 8;
+  constexpr int kCell = 32;
   if (n < 1) return;
   int i0 = 0;
   term[0] = azimuthTerm(k[0], kx, P[0]);
@@ -259,6 +259,10 @@ int wk_column_transform(fcomplex* data, int pitch, int used, int lines, int dire
   // threads and the result does not depend on the thread count.
   constexpr int kStrip = 16;
   const int strips = (used + kStrip - 1) / kStrip;
+  // Columns of a strip lie apart by the column length plus one cache line:
+  // at a power-of-two length they would all fall into the same cache sets,
+  // and gathering or scattering a row of the strip would evict itself.
+  const std::size_t stride = static_cast<std::size_t>(lines) + 8;
   FFTPlan line;
   if (fft_makep_c(line, lines, lines, 1, 1, direction, FFT_NONE, 1) != 0) return 5;
   int status = STATUS_OK;
@@ -267,7 +271,7 @@ int wk_column_transform(fcomplex* data, int pitch, int used, int lines, int dire
     FFTBuffer strip;
     bool ok = true;
     try {
-      strip.resize(static_cast<std::size_t>(kStrip) * lines);
+      strip.resize(static_cast<std::size_t>(kStrip) * stride);
     } catch (const std::bad_alloc&) {
       ok = false;
     }
@@ -281,17 +285,29 @@ int wk_column_transform(fcomplex* data, int pitch, int used, int lines, int dire
       if (!ok) continue;
       const int c0 = g * kStrip;
       const int w = std::min(kStrip, used - c0);
+      // Each row of the strip lies on its own page: the hardware does not
+      // fetch ahead across pages, so the walk down the rows asks for the
+      // rows a few steps ahead itself.
+      constexpr int kAhead = 8;
       for (int l = 0; l < lines; ++l) {
         const fcomplex* src = data + static_cast<std::size_t>(l) * pitch + c0;
-        for (int b = 0; b < w; ++b) t[static_cast<std::size_t>(b) * lines + l] = src[b];
+        if (l + kAhead < lines) {
+          __builtin_prefetch(src + kAhead * static_cast<std::size_t>(pitch));
+          __builtin_prefetch(src + kAhead * static_cast<std::size_t>(pitch) + 8);
+        }
+        for (int b = 0; b < w; ++b) t[b * stride + l] = src[b];
       }
       for (int b = 0; b < w; ++b) {
-        fcomplex* col = t + static_cast<std::size_t>(b) * lines;
+        fcomplex* col = t + b * stride;
         pfft_c(line, col, col);
       }
       for (int l = 0; l < lines; ++l) {
         fcomplex* dst = data + static_cast<std::size_t>(l) * pitch + c0;
-        for (int b = 0; b < w; ++b) dst[b] = t[static_cast<std::size_t>(b) * lines + l];
+        if (l + kAhead < lines) {
+          __builtin_prefetch(dst + kAhead * static_cast<std::size_t>(pitch), 1);
+          __builtin_prefetch(dst + kAhead * static_cast<std::size_t>(pitch) + 8, 1);
+        }
+        for (int b = 0; b < w; ++b) dst[b] = t[b * stride + l];
       }
     }
   }

@@ -110,3 +110,28 @@ TEST(ErsEndToEnd, HostStopDuringAzimuthFocusingEndsWith326400) {
   EXPECT_TRUE(contains(run.trace, "EXECUTION INTERRUPTED BY OPERATOR")) << run.trace;
   EXPECT_FALSE(fs::exists(dir / "out_slc"));
 }
+
+// The product does not depend on the number of threads: the chain's loops
+// and transforms on one thread and on two give the same bytes.
+TEST(ErsEndToEnd, ProductIdenticalOnOneAndTwoThreads) {
+  TempFolder dir("threads");
+  SceneDescription scene = ersScene(3072, 1536, kDoppler);
+  scene.pixelTargets = {{1500.25, 700.5, 0.0, 4.0}};
+  SensorScene files;
+  std::string error;
+  ASSERT_TRUE(simulateErs(scene, dir.str(), files, error)) << error;
+  std::string product[2];
+  for (int threads = 1; threads <= 2; ++threads) {
+    const std::string run = (dir / ("run" + std::to_string(threads))) + "/";
+    fs::create_directories(run);
+    writeJob(run + "job.txt", ersJob(files, run + "out"));
+    RunOptions options;
+    options.variables = {{"OMP_NUM_THREADS", std::to_string(threads)},
+                         {"TESSIVOR_FFT_THREADS", std::to_string(threads)}};
+    const FocuserRun r = runFocuser(run, run + "job.txt", options);
+    ASSERT_EQ(r.exitStatus, 0) << r.log << r.stderrText;
+    product[threads - 1] = readText(run + "out_slc");
+    ASSERT_GT(product[threads - 1].size(), 1000000u);
+  }
+  EXPECT_TRUE(product[0] == product[1]);
+}
