@@ -229,7 +229,8 @@ struct Raster {
 
 // Runs the focuser once on `jobFile` in `folder` and measures its floor.
 inline FrameRun runFrame(const std::string& folder, const std::string& jobFile, const std::vector<Stage>& stages,
-                         const std::string& executable) {
+                         const std::string& executable,
+                         const std::map<std::string, std::string>& variables = {}) {
   FrameRun t;
   t.stages.resize(stages.size());
   const std::string ledger = folder + "fft_ledger.txt";
@@ -242,6 +243,7 @@ inline FrameRun runFrame(const std::string& folder, const std::string& jobFile, 
   options.executable = executable;
   options.pollMilliseconds = 5;
   options.timeoutSeconds = 7200;
+  options.variables = variables;
   options.variables["TESSIVOR_FFT_LEDGER"] = ledger;
   options.hook = [&](const support::RunningFocuser& running) {
     std::error_code ec;

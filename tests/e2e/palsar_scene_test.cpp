@@ -34,27 +34,10 @@ std::vector<SimPixelTarget> spreadTargets(int samples) {
   return {{5000.25, 1000.5, 0.0, 4.0}, {6200.0, 1900.25, 60.0, 4.0}, {7400.5, 2800.0, 0.0, 4.0}};
 }
 
-SceneDescription palsarScene(const PalsarSimConfig& cfg, int lines, int samples) {
-  SceneDescription s = ersScene(lines, samples, 0.0);
-  s.nearRangeTime = 0.00567;
-  s.clutterSigma = 1.0;
-  s.noiseSigma = 0.5;
-  s.orbitNumber = 12345;
-  applyPalsarInstrument(cfg, s);
+SceneDescription targetScene(const PalsarSimConfig& cfg, int lines, int samples) {
+  SceneDescription s = support::palsarScene(cfg, lines, samples);
   s.pixelTargets = spreadTargets(samples);
   return s;
-}
-
-// The 24 parameters of a PALSAR job: scenes, output, orbit and leader (the
-// leader's platform position record is the orbit).
-Job palsarJob(const std::string& platform, const PalsarSceneFiles& f, const std::string& out) {
-  Job p(24, "NotOK");
-  p[0] = platform;
-  for (std::size_t k = 0; k < f.images.size() && k < 4; ++k) p[1 + k] = f.images[k];
-  p[5] = out;
-  p[6] = p[7] = f.leader;
-  p[16] = p[17] = p[20] = p[21] = p[23] = "0";
-  return p;
 }
 
 int occurrences(const std::string& text, const std::string& part) {
@@ -86,7 +69,7 @@ void focusAllPolarisations(const std::string& mode, const std::string& layout, i
   PalsarSimConfig cfg;
   cfg.mode = mode;
   cfg.layout = layout;
-  const SceneDescription scene = palsarScene(cfg, kLines, samples);
+  const SceneDescription scene = targetScene(cfg, kLines, samples);
   PalsarSceneFiles files;
   std::string error;
   ASSERT_EQ(writePalsarScene(scene, cfg, dir / "sim", &files, error), 0) << error;
@@ -114,7 +97,7 @@ TEST(PalsarEndToEnd, SinglePolarisationSceneWithLostLinesIsRepairedAndFocused) {
   TempFolder dir("palsar_fbs");
   PalsarSimConfig cfg;
   cfg.maxMissingLines = 20;
-  SceneDescription scene = palsarScene(cfg, kLines, 4000);
+  SceneDescription scene = targetScene(cfg, kLines, 4000);
   // 12 lines lost, limit 20, before the apertures of the targets: a
   // timeline without the repeats would move every target by 12 lines.
   for (int line = 1000; line < 1012; ++line) scene.dropLines.push_back(line);
@@ -132,7 +115,7 @@ TEST(PalsarEndToEnd, LostLinesBeyondTheLeaderLimitEndTheRun) {
   TempFolder dir("palsar_gap");
   PalsarSimConfig cfg;
   cfg.maxMissingLines = 10;
-  SceneDescription scene = palsarScene(cfg, 600, 1200);
+  SceneDescription scene = targetScene(cfg, 600, 1200);
   for (int line = 200; line < 230; ++line) scene.dropLines.push_back(line);
   PalsarSceneFiles files;
   std::string error;
@@ -160,7 +143,7 @@ TEST(PalsarExtraction, PolarimetricProductHalvesTheLeaderPrfAndKeepsTheDownChirp
   TempFolder dir("palsar_plr");
   PalsarSimConfig cfg;
   cfg.mode = "PLR";
-  const SceneDescription scene = palsarScene(cfg, 64, 1200);
+  const SceneDescription scene = targetScene(cfg, 64, 1200);
   PalsarSceneFiles files;
   std::string error;
   ASSERT_EQ(writePalsarScene(scene, cfg, dir / "sim", &files, error), 0) << error;
@@ -248,7 +231,7 @@ TEST(HeavyPalsarEndToEnd, InterferenceRemovalRestoresTheTargetsOfAJammedScene) {
   TempFolder dir("palsar_rfi");
   PalsarSimConfig cfg;
   cfg.mode = "FBD";
-  const SceneDescription scene = palsarScene(cfg, kLines, kSamples);
+  const SceneDescription scene = targetScene(cfg, kLines, kSamples);
   PalsarSceneFiles clean, jammed;
   std::string error;
   ASSERT_EQ(writePalsarScene(scene, cfg, dir / "sim", &clean, error), 0) << error;

@@ -43,6 +43,16 @@ Job envisatJob(const SensorScene& scene, const std::string& outputRoot) {
   return p;
 }
 
+Job palsarJob(const std::string& platform, const PalsarSceneFiles& files, const std::string& outputRoot) {
+  Job p(24, "NotOK");
+  p[0] = platform;
+  for (std::size_t k = 0; k < files.images.size() && k < 4; ++k) p[1 + k] = files.images[k];
+  p[5] = outputRoot;
+  p[6] = p[7] = files.leader;
+  p[16] = p[17] = p[20] = p[21] = p[23] = "0";
+  return p;
+}
+
 void writeJob(const std::string& file, const Job& job) {
   std::string text = "stripmap focusing job\n";
   for (const auto& p : job) text += p + "\n";

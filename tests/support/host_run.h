@@ -25,6 +25,10 @@ Job ersJob(const SensorScene& scene, const std::string& outputRoot);
 // The job of a simulated ENVISAT scene whose orbit and auxiliary files
 // (ASA_INS, ASA_XCA, ASA_XCH) are searched in their folders.
 Job envisatJob(const SensorScene& scene, const std::string& outputRoot);
+// The job of a simulated PALSAR product: one image file per polarisation,
+// the leader (its platform position record is the orbit); platform
+// "PALSAR" or "PALSAR_ERSDAC".
+Job palsarJob(const std::string& platform, const PalsarSceneFiles& files, const std::string& outputRoot);
 // A job file: an ignored first line, then one parameter a line.
 void writeJob(const std::string& file, const Job& job);
 

@@ -64,6 +64,16 @@ SceneDescription envisatScene(const AsarSimConfig& cfg, int lines, int samples, 
   return s;
 }
 
+SceneDescription palsarScene(const PalsarSimConfig& cfg, int lines, int samples) {
+  SceneDescription s = ersScene(lines, samples, 0.0);
+  s.nearRangeTime = 0.00567;
+  s.clutterSigma = 1.0;
+  s.noiseSigma = 0.5;
+  s.orbitNumber = 12345;
+  applyPalsarInstrument(cfg, s);
+  return s;
+}
+
 bool simulateEnvisat(const SceneDescription& scene, const AsarSimConfig& cfg, const std::string& folder,
                      SensorScene& out, std::string& error) {
   try {

@@ -22,6 +22,7 @@
 #include "core/range_focus.h"
 #include "doppler/dc_state.h"
 #include "sim/envisat_level0_writer.h"
+#include "sim/palsar_writer.h"
 #include "sim/raw_scene.h"
 
 namespace support {
@@ -57,6 +58,10 @@ SceneDescription envisatScene(const AsarSimConfig& cfg, int lines, int samples, 
 // "orbit_dir". false with the message on failure.
 bool simulateEnvisat(const SceneDescription& scene, const AsarSimConfig& cfg, const std::string& folder,
                      SensorScene& out, std::string& error);
+
+// The example orbit with the PALSAR instrument of `cfg` (L band, mode,
+// layout), clutter and noise, no targets.
+SceneDescription palsarScene(const PalsarSimConfig& cfg, int lines, int samples);
 
 // Value of a key of the [Scene] section of a truth file; NaN when the file
 // or the key is missing.
