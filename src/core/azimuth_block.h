@@ -112,7 +112,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
 // current sub-block (par.t0, par.samples, par.dc): the relative change of
 // the speed per second, from the rate at the sub-block centre, and the
 // beam-centre time of a target before its zero-Doppler time. It is applied (active) where it would move
-// a phase by more than half a degree or a target by more than 0.005 line.
+// a phase by more than a degree and the drift is one an orbit can have.
 struct WKRateDrift {
   bool active = false;
   double alpha = 0.0;    // relative change of the speed per second (half the rate's)

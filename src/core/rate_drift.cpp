@@ -13,10 +13,17 @@ namespace {
 constexpr double kC = consts::kSpeedOfLight;
 constexpr double kPi = consts::kPi;
 
-// Below these the drift of a block is left alone: the phase it would leave
-// on a target (rad) and the position error (lines).
-constexpr double kPhaseGate = 0.5 * kPi / 180.0;
-constexpr double kLineGate = 0.01;
+// Below this phase (rad) that one speed would leave on the first and last
+// rows the drift of a block is left alone: the resampling costs two passes
+// over the block, and near zero Doppler its position error is below a
+// hundredth of a line.
+constexpr double kPhaseGate = 1.0 * kPi / 180.0;
+
+// An orbit changes the speed of the range histories by a few 1e-6 per
+// second; a faster change of the rate polynomial comes from an azimuth
+// trend of the centroid it was taken at (a differently squinted point,
+// not a drift of the speed), and is left alone.
+constexpr double kMaxDrift = 2.5e-5;
 
 // Half length of the band-limited derivative; its Hann taper keeps the
 // response within 1 % of the ideal one up to 0.4 of the sampling rate.
@@ -56,8 +63,7 @@ WKRateDrift wk_rate_drift(const AzimuthBlockPar& par) {
   const double kx = 2.0 * kPi * par.dc / V;
   const double kz = std::sqrt(k0 * k0 - kx * kx);
   const double phase = Rq * kx * kx / kz * delta;
-  const double lines = 2.0 * std::fabs(d.beamLead) * delta * par.prf;
-  d.active = phase > kPhaseGate || lines > kLineGate;
+  d.active = phase > kPhaseGate && std::fabs(d.alpha) < kMaxDrift;
   
   return d;
 }
