@@ -44,6 +44,8 @@ struct AzimuthBlockPar {
   int final = 0;             // 1 = remove the residual k0 offset at the end
   double range0 = 0.0;       // slant range of output sample 0 of the block, m
                              // (0: the range of input sample overlap/2)
+  double fr0y = 0.0;         // change of fr0 per second of azimuth time
+  double fr1y = 0.0;         //   and of fr1
 };
 
 // What focazwk tells its caller about the block it focused.
@@ -101,6 +103,35 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
 // range of the block's first output sample.
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
             const double poly[5], double tref, int block = 0, int blocks = 1);
+
+// Doppler rate that drifts along the azimuth time of a block (fr0y, fr1y):
+// a target's range history follows the equivalent speed of its own beam
+// centre time, so one speed per block leaves a phase that grows with the
+// square of the centroid and a position error that grows with the centroid,
+// both linear in the target's time. wk_rate_drift measures the drift for the
+// current sub-block (par.t0, par.samples, par.dc): the relative change of
+// the speed per second, from the rate at the sub-block centre, and the
+// beam-centre time of a target before its zero-Doppler time. It is applied (active) where it would move
+// a phase by more than a degree and the drift is one an orbit can have.
+struct WKRateDrift {
+  bool active = false;
+  double alpha = 0.0;    // relative change of the speed per second (half the rate's)
+  double beamLead = 0.0; // beam-centre time minus zero-Doppler time, s
+};
+WKRateDrift wk_rate_drift(const AzimuthBlockPar& par);
+
+// Copies `lines` rows of n samples from src (row pitch srcPitch) to dst
+// (pitch dstPitch), resampled along azimuth: row j is read alpha (u^2 -
+// lead^2) / 2 seconds later, u = (j - lines/2) / prf + offset, by a
+// band-limited derivative about each column's absolute centroid
+// centroidHz[i]. With -alpha, offset 0 and lead 0 the echoes of a block look
+// flown at the one speed of its centre row; that leaves a target at
+// zero-Doppler time t0 at t0 + alpha ((t0 - t_c)^2 - lead^2) / 2 (t_c the
+// block centre, lead the beam-centre time before t0), which alpha, the
+// azimuth shift as offset and the lead take back on the focused rows.
+void wk_resample_rows(const fcomplex* src, int srcPitch, fcomplex* dst, int dstPitch, int lines,
+                      int n, double prf, double alpha, double offset, double lead,
+                      const double* centroidHz);
 
 // Transforms the first `used` columns (each `lines` long) of a row-major
 // block of row pitch `pitch` along azimuth, `direction` an FFT direction

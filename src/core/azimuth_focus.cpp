@@ -102,9 +102,15 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   par.scale = 1.0;
   par.reestimate = 0;
   par.prf = prf;
-  par.fr0 = scene.polyFR[0];
-  par.fr1 = scene.polyFR[1];
-  par.fr2 = scene.polyFR[4];
+  // Doppler rate at the scene centre; its azimuth terms (y, x y) follow
+  // the blocks and, within a block, the rows (see multirg).
+  const double* pfr = scene.polyFR;
+  const double yfr = (lines / 2) / prf + files.SlowStartTime - pfr[8];
+  par.fr0y = pfr[2];
+  par.fr1y = pfr[3];
+  par.fr0 = pfr[0] + pfr[2] * yfr;
+  par.fr1 = pfr[1] + pfr[3] * yfr;
+  par.fr2 = pfr[4];
   par.t0 = files.FastStartTime;
   par.trg0 = scene.polyFR[7];
   par.AntennaLength = conf.AntennaLength;
@@ -197,6 +203,9 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     // Doppler centroid of the block as a polynomial in fast time.
     const double yb = (blockLines / 2 + firstLine) / prf + files.SlowStartTime - pdc[8];
     const double poly[5] = {pdc[0] + pdc[2] * yb, pdc[1] + pdc[3] * yb, pdc[4], pdc[5], pdc[6]};
+    const double ybr = (blockLines / 2 + firstLine) / prf + files.SlowStartTime - pfr[8];
+    par.fr0 = pfr[0] + pfr[2] * ybr;
+    par.fr1 = pfr[1] + pfr[3] * ybr;
     par.lines = blockLines;
     par.samples = samples;
     par.data = blockBuf.data();

@@ -525,6 +525,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   const int o = overlap;
   const int nl = par.lines;
   const double t0keep = par.t0;
+  const double fr0keep = par.fr0, fr1keep = par.fr1;
   fcomplex* const blockData = par.data;
   auto dcAt = [&](double x) {
     return poly[0] + poly[1] * x + poly[2] * x * x + poly[3] * x * x * x +
@@ -532,6 +533,8 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   };
   auto restore = [&]() {
     par.t0 = t0keep;
+    par.fr0 = fr0keep;
+    par.fr1 = fr1keep;
     par.data = blockData;
     par.samples = S;
   };
@@ -575,14 +578,35 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   for (int b = 0; b < nsub; ++b) {
     const int f = b * (s - o);
     const int ncopy = std::min(s, S - f);
-#pragma omp parallel for schedule(static)
-    for (int j = 0; j < nl; ++j) {
-      fcomplex* dst = work.data() + static_cast<std::size_t>(j) * s;
-      std::memcpy(dst, blockData + static_cast<std::size_t>(j) * S + f, sizeof(fcomplex) * ncopy);
-      std::fill(dst + ncopy, dst + s, fcomplex(0.0f, 0.0f));
-    }
     par.t0 = t0keep + f / par.frg;
     par.dc = dcAt((s / par.frg) / 2.0 + par.t0 - tref);
+    par.fr0 = fr0keep;
+    par.fr1 = fr1keep;
+    const WKRateDrift drift = wk_rate_drift(par);
+    std::vector<double> centroids;
+    if (drift.active) {
+      // Resampled to the speed of the block's centre row.
+      try {
+        centroids.resize(ncopy);
+        for (int i = 0; i < ncopy; ++i) centroids[i] = dcAt(par.t0 + i / par.frg - tref);
+        wk_resample_rows(blockData + f, S, work.data(), s, nl, ncopy, par.prf, -drift.alpha, 0.0,
+                         0.0, centroids.data());
+      } catch (const std::bad_alloc&) {
+        st = STATUS_NO_MEMORY;
+        break;
+      }
+      for (int j = 0; j < nl; ++j) {
+        fcomplex* dst = work.data() + static_cast<std::size_t>(j) * s;
+        std::fill(dst + ncopy, dst + s, fcomplex(0.0f, 0.0f));
+      }
+    } else {
+#pragma omp parallel for schedule(static)
+      for (int j = 0; j < nl; ++j) {
+        fcomplex* dst = work.data() + static_cast<std::size_t>(j) * s;
+        std::memcpy(dst, blockData + static_cast<std::size_t>(j) * S + f, sizeof(fcomplex) * ncopy);
+        std::fill(dst + ncopy, dst + s, fcomplex(0.0f, 0.0f));
+      }
+    }
 
     // Running range shift: keeps the sub-blocks on one range grid when the
     // reference wavenumber changes from one sub-block to the next.
@@ -621,11 +645,22 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
         st = STATUS_NO_MEMORY;
         break;
       }
+      if (drift.active) {
+        // Targets back at their zero-Doppler times (see wk_resample_rows).
+        wk_resample_rows(work.data() + o / 2, s, blockData + f, S, nl, ncopyBack, par.prf,
+                         drift.alpha, out.aztime, drift.beamLead, centroids.data() + o / 2);
 #pragma omp parallel for schedule(static)
-      for (int j = 0; j < nl; ++j) {
-        const fcomplex* src = work.data() + static_cast<std::size_t>(j) * s + o / 2;
-        fcomplex* dst = blockData + static_cast<std::size_t>(j) * S + f;
-        for (int i = 0; i < ncopyBack; ++i) dst[i] = src[i] * turn[i];
+        for (int j = 0; j < nl; ++j) {
+          fcomplex* dst = blockData + static_cast<std::size_t>(j) * S + f;
+          for (int i = 0; i < ncopyBack; ++i) dst[i] *= turn[i];
+        }
+      } else {
+#pragma omp parallel for schedule(static)
+        for (int j = 0; j < nl; ++j) {
+          const fcomplex* src = work.data() + static_cast<std::size_t>(j) * s + o / 2;
+          fcomplex* dst = blockData + static_cast<std::size_t>(j) * S + f;
+          for (int i = 0; i < ncopyBack; ++i) dst[i] = src[i] * turn[i];
+        }
       }
     }
     if (par.verbose)

@@ -15,6 +15,7 @@
 #include "diag/report.h"
 #include "diag/waitbar.h"
 #include "doppler/dc_driver.h"
+#include "doppler/geometric_rate.h"
 #include "orbit/general_sar_orbit.h"
 #include "orbit/geo_grid.h"
 #include "product/buffer_io.h"
@@ -667,22 +668,11 @@ int ChainRun::dopplerStep() {
       return calledError(st);
 
     ORV_REPORT("GEOMETRIC POLYNOMIALS COMPUTATION", REPORT_CHECKPOINT);
-    GeneralSAROrbit& orbit = rawRecord.orbit();
-    const double tMid = ctx.azimuthStart + 0.5 * ctx.lines / ctx.prf_hz;
-    if (int st = orbit.updatePolys(tMid); st != 0) return calledError(st);
-    const double* pos = orbit.getCurPos();
-    if (!pos) {
-      ORV_REPORT("No orbit state vectors around the scene centre", REPORT_ERROR);
-      return STATUS_BAD_CONDITION;
-    }
-    double fr[3] = {0, 0, 0};
-    if (int st = getgeopoly(tMid, ctx.swstMin, rgSamples, ctx.frg_hz, pos, orbit.getCurT0(),
-                            orbit.dt, ctx.fc_hz, &dcPoly, ctx.lookSign, 3, fr, nullptr, nullptr);
+    if (int st = geometricRatePoly(rawRecord.orbit(), ctx.azimuthStart,
+                                   ctx.azimuthStart + ctx.lines / ctx.prf_hz, ctx.swstMin, rgSamples,
+                                   ctx.frg_hz, ctx.fc_hz, dcPoly, ctx.lookSign, frPoly);
         st != 0)
       return calledError(st);
-    frPoly.c[0] = fr[0];
-    frPoly.c[1] = fr[1];
-    frPoly.c[4] = fr[2];
     if (conf.DeleteTempFiles) removeReported("./DCEST_resume.txt");
   }
   else if (conf.DopplerGiven) {

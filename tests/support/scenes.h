@@ -183,7 +183,16 @@ struct Geometry {
   double nearRange = 830e3;
   int samples = 512;
   int lines = 6792;
+  // Relative change per second of the speed of the targets' range
+  // histories, along their beam-centre time (an orbit's drift, 0 here).
+  double drift = 0.0;
   double lambda() const { return kC / fc; }
+  // Speed of the range history of a target at zero-Doppler time t0 and
+  // closest range R0, reference the scene's middle line.
+  double speedOf(double t0, double R0) const {
+    const double beamCentre = t0 - R0 * std::tan(squint()) / V;
+    return V * (1.0 + drift * (beamCentre - 0.5 * lines / prf));
+  }
   double fastStart() const { return 2.0 * nearRange / kC; }
   double squint() const { return std::asin(lambda() * dc / (2.0 * V)); }
   // Doppler rate of a target seen at beam centre at delay tau.
@@ -229,8 +238,9 @@ inline std::vector<fcomplex> simulate(const Geometry& g, const std::vector<Targe
     bool any = false;
     for (const Target& tg : targets) {
       const double dt = t - tg.t0;
-      const double R = std::sqrt(tg.R0 * tg.R0 + g.V * g.V * dt * dt);
-      const double fd = -2.0 * g.V * g.V * dt / (lam * R);
+      const double V = g.speedOf(tg.t0, tg.R0);
+      const double R = std::sqrt(tg.R0 * tg.R0 + V * V * dt * dt);
+      const double fd = -2.0 * V * V * dt / (lam * R);
       if (std::fabs(fd - g.dc) >= 0.5 * g.prf) continue;
       const double a = tg.amp * g.pattern(fd);
       const double tau = 2.0 * R / kC - g.fastStart();
@@ -291,6 +301,12 @@ inline void fillScene(const Geometry& g, AzimuthFocusFiles& files, AzimuthFocusS
   scene.polyDC[8] = 0.0;
   g.ratePoly(tref, scene.polyFR[0], scene.polyFR[1], scene.polyFR[4]);
   scene.polyFR[7] = tref;
+  // The rate goes with V^2 cos^2(squint) = V^2 - v^2.
+  const double v = g.V * std::sin(g.squint());
+  const double perSecond = 2.0 * g.V * g.V * g.drift / (g.V * g.V - v * v);
+  scene.polyFR[2] = scene.polyFR[0] * perSecond;
+  scene.polyFR[3] = scene.polyFR[1] * perSecond;
+  scene.polyFR[8] = 0.5 * g.lines / g.prf;
 }
 
 // Output pixels (row, col) of the targets, placed in the middle of blocks and
