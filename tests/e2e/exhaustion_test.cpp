@@ -37,7 +37,8 @@ TEST(ErsExhaustion, FullOutputDiskEndsWithAWriteFailureAndLeavesTheInputs) {
   EXPECT_EQ(run.exitStatus, EC_STAGE_FAILED & 0xFF);
   EXPECT_EQ(run.errorCode, EC_STAGE_FAILED) << run.errorFile;
   EXPECT_TRUE(contains(run.log, "File writing failed!")) << run.log;
-  EXPECT_TRUE(contains(run.log, "status 5")) << run.log;
+  // Status 5 of the raster writer, with the raster named in the trace.
+  EXPECT_TRUE(contains(run.trace, "Raster file: " + (dir / "out.extracted"))) << run.trace;
   EXPECT_EQ(contents(files), before);
   EXPECT_FALSE(fs::exists(dir / "out_slc"));
 }

@@ -2,6 +2,7 @@
 
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <fstream>
@@ -60,6 +61,7 @@ std::string scratchDir(const std::string& tag) {
   const auto* info = ::testing::UnitTest::GetInstance()->current_test_info();
   std::string name = "tessivor_" + tag + "_" + std::to_string(::getpid());
   if (info) name += std::string("_") + info->test_suite_name() + "_" + info->name();
+  std::replace(name.begin(), name.end(), '/', '_');  // parameterised tests: one folder, not a tree
   fs::path dir = fs::path(::testing::TempDir()) / name;
   for (int n = 2; fs::exists(dir); ++n) dir = fs::path(::testing::TempDir()) / (name + "_" + std::to_string(n));
   fs::create_directories(dir);
