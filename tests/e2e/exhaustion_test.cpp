@@ -47,8 +47,8 @@ TEST(ErsExhaustion, FullOutputDiskEndsWithAWriteFailureAndLeavesTheInputs) {
 // more, smaller blocks, the same product.
 TEST(HeavyErsExhaustion, SixtyFourMegabyteBudgetFocusesAFullSwathScene) {
   TempFolder dir("memory");
-  SceneDescription scene = ersScene(6144, 5616, 200.0);
-  scene.pixelTargets = {{3000.5, 400.25, 0.0, 4.0}, {3100.0, 2800.5, 60.0, 4.0}, {3200.25, 5000.0, 0.0, 4.0}};
+  SceneDescription scene = ersScene(4096, 5616, 200.0);
+  scene.pixelTargets = {{1700.5, 400.25, 0.0, 4.0}, {2000.0, 2800.5, 60.0, 4.0}, {2300.25, 4500.0, 0.0, 4.0}};
   SensorScene files;
   std::string error;
   ASSERT_TRUE(simulateErs(scene, dir.str(), files, error)) << error;
