@@ -56,6 +56,9 @@ const DamageCase kCases[] = {
      EC_STAGE_FAILED, "File not opened!"},
 };
 
+// The row's name in test listings (not the bytes of the case).
+void PrintTo(const DamageCase& c, std::ostream* os) { *os << c.name; }
+
 class DamagedErsInput : public testing::TestWithParam<DamageCase> {};
 
 }  // namespace
