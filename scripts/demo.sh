@@ -7,6 +7,8 @@
 # and a PNG quicklook.
 #   scripts/demo.sh [BUILD_DIR [DEMO_DIR]]   (make demo builds first, then runs it;
 #                                             DEMO_DIR defaults to BUILD_DIR/demo)
+# DEMO_RUNNER, when set, is put before the focuser's command (for instance
+# "valgrind --error-exitcode=99" for a memory-checked run).
 set -euo pipefail
 
 BUILD=$(cd "${1:-build}" && pwd)
@@ -111,7 +113,7 @@ status=0
   TESSIVOR_WORKING_FILE="$DEMO/work/progress.txt" \
   TESSIVOR_CEOS_DES_FILES_DIR="$DEMO/resources/" \
   TESSIVOR_TRACING=ACTIVE \
-    "$BIN/stripmap_focuser" "main_focussing_stripmap#$JOB" > "$DEMO/work/console.txt" 2>&1
+    ${DEMO_RUNNER:-} "$BIN/stripmap_focuser" "main_focussing_stripmap#$JOB" > "$DEMO/work/console.txt" 2>&1
 ) || status=$?
 if [ "$status" -ne 0 ] || [ -e "$DEMO/work/progress.txt_error" ]; then
   echo "demo: the focuser failed (exit status $status); see $DEMO/work/Process.log:" >&2

@@ -4,7 +4,8 @@
 set -euo pipefail
 packages=(build-essential cmake pkg-config libfftw3-dev libxml2-dev libxml2-utils
           libexpat1-dev libtiff-dev libgeotiff-dev googletest libgtest-dev libgmock-dev
-          libbenchmark-dev gdal-bin python3)
+          libbenchmark-dev gdal-bin python3
+          clang-14 libfuzzer-14-dev valgrind)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")

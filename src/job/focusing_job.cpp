@@ -142,6 +142,11 @@ int stripmapFocuserEntry(int argc, char** argv) {
       // A profile that does not fit in memory ends the run at once.
       std::fputs(e.what(), stderr);
       std::exit(1);
+    } catch (const ProfileCheckError& e) {
+      // So does a checked profile call that failed.
+      std::fputs(e.what(), stderr);
+      std::fflush(stderr);
+      std::exit(1);
     } catch (const orvaneException& e) {
       TESV_FATAL(EC_STAGE_FAILED, e.getMessage() + " (" + e.getFile() + ", " + e.getFunction() +
                                       ", line " + std::to_string(e.getLine()) + ")");

@@ -98,6 +98,9 @@ void tesv_description_field::reset(int newShape, int newType) {
   subFields.clear();
 }
 
+tesv_description_field::tesv_description_field() = default;
+tesv_description_field::tesv_description_field(std::string fieldName) : name(std::move(fieldName)) {}
+
 void tesv_description_field::setInt(long long value) {
   reset(FS_SCALAR, FT_INTEGER);
   ints.push_back(value);

@@ -33,8 +33,9 @@ class tesv_description_section;
 
 class tesv_description_field {
  public:
-  tesv_description_field() = default;
-  explicit tesv_description_field(std::string fieldName) : name(std::move(fieldName)) {}
+  // Out of line: the members hold vectors of sections, complete only below.
+  tesv_description_field();
+  explicit tesv_description_field(std::string fieldName);
 
   // Setters replace shape, type and values.
   void setInt(long long value);

@@ -669,7 +669,7 @@ int OtherInfo_kelmir::writehdr_kelmir(tesv_description_section& header) {
 int OtherInfo_kelmir::readhdr_kelmir(const tesv_description_section& header) {
   take(header, "InitialGeometry.TimeDirectionLines", TimeDirectionLines);
   for (const auto& [key, member] : kLookValues)
-    std::visit([&](auto value) { take(header, key, this->*value); }, member);
+    std::visit([&, name = key](auto value) { take(header, name, this->*value); }, member);
   gsmReport("result", "section", "section closed", "WARNING");
   return STATUS_OK;
 }

@@ -336,11 +336,7 @@ int stringArray(const char* who, const std::string& section, const std::string& 
   return kFail;
 }
 
-[[noreturn]] void checkFailed(const std::string& message) {
-  std::fputs(message.c_str(), stderr);
-  std::fflush(stderr);
-  std::exit(1);
-}
+[[noreturn]] void checkFailed(const std::string& message) { throw ProfileCheckError(message); }
 
 }  // namespace
 

@@ -25,6 +25,14 @@ class ProfileMemoryError : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
+// A checked call (GetCheck..., WriteCheck...) that failed. The message is the
+// "Error in ..." text the program prints on the error stream before it ends
+// with status 1; the job driver does both.
+class ProfileCheckError : public std::runtime_error {
+ public:
+  using std::runtime_error::runtime_error;
+};
+
 // ---- core ----------------------------------------------------------------
 
 // mode 0 reads, mode 1 writes `value`. Returns the stored value (owned by the
@@ -136,8 +144,8 @@ int WriteMyProfileDouble(const std::string& section, const std::string& key, dou
                          const std::string& file);
 
 // ---- checked twins -----------------------------------------------------------
-// Same arguments; on failure they print "Error in ..." on stderr and end the
-// process with exit status 1. On success they return 0.
+// Same arguments; on failure they throw ProfileCheckError with the
+// "Error in ..." text. On success they return 0.
 
 int GetCheckMyProfileString(const std::string& section, const std::string& key, std::string& dst,
                             const std::string& file);

@@ -7,7 +7,11 @@
 #include "product/profile.h"
 
 int roundHalfAway(double x) {
-  return static_cast<int>(x > 0.0 ? std::floor(x + 0.5) : std::ceil(x - 0.5));
+  // Saturates outside the int range (NaN gives 0): times and deltas of a
+  // damaged header must not make the conversion undefined.
+  const double r = x > 0.0 ? std::floor(x + 0.5) : std::ceil(x - 0.5);
+  if (!(r == r)) return 0;
+  return static_cast<int>(std::clamp(r, -2147483648.0, 2147483647.0));
 }
 
 ROI_Obj::ROI_Obj() { createElementsVector(8); }

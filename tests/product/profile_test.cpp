@@ -296,4 +296,20 @@ TEST_F(ProfileTest, LargeValuesAndFiles) {
   EXPECT_EQ(k, 299);
 }
 
+// A checked call that fails throws the "Error in ..." text the job driver
+// prints before the run ends with status 1; no process exit in the library.
+TEST_F(ProfileTest, CheckedCallFailureIsAnError) {
+  const std::string f = path("checked.hdr");
+  ASSERT_EQ(WriteMyProfileString("S", "k", "1", f), 0);
+  std::string value;
+  EXPECT_EQ(GetCheckMyProfileString("S", "k", value, f), 0);
+  try {
+    GetCheckMyProfileString("S", "absent", value, f);
+    FAIL() << "no error";
+  } catch (const ProfileCheckError& e) {
+    EXPECT_EQ(std::string(e.what()),
+              "Error in GetMyProfileString: section S, key absent, file " + f + "\n");
+  }
+}
+
 }  // namespace

@@ -79,6 +79,12 @@ FocuserRun runFocuser(const std::string& folder, const std::string& jobFile, con
     for (const auto& [name, value] : variables)
       if (!value.empty()) setenv(name.c_str(), value.c_str(), 1);
     if (chdir(folder.c_str()) != 0) _exit(126);
+    if (options.fileSizeLimit > 0) {
+      // A write past the limit fails with EFBIG instead of killing the process.
+      signal(SIGXFSZ, SIG_IGN);
+      const rlimit limit{rlim_t(options.fileSizeLimit), rlim_t(options.fileSizeLimit)};
+      setrlimit(RLIMIT_FSIZE, &limit);
+    }
     const int fd = open(console.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0644);
     if (fd >= 0) {
       dup2(fd, STDERR_FILENO);

@@ -56,6 +56,7 @@ struct RunOptions {
   std::string command;           // "main_focussing_stripmap#" + job file when empty
   bool hostVariables = true;     // set the TESSIVOR_* variables of a host
   std::map<std::string, std::string> variables;  // then these (an empty value unsets)
+  long long fileSizeLimit = 0;   // > 0: no file of the run grows past it (a full disk)
 };
 
 // Runs the focuser on `jobFile` with `folder` (ending with '/') as working

@@ -98,6 +98,7 @@ int fbaq_decode84_f(const unsigned char* data, float* out, int bytes, int sample
       // The last block holds only the samples left; a padding byte that
       // rounds it to an even length is never decoded.
       const int n = b < full ? 63 : tailSamples;
+      if (n == 0) break;  // whole blocks only: no tail block, no code byte to read
       const float* ci = tI + p[0];
       const float* cq = tQ + p[0];
       for (int k = 0; k < n; ++k) {

@@ -245,6 +245,15 @@ int ATERSExtractor::readImage() {
   rawData.rasterName = OutputFile;
 
   const std::size_t recordBytes = kRecordPrefix + 2 * std::size_t(samples);
+  // A damaged descriptor can claim lines of millions of samples: the first
+  // record must be in the file before its buffers are made.
+  const std::streampos afterDescriptor = in.tellg();
+  in.seekg(0, std::ios::end);
+  const std::streamoff fileBytes = in.tellg();
+  in.seekg(afterDescriptor);
+  if (!in || fileBytes < std::streamoff(kImageDescriptor) + std::streamoff(recordBytes))
+    return ERS_FAIL("File reading failed! " + ImgFilename + ": record 1 is missing or short",
+                    STATUS_READ_FAILED);
   std::vector<unsigned char> record;
   std::vector<float> row;
   try {

@@ -2,6 +2,7 @@
 // DEOS orbit arcs by their head.
 #include "ingest/ers/ers_types.h"
 
+#include <cmath>
 #include <fstream>
 
 #include "ingest/ceos/ceos_fields.h"
@@ -102,7 +103,11 @@ int ErsTypes::read_roi(ROI_Obj* roi) const {
       FtoDouble(far.data(), dss::kLastRangeTimeMs.width) / 1000.0 - roi->FastStartTime;
   // Kept as the archive tool has it: this region serves time look-ups only.
   roi->FastTimeDelta = (1.0 / FtoDouble(rate.data(), dss::kSamplingRateMHz.width)) * 1000000.0;
-  roi->Lines = roundHalfAway(roi->SlowTimeLength / roi->SlowTimeDelta);
-  roi->Samples = roundHalfAway(roi->FastTimeLength / roi->FastTimeDelta);
+  // Damaged times or rates give counts no scene has: the leader is refused.
+  const double lines = roi->SlowTimeLength / roi->SlowTimeDelta;
+  const double samples = roi->FastTimeLength / roi->FastTimeDelta;
+  if (!(std::fabs(lines) < 1e9) || !(std::fabs(samples) < 1e9)) return 0;
+  roi->Lines = roundHalfAway(lines);
+  roi->Samples = roundHalfAway(samples);
   return 1;
 }
