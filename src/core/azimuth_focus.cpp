@@ -47,6 +47,44 @@ int azimuth_block_plan(int lines, int linesInBlock, int halfOverlap, AzimuthBloc
   return STATUS_OK;
 }
 
+int azimuth_overlap_from_scene(const AzimuthFocusFiles& files, const AzimuthFocusScene& scene,
+                               const AzimuthFocusConf& conf, double veq, double dcref) {
+  const double prf = files.prf_hz, frg = files.frg_hz;
+  const double lambda = kC / files.fc_hz;
+  // Doppler rate 2 V^2 / (lambda R): slowest, so the aperture longest, at
+  // the far range.
+  const auto rate = [&](double fastTime) { return 2.0 * veq * veq / (lambda * kC / 2.0 * fastTime); };
+  const double farTime = files.FastStartTime + (scene.samples - 1) / frg;
+  // The processed band: the look band, or the beam's own Doppler band where
+  // that is narrower, never more than the sampled one.
+  double band = conf.AzimuthLookBandwidth > 0.0 ? conf.AzimuthLookBandwidth : prf;
+  if (conf.AntennaLength > 0.0) band = std::min(band, 2.0 * veq / conf.AntennaLength);
+  band = std::min(band, prf);
+  const double aperture = band / rate(farTime) * prf;
+
+  // The centroid is linear in azimuth time at each range: its extremes lie on
+  // the first and last lines. Range is sampled finely enough for the
+  // polynomial's low degree.
+  const double* pdc = scene.polyDC;
+  double walk = 0.0;
+  constexpr int kRanges = 32;
+  for (int i = 0; i <= kRanges; ++i) {
+    const double fastTime = files.FastStartTime + (scene.samples - 1) / frg * i / kRanges;
+    const double x = fastTime - pdc[7];
+    for (const double slowTime : {files.SlowStartTime, files.SlowStartTime + (scene.lines - 1) / prf}) {
+      const double y = slowTime - pdc[8];
+      const double dc = pdc[0] + pdc[1] * x + pdc[2] * y + pdc[3] * x * y + pdc[4] * x * x +
+                        pdc[5] * x * x * x + pdc[6] * x * x * x * x;
+      walk = std::max(walk, std::fabs(dc - dcref) / rate(fastTime) * prf);
+    }
+  }
+  // A wild centroid polynomial gives an overlap that no block holds: it is
+  // bounded here so that the block plan reports it.
+  const double lines = aperture + 2.0 * walk;
+  const int full = lines < 1e9 ? static_cast<int>(std::ceil(lines)) : 1000000000;
+  return full + (full % 2);
+}
+
 void azimuth_focus_shifts(const AzimuthFocusConf& conf, int lines, int samples, double squint,
                           double Req, double Veq, double prf_hz, double frg_hz, double& azShift,
                           double& rgShift) {
@@ -148,8 +186,11 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   // kernels' residual wavenumber offset.
   par.range0 = kC / 2.0 * (conf.RangeOverlap / frg + files.FastStartTime - rgShift);
 
+  const int halfOverlap = conf.AzimuthOverlapFromScene != 0
+                              ? azimuth_overlap_from_scene(files, scene, conf, par.Veq, par.dcref) / 2
+                              : conf.AzimuthOverlap;
   AzimuthBlockPlan plan;
-  st = azimuth_block_plan(lines, conf.LinesInBlock, conf.AzimuthOverlap, plan);
+  st = azimuth_block_plan(lines, conf.LinesInBlock, halfOverlap, plan);
   if (st != 0) return st;
   const int A = plan.overlap;
   const int fullRg = 2 * conf.RangeOverlap;
@@ -243,7 +284,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   scene.outSamples = outSamples;
   scene.outLines = std::max(0, lines - A);
   scene.firstSampleTime = conf.RangeOverlap / frg + files.FastStartTime - rgShift;
-  scene.firstLineTime = conf.AzimuthOverlap / prf + files.SlowStartTime + azShift;
+  scene.firstLineTime = halfOverlap / prf + files.SlowStartTime + azShift;
   std::copy(scene.polyDC, scene.polyDC + 9, scene.polyDCOut);
   std::copy(scene.polyFR, scene.polyFR + 9, scene.polyFROut);
   return STATUS_OK;

@@ -64,6 +64,9 @@ struct AzimuthFocusConf {
   int LinesInBlock = 0;
   int RangeOverlap = 0;    // half of the full range overlap
   int AzimuthOverlap = 0;  // half of the full azimuth overlap
+  // Non-zero: the overlap is azimuth_overlap_from_scene's, AzimuthOverlap
+  // is not used.
+  int AzimuthOverlapFromScene = 0;
   double ApplyAzShift = 0.0;
   double ApplyRgShift = 0.0;
 };
@@ -83,6 +86,15 @@ struct AzimuthBlockPlan {
 };
 // 1 when LinesInBlock is not larger than the full overlap.
 int azimuth_block_plan(int lines, int linesInBlock, int halfOverlap, AzimuthBlockPlan& plan);
+
+// Full azimuth overlap in lines (even) that the blocks of this scene need:
+// one aperture of the processed Doppler band at the far range, plus on each
+// side the largest distance between a target's focused line and the centre
+// of its echo, (centroid - dcref) / Doppler rate, over the scene. veq is the
+// equivalent speed of the scene (m/s), dcref the kernels' reference
+// centroid (Hz), whose offset the azimuth shift of the product carries.
+int azimuth_overlap_from_scene(const AzimuthFocusFiles& files, const AzimuthFocusScene& scene,
+                               const AzimuthFocusConf& conf, double veq, double dcref);
 
 // Shifts in seconds (azimuth, range) as azimuthfoc applies them, with the
 // scene's central squint and equivalent geometry.

@@ -269,6 +269,7 @@ AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, doubl
   ac.AzimuthTransitionBandwidth = conf.AzimuthTransitionBandwidth * prf;
   ac.RangeOverlap = conf.RangeOverlap;
   ac.AzimuthOverlap = conf.AzimuthOverlap;
+  ac.AzimuthOverlapFromScene = conf.AzimuthOverlapFromScene;
   return ac;
 }
 
@@ -393,6 +394,8 @@ int SARFocuser_conf::readconf(const std::string& file) {
     readInt(file, a, "AzimuthOverlap", v);
     AzimuthOverlap = v / 2;
   }
+  AzimuthOverlapFromScene = 0;
+  readInt(file, a, "AzimuthOverlapFromScene", AzimuthOverlapFromScene);
 
   const std::string g = "GeneralProcessingConf";
   Flag_rangefoc = 1;

@@ -71,6 +71,9 @@ struct SARFocuser_conf {
   int SamplesInBlock = 0;
   int RangeOverlap = 0;    // halved at reading
   int AzimuthOverlap = 0;  // halved at reading
+  // 1: the azimuth overlap is derived from the scene's aperture and
+  // centroid walk, and AzimuthOverlap is not used.
+  int AzimuthOverlapFromScene = 0;
   int PerformInterpolation = 0;
   double StoltPadding = 0.0;
   double ApplyAzShift = 0.0;  // 1.0: the whole image

@@ -14,11 +14,13 @@ TEST(HeavyErsFrame, TwoAzimuthBlocksWithANegativeCentroid) {
   SceneDescription scene = ersScene(10240, 5616, -450.0);
   scene.mission = "ERS1";
   scene.sceneDir = "ERS1_SIM";
-  // The first block keeps raw lines 1280 to 6911, the second the rest:
-  // targets on both sides of the seam, across the swath.
-  scene.pixelTargets = {{3000.5, 300.25, 0.0, 4.0},    {6890.25, 1200.5, 0.0, 4.0},
-                        {6905.0, 2300.75, 80.0, 4.0},  {6918.75, 3400.0, 0.0, 4.0},
-                        {6935.5, 4500.25, 0.0, 4.0},   {8000.0, 4700.5, 150.0, 4.0},
+  // The profile derives the overlap from the scene: one aperture plus the
+  // centroid's spread, 1152 lines here. The first block keeps raw lines 576
+  // to 7615, the second the rest: targets on both sides of the seam, across
+  // the swath.
+  scene.pixelTargets = {{3000.5, 300.25, 0.0, 4.0},    {7594.25, 1200.5, 0.0, 4.0},
+                        {7609.0, 2300.75, 80.0, 4.0},  {7622.75, 3400.0, 0.0, 4.0},
+                        {7639.5, 4500.25, 0.0, 4.0},   {8000.0, 4700.5, 150.0, 4.0},
                         {8200.25, 2000.0, 0.0, 4.0}};
   SensorScene files;
   std::string error;
@@ -34,7 +36,12 @@ TEST(HeavyErsFrame, TwoAzimuthBlocksWithANegativeCentroid) {
 
   GeneralSAR record;
   ASSERT_EQ(record.GSread(dir / "out_slc.TessivorParameterExtracted"), 0);
-  EXPECT_EQ(record.roi.roi.Lines, 10240 - 2560);
+  // Shorter than the fixed 2560 lines sized for the worst centroid, longer
+  // than one aperture (about 1120 lines at the far range).
+  const int overlap = 10240 - record.roi.roi.Lines;
+  EXPECT_EQ(overlap % 2, 0);
+  EXPECT_GT(overlap, 1120);
+  EXPECT_LT(overlap, 2560);
   const PtaReport pta = analyseProduct(dir.str(), dir / "out_slc", dir / "out_slc.TessivorParameterExtracted", files.truth);
   expectTheoreticalResponses(pta, scene.pixelTargets.size());
   expectTruthPositions(pta);

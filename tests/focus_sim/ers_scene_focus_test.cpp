@@ -155,6 +155,7 @@ TEST_F(ErsSceneFocus, ChainErasesEachInputOnceItsStageHasUsedIt) {
   ASSERT_EQ(conf.readconf(TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr"), 0);
   conf.SamplesInBlock = 512;
   conf.RangeOverlap = 16;
+  conf.AzimuthOverlapFromScene = 0;  // the fixed overlap of the profile
   SARFocuser chain(&conf);
   chain.RawDataFile = working_ + "out.extracted";
   chain.ChirpFile = working_ + "out.chirp";
@@ -166,7 +167,7 @@ TEST_F(ErsSceneFocus, ChainErasesEachInputOnceItsStageHasUsedIt) {
   EXPECT_TRUE(std::filesystem::exists(working_ + "out"));
   GeneralSAR slc;
   ASSERT_EQ(slc.GSread(working_ + "out.hdr"), 0);
-  EXPECT_EQ(slc.dataFile.NrOfLinesPerImage, 3072 - 2560);
+  EXPECT_EQ(slc.dataFile.NrOfLinesPerImage, 3072 - 2 * conf.AzimuthOverlap);
   EXPECT_EQ(slc.dataFile.NrOfPixelsPerLine, 1536 - sim.replicaLength() + 1 - 2 * conf.RangeOverlap);
 }
 
