@@ -46,7 +46,9 @@ double FtoDouble2(const char* text, int length) {
   int exponent = 0;
   for (int i = letter + 2; i < length; ++i) {
     if (text[i] < '0' || text[i] > '9') break;
-    exponent = exponent * 10 + (text[i] - '0');
+    // Beyond any double's range the scale is infinite anyway; stop before the
+    // exponent itself overflows on a damaged field.
+    if (exponent < 100000) exponent = exponent * 10 + (text[i] - '0');
   }
   const double scale = std::pow(10.0, exponent);
   return text[letter + 1] == '+' ? mantissa * scale : mantissa / scale;
@@ -59,6 +61,7 @@ int ch2int(const char* text, int length) {
     if (ch == ' ') break;
     if (ch == '-') return static_cast<int>(-value);
     if (ch >= '0' && ch <= '9') {
+      if (place > 100000000000000000L) break;  // more digits than any field holds: damaged
       value += (ch - '0') * place;
       place *= 10;
     }
