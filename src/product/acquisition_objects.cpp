@@ -203,6 +203,21 @@ int SARPulse_Obj::generateChirp(std::vector<fcomplex>& buffer) const {
   return generateChirp(buffer.data());
 }
 
+int writeReplicaRaster(const std::string& file, const fcomplex* samples, int count) {
+  DataFile raster(file);
+  raster.NrOfPixelsPerLine = count;
+  raster.NrOfLinesPerImage = 1;
+  raster.RowPrefix = 0;
+  raster.HeaderOffset = 0;
+  raster.CellType = FLOAT_COMPLEX;
+  BufferIO io{.file = &raster, .first_column = 0, .columns = count, .first_row = 0, .rows = 1};
+  int status = io.writebuffer(samples);
+  const int closeStatus = raster.close();
+  if (status == 0) status = closeStatus;
+  if (status == 0) status = raster.write_hdr();
+  return status;
+}
+
 int SARPulse_Obj::writeChirp(const std::string& file) const {
   std::vector<fcomplex> chirp;
   const int made = generateChirp(chirp);
@@ -211,18 +226,7 @@ int SARPulse_Obj::writeChirp(const std::string& file) const {
     ORV_REPORT("Bad pulse parameters for the replica of " + file, REPORT_ERROR);
     return STATUS_BAD_PARAMETER;
   }
-  DataFile raster(file);
-  raster.NrOfPixelsPerLine = static_cast<int>(chirp.size());
-  raster.NrOfLinesPerImage = 1;
-  raster.RowPrefix = 0;
-  raster.HeaderOffset = 0;
-  raster.CellType = FLOAT_COMPLEX;
-  BufferIO io{.file = &raster, .first_column = 0, .columns = raster.NrOfPixelsPerLine,
-               .first_row = 0, .rows = 1};
-  int status = io.writebuffer(chirp.data());
-  const int closeStatus = raster.close();
-  if (status == 0) status = closeStatus;
-  if (status == 0) status = raster.write_hdr();
+  const int status = writeReplicaRaster(file, chirp.data(), static_cast<int>(chirp.size()));
   if (status != 0) ORV_REPORT_CALLED_ERROR();
   return status;
 }

@@ -34,6 +34,10 @@ class SamplingConstants_Obj : public GeneralSAR_Base {
   double lambda_m = -999.0;  // wavelength
 };
 
+// Writes a replica as a one-line complex float raster with its header;
+// 0 or the raster's status.
+int writeReplicaRaster(const std::string& file, const fcomplex* samples, int count);
+
 class SARPulse_Obj : public GeneralSAR_Base {
  public:
   SARPulse_Obj();

@@ -19,6 +19,7 @@
 #include "ingest/ceos/ceos_fields.h"
 #include "ingest/palsar/palsar_ceos_layout.h"
 #include "orbit/general_sar_orbit.h"
+#include "product/acquisition_objects.h"
 #include "product/buffer_io.h"
 #include "product/data_file.h"
 #include "product/time_base.h"
@@ -533,23 +534,7 @@ int ATPalExtractor::write_chirp(const std::string& header, const std::string& ou
   std::vector<fcomplex> chirp;
   if (int st = extract_chirp(channel, chirp); st != 0) return PAL_CALLED(st);
   const std::string name = numberOfChannels > 1 ? out + std::to_string(channel + 1) : out;
-  DataFile raster(name);
-  raster.NrOfPixelsPerLine = static_cast<int>(chirp.size());
-  raster.NrOfLinesPerImage = 1;
-  raster.RowPrefix = 0;
-  raster.HeaderOffset = 0;
-  raster.CellType = FLOAT_COMPLEX;
-  BufferIO io;
-  io.file = &raster;
-  io.first_column = 0;
-  io.columns = raster.NrOfPixelsPerLine;
-  io.first_row = 0;
-  io.rows = 1;
-  io.memory_type = FLOAT_COMPLEX;
-  int status = io.writebuffer(chirp.data());
-  const int closed = raster.close();
-  if (status == 0) status = closed;
-  if (status == 0) status = raster.write_hdr();
+  const int status = writeReplicaRaster(name, chirp.data(), static_cast<int>(chirp.size()));
   if (status != 0) return PAL_CALLED(status);
   return 0;
 }

@@ -21,6 +21,7 @@
 #include "ingest/radarsat/radarextract_params.h"
 #include "ingest/radarsat/radarsat_format.h"
 #include "orbit/general_sar_orbit.h"
+#include "product/acquisition_objects.h"
 #include "product/buffer_io.h"
 #include "product/data_file.h"
 #include "product/time_base.h"
@@ -290,24 +291,7 @@ int radarextract::readLeaderVectors(const std::string& leader) {
 }
 
 int radarextract::writeChirp(const std::vector<float>& replica, int samples) {
-  ::DataFile raster(OutputChirpFile);
-  raster.NrOfPixelsPerLine = samples;
-  raster.NrOfLinesPerImage = 1;
-  raster.RowPrefix = 0;
-  raster.HeaderOffset = 0;
-  raster.CellType = FLOAT_COMPLEX;
-  BufferIO io;
-  io.file = &raster;
-  io.first_column = 0;
-  io.columns = samples;
-  io.first_row = 0;
-  io.rows = 1;
-  io.memory_type = FLOAT_COMPLEX;
-  int status = io.writebuffer(replica.data());
-  const int closed = raster.close();
-  if (status == 0) status = closed;
-  if (status == 0) status = raster.write_hdr();
-  return status;
+  return writeReplicaRaster(OutputChirpFile, reinterpret_cast<const fcomplex*>(replica.data()), samples);
 }
 
 int radarextract::openProduct(std::ifstream& in, int& source, int& records, int& recordLength) {
