@@ -72,50 +72,63 @@ inline double roundHalfAway(double x) {
 
 inline fcomplex scaled(fcomplex x, float f) { return fcomplex(x.real() * f, x.imag() * f); }
 
-// Four floats: two complex samples.
-typedef float V4 __attribute__((vector_size(16)));
+// Eight floats: four complex samples.
+typedef float V8 __attribute__((vector_size(32)));
 struct Lanes {
-  V4 v;
+  V8 v;
 };
 
-// The least-squares filter table laid out for two taps per vector: for taps
-// 2p and 2p+1 of a row, (re, re, re', re') and (im, -im, im', -im'); rows of
-// an odd tap count end with a zero tap. Multiplied lane by lane with two
-// interleaved complex samples, the first gives (h.re s.re, h.re s.im) and the
-// second (h.im s.re, -h.im s.im): the sums of the lanes in the right places
-// make the complex product, so a tap pair costs two vector products.
-struct PairedTaps {
-  int pairs = 0;
+// The least-squares filter table laid out for four taps per vector: for
+// taps 4p .. 4p+3 of a row, (re, re, re', re', ...) and (im, -im, im', -im',
+// ...); rows whose tap count is not a multiple of four end with zero taps.
+// Multiplied lane by lane with four interleaved complex samples, the first
+// gives (h.re s.re, h.re s.im) and the second (h.im s.re, -h.im s.im) per
+// tap: the sums of the lanes in the right places make the complex product,
+// so four taps cost two vector products (two fused products and sums where
+// the processor has them).
+struct QuadTaps {
+  int quads = 0;
   std::vector<Lanes> re, im;
   void make(const std::vector<fcomplex>& table, int rows, int taps) {
-    pairs = (taps + 1) / 2;
-    re.assign(static_cast<std::size_t>(rows) * pairs, Lanes{V4{0.0f, 0.0f, 0.0f, 0.0f}});
-    im.assign(re.size(), Lanes{V4{0.0f, 0.0f, 0.0f, 0.0f}});
+    quads = (taps + 3) / 4;
+    const V8 zero = {0.0f, 0.0f, 0.0f, 0.0f, 0.0f, 0.0f, 0.0f, 0.0f};
+    re.assign(static_cast<std::size_t>(rows) * quads, Lanes{zero});
+    im.assign(re.size(), Lanes{zero});
     for (int r = 0; r < rows; ++r)
       for (int m = 0; m < taps; ++m) {
         const fcomplex h = table[static_cast<std::size_t>(r) * taps + m];
-        V4& a = re[static_cast<std::size_t>(r) * pairs + m / 2].v;
-        V4& b = im[static_cast<std::size_t>(r) * pairs + m / 2].v;
-        const int lane = 2 * (m % 2);
+        V8& a = re[static_cast<std::size_t>(r) * quads + m / 4].v;
+        V8& b = im[static_cast<std::size_t>(r) * quads + m / 4].v;
+        const int lane = 2 * (m % 4);
         a[lane] = a[lane + 1] = h.real();
         b[lane] = h.imag();
         b[lane + 1] = -h.imag();
       }
   }
-  // sum over the taps of row r of h[m] s[m]; reads 2 pairs samples of s.
-  fcomplex apply(int r, const fcomplex* s) const {
-    const Lanes* a = re.data() + static_cast<std::size_t>(r) * pairs;
-    const Lanes* b = im.data() + static_cast<std::size_t>(r) * pairs;
-    V4 p{0.0f, 0.0f, 0.0f, 0.0f}, q{0.0f, 0.0f, 0.0f, 0.0f};
-    for (int m = 0; m < pairs; ++m) {
-      V4 x;
-      std::memcpy(&x, s + 2 * m, sizeof x);
+  // Samples each row of taps reads: a whole number of quads.
+  int span() const { return 4 * quads; }
+  // sum over the taps of row r of h[m] s[m]; reads span() samples of s.
+  __attribute__((always_inline)) fcomplex apply(int r, const fcomplex* s) const {
+    const Lanes* a = re.data() + static_cast<std::size_t>(r) * quads;
+    const Lanes* b = im.data() + static_cast<std::size_t>(r) * quads;
+    V8 p = {0.0f, 0.0f, 0.0f, 0.0f, 0.0f, 0.0f, 0.0f, 0.0f}, q = p;
+    for (int m = 0; m < quads; ++m) {
+      V8 x;
+      std::memcpy(&x, s + 4 * m, sizeof x);
       p += a[m].v * x;
       q += b[m].v * x;
     }
-    return fcomplex(p[0] + p[2] + q[1] + q[3], p[1] + p[3] + q[0] + q[2]);
+    return fcomplex(((p[0] + p[2]) + (p[4] + p[6])) + ((q[1] + q[3]) + (q[5] + q[7])),
+                    ((p[1] + p[3]) + (p[5] + p[7])) + ((q[0] + q[2]) + (q[4] + q[6])));
   }
 };
+
+// Whether this processor runs the wide (AVX2 and FMA) form of the row
+// kernels.
+bool wideRows() {
+  static const bool wide = __builtin_cpu_supports("avx2") && __builtin_cpu_supports("fma");
+  return wide;
+}
 
 // What both kernels derive from the block record before the row loop.
 struct StoltGrid {
@@ -277,6 +290,113 @@ double gainOf(bool active, const std::vector<double>& rowN, const std::vector<do
   }
   return D > 0.0 ? std::sqrt(N / D) : 1.0;
 }
+
+// What the least-squares Stolt kernel needs for one row of a block, and
+// the row itself. The row is compiled twice, plain and with AVX2 and FMA
+// (the vectors of the tap sums, the square roots and the phasors are twice
+// as wide there); a processor runs one of the two for every row, so the
+// product does not depend on the number of threads.
+struct LSRows {
+  const StoltGrid& grid;
+  const WKWeighting& wt;
+  const QuadTaps& taps;
+  const FFTPlan& rowFwd;
+  const FFTPlan& inv;
+  const fcomplex* data;
+  const double* kin;
+  const double* rwin;  // null without range window
+  const double* kx;
+  const double* kx2;
+  const fcomplex* back;
+  int ns, padded, M, n, H, guard, band0, band1, conj;
+  bool weighted;
+  float scale;
+  double kis, kie, dki, kzc, k0, R2, az, rg;
+
+  __attribute__((always_inline)) void row(int j, RowBuffers& rb, double& N, double& D) const {
+    fcomplex* spectrum = rb.a.data() + guard;
+    fcomplex* buf = spectrum - H;  // tap m of output u reads buf[u + m]
+    fcomplex* line = rb.b.data();
+    int ilo, ihi;
+    grid.usable(std::sqrt(kis * kis - kx2[j]), std::sqrt(kie * kie - kx2[j]), ilo, ihi);
+    std::fill(buf, buf + padded + 2 * H, fcomplex(0.0f, 0.0f));
+    std::fill(line, line + M, fcomplex(0.0f, 0.0f));
+    N = 0.0;
+    D = 0.0;
+    if (ihi >= ilo) {
+      const fcomplex* in = data + static_cast<std::size_t>(j) * ns;
+      // The row starts the padded window; R2 moves its content to the middle
+      // of the window for the interpolation and R3 moves it back.
+      std::copy(in, in + ns, spectrum);
+      pfft_c(rowFwd, spectrum, spectrum);
+      fftshift(spectrum, padded);
+      // The azimuth shift turns with the absolute kx, so that it leaves no
+      // centroid-dependent phase on the targets.
+      const double azPhase = kx[j] * az;
+      double* rowTerm = rb.term.data();
+      double* rowP = rb.P.data();
+      if (weighted) wt.azimuthRow(kin, padded, kx[j], rowTerm, rowP);
+      double* phase = rb.phase.data();
+      const double kx2j = kx2[j];
+      for (int i = 0; i < padded; ++i) {
+        const double k = kin[i];
+        phase[i] = (std::sqrt(k * k - kx2j) - kzc) * R2 - (k - k0) * rg + azPhase;
+      }
+      const float* cs = rb.cosv.data();
+      const float* sn = rb.sinv.data();
+      wk_phasors(phase, padded, rb.cosv.data(), rb.sinv.data());
+      // Weights of the row (window and whitening; 1 without them), and the
+      // gain sums over the processed band in four partial sums added in a
+      // fixed order.
+      float* W = rb.weight.data();
+      if (weighted) {
+        for (int i = 0; i < padded; ++i)
+          W[i] = static_cast<float>(rowTerm[i] * (rwin ? rwin[i] : 1.0));
+        double n4[4] = {0.0, 0.0, 0.0, 0.0}, d4[4] = {0.0, 0.0, 0.0, 0.0};
+        for (int i = band0; i < band1; ++i) {
+          const double P = rowP[i], w = W[i];
+          d4[i & 3] += P;
+          n4[i & 3] += P * w * w;
+        }
+        D = (d4[0] + d4[1]) + (d4[2] + d4[3]);
+        N = (n4[0] + n4[1]) + (n4[2] + n4[3]);
+      }
+      // Reference phase, weight and scale of every sample.
+      float* sp = reinterpret_cast<float*>(spectrum);
+      const float im = conj ? -1.0f : 1.0f;
+      for (int i = 0; i < padded; ++i) {
+        const float re = sp[2 * i], ii = im * sp[2 * i + 1];
+        const float ws = W[i] * scale;
+        sp[2 * i] = (re * cs[i] - ii * sn[i]) * ws;
+        sp[2 * i + 1] = (re * sn[i] + ii * cs[i]) * ws;
+      }
+      // Input positions of the output wavenumbers first, in a loop of its
+      // own that the compiler vectorises.
+      double* pos = rb.pos.data();
+      const double* kzq = grid.kz.data();
+      for (int q = ilo; q <= ihi; ++q)
+        pos[q - ilo] = std::fabs(std::sqrt(kzq[q] * kzq[q] + kx2j) - kis) / dki;
+      for (int q = ilo; q <= ihi; ++q) {
+        const double x = pos[q - ilo];
+        if (!(x < padded)) continue;  // also rows beyond the geometric limit
+        const double u = roundHalfAway(x);
+        const int iu = static_cast<int>(u);
+        if (iu < 0 || iu >= padded) continue;
+        const int r = static_cast<int>(roundHalfAway((x - u) / 0.01)) + 50;
+        line[grid.idx[q]] = mul(taps.apply(r, buf + iu), back[q]);
+      }
+      pfft_c(inv, line, line);
+    }
+    grid.store(j, line, n);
+  }
+};
+
+__attribute__((target("avx2,fma"))) void lsRowWide(const LSRows& c, int j, RowBuffers& rb, double& N,
+                                                    double& D) {
+  c.row(j, rb, N, D);
+}
+
+void lsRowPlain(const LSRows& c, int j, RowBuffers& rb, double& N, double& D) { c.row(j, rb, N, D); }
 
 }  // namespace
 
@@ -440,8 +560,8 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
     rowD.assign(nl, 0.0);
     buffers.resize(threadCount());
     for (RowBuffers& rb : buffers) {
-      // One more zero for the zero tap that ends a row of paired taps.
-      rb.a.assign(static_cast<std::size_t>(guard) + padded + H + 1, fcomplex(0.0f, 0.0f));
+      // Up to three more zeros for the zero taps that end a row of quads.
+      rb.a.assign(static_cast<std::size_t>(guard) + padded + H + 3, fcomplex(0.0f, 0.0f));
       rb.b.assign(M, fcomplex(0.0f, 0.0f));
       rb.term.resize(padded);
       rb.P.resize(padded);
@@ -461,9 +581,9 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
     ORV_REPORT_CALLED_ERROR();
     return st;
   }
-  PairedTaps paired;
+  QuadTaps quads;
   try {
-    paired.make(table, kFractions, taps);
+    quads.make(table, kFractions, taps);
   } catch (const std::bad_alloc&) {
     ORV_REPORT("Out of memory in the least-squares Stolt kernel", REPORT_ERROR);
     return STATUS_NO_MEMORY;
@@ -512,87 +632,13 @@ int LSInterpWK(AzimuthBlockPar& par, int padded, int M, int n, const double* kx,
     return STATUS_BAD_CONDITION;
   }
 
-  const int conj = par.conj;
-  const double kzc = grid.kzc, k0 = grid.k0;
+  const LSRows rows{grid, wt, quads, rowFwd, inv, par.data, kin.data(),
+                    rwin.empty() ? nullptr : rwin.data(), kx, kx2, back.data(),
+                    ns, padded, M, n, H, guard, band0, band1, par.conj, A, S,
+                    kis, kie, dki, grid.kzc, grid.k0, R2, az, rg};
+  const auto rowKernel = wideRows() ? lsRowWide : lsRowPlain;
 #pragma omp parallel for schedule(dynamic, 8)
-  for (int j = 0; j < nl; ++j) {
-    RowBuffers& rb = buffers[threadIndex()];
-    fcomplex* spectrum = rb.a.data() + guard;
-    fcomplex* buf = spectrum - H;  // tap m of output u reads buf[u + m]
-    fcomplex* line = rb.b.data();
-    int ilo, ihi;
-    grid.usable(std::sqrt(kis * kis - kx2[j]), std::sqrt(kie * kie - kx2[j]), ilo, ihi);
-    std::fill(buf, buf + padded + 2 * H, fcomplex(0.0f, 0.0f));
-    std::fill(line, line + M, fcomplex(0.0f, 0.0f));
-    double N = 0.0, D = 0.0;
-    if (ihi >= ilo) {
-      const fcomplex* row = par.data + static_cast<std::size_t>(j) * ns;
-      // The row starts the padded window; R2 moves its content to the middle
-      // of the window for the interpolation and R3 moves it back.
-      std::copy(row, row + ns, spectrum);
-      pfft_c(rowFwd, spectrum, spectrum);
-      fftshift(spectrum, padded);
-      // The azimuth shift turns with the absolute kx, so that it leaves no
-      // centroid-dependent phase on the targets.
-      const double azPhase = kx[j] * az;
-      double* rowTerm = rb.term.data();
-      double* rowP = rb.P.data();
-      if (A) wt.azimuthRow(kin.data(), padded, kx[j], rowTerm, rowP);
-      double* phase = rb.phase.data();
-      const double kx2j = kx2[j];
-      for (int i = 0; i < padded; ++i) {
-        const double k = kin[i];
-        phase[i] = (std::sqrt(k * k - kx2j) - kzc) * R2 - (k - k0) * rg + azPhase;
-      }
-      const float* cs = rb.cosv.data();
-      const float* sn = rb.sinv.data();
-      wk_phasors(phase, padded, rb.cosv.data(), rb.sinv.data());
-      // Weights of the row (window and whitening; 1 without them), and the
-      // gain sums over the processed band in four partial sums added in a
-      // fixed order.
-      float* W = rb.weight.data();
-      if (A) {
-        for (int i = 0; i < padded; ++i)
-          W[i] = static_cast<float>(rowTerm[i] * (rwin.empty() ? 1.0 : rwin[i]));
-        double n4[4] = {0.0, 0.0, 0.0, 0.0}, d4[4] = {0.0, 0.0, 0.0, 0.0};
-        for (int i = band0; i < band1; ++i) {
-          const double P = rowP[i], w = W[i];
-          d4[i & 3] += P;
-          n4[i & 3] += P * w * w;
-        }
-        D = (d4[0] + d4[1]) + (d4[2] + d4[3]);
-        N = (n4[0] + n4[1]) + (n4[2] + n4[3]);
-      }
-      // Reference phase, weight and scale of every sample.
-      float* sp = reinterpret_cast<float*>(spectrum);
-      const float im = conj ? -1.0f : 1.0f;
-      for (int i = 0; i < padded; ++i) {
-        const float re = sp[2 * i], ii = im * sp[2 * i + 1];
-        const float ws = W[i] * S;
-        sp[2 * i] = (re * cs[i] - ii * sn[i]) * ws;
-        sp[2 * i + 1] = (re * sn[i] + ii * cs[i]) * ws;
-      }
-      // Input positions of the output wavenumbers first, in a loop of its
-      // own that the compiler vectorises.
-      double* pos = rb.pos.data();
-      const double* kzq = grid.kz.data();
-      for (int q = ilo; q <= ihi; ++q)
-        pos[q - ilo] = std::fabs(std::sqrt(kzq[q] * kzq[q] + kx2j) - kis) / dki;
-      for (int q = ilo; q <= ihi; ++q) {
-        const double x = pos[q - ilo];
-        if (!(x < padded)) continue;  // also rows beyond the geometric limit
-        const double u = roundHalfAway(x);
-        const int iu = static_cast<int>(u);
-        if (iu < 0 || iu >= padded) continue;
-        const int r = static_cast<int>(roundHalfAway((x - u) / 0.01)) + 50;
-        line[grid.idx[q]] = mul(paired.apply(r, buf + iu), back[q]);
-      }
-      pfft_c(inv, line, line);
-    }
-    rowN[j] = N;
-    rowD[j] = D;
-    grid.store(j, line, n);
-  }
+  for (int j = 0; j < nl; ++j) rowKernel(rows, j, buffers[threadIndex()], rowN[j], rowD[j]);
   fft_destp_c(rowFwd);
   fft_destp_c(inv);
   st = finishBlock(par, grid, n, gainOf(A, rowN, rowD));
