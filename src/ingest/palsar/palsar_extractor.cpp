@@ -416,6 +416,13 @@ int ATPalExtractor::walkImage(bool ersdac) {
     if (actual < skip || static_cast<long>(swst.size()) >= keep) continue;
 
     const double nearM = ceosBE32(r, sig::kNearRangeM);
+    // A slant range past 2^31 m is a damaged record, not a geometry.
+    if (!(nearM < 2147483648.0)) {
+      status = PAL_FAIL("File reading failed! the slant range of signal record " + std::to_string(actual + 1) +
+                            " is damaged in " + RawDataName,
+                        STATUS_READ_FAILED);
+      break;
+    }
     const double window = 2.0 * nearM / consts::kSpeedOfLight;
     const double t = ascii2sec85("01-JAN-" + std::to_string(ceosBE32(r, sig::kYear)) + " 00:00:00.000") +
                      (double(ceosBE32(r, sig::kDayOfYear)) - 1.0) * 86400.0 + ceosBE32(r, sig::kMillisecond) / 1000.0;
