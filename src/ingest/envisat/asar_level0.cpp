@@ -1,11 +1,6 @@
 // ASAR level-0 products: headers, packet heads, timelines and the walk.
 #include "ingest/envisat/asar_level0.h"
 
-#include <fcntl.h>
-#include <sys/mman.h>
-#include <sys/stat.h>
-#include <unistd.h>
-
 #include <algorithm>
 #include <array>
 #include <climits>
@@ -95,31 +90,16 @@ int mostFrequent(const std::vector<int>& values) {
 
 }  // namespace
 
-Level0File::~Level0File() {
-  if (data_ != nullptr) munmap(const_cast<unsigned char*>(data_), std::size_t(size_));
-}
-
 int Level0File::open(const std::string& path) {
   path_ = path;
-  const int fd = ::open(path.c_str(), O_RDONLY);
-  if (fd < 0) return L0_FAIL("File not opened! " + path, STATUS_NOT_OPENED);
-  struct stat st {};
-  if (fstat(fd, &st) != 0) {
-    ::close(fd);
-    return L0_FAIL("File reading failed! " + path, STATUS_READ_FAILED);
-  }
-  size_ = static_cast<long>(st.st_size);
-  if (size_ > 0) {
-    void* m = mmap(nullptr, std::size_t(size_), PROT_READ, MAP_PRIVATE, fd, 0);
-    if (m == MAP_FAILED) {
-      ::close(fd);
-      size_ = 0;
+  switch (map_.open(path)) {
+    case MappedFile::kMapped:
+      return 0;
+    case MappedFile::kNotOpened:
+      return L0_FAIL("File not opened! " + path, STATUS_NOT_OPENED);
+    default:
       return L0_FAIL("File reading failed! " + path, STATUS_READ_FAILED);
-    }
-    data_ = static_cast<const unsigned char*>(m);
   }
-  ::close(fd);
-  return 0;
 }
 
 int read_level0_header(const Level0File& file, Level0Header* h) {

@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "base/mapped_file.h"
 #include "ingest/envisat/asar_records.h"
 #include "product/time_base.h"
 
@@ -24,21 +25,16 @@ inline constexpr double kChirpBandStep = 62745.098039215685;  // Hz for each chi
 // A level-0 product mapped read-only; a truncated file is simply shorter.
 class Level0File {
  public:
-  Level0File() = default;
-  ~Level0File();
-  Level0File(const Level0File&) = delete;
-  Level0File& operator=(const Level0File&) = delete;
   // 0, 9 "File not opened!" or 4 "File reading failed!" (reported).
   int open(const std::string& path);
   const std::string& path() const { return path_; }
-  long size() const { return size_; }
-  const unsigned char* data() const { return data_; }
-  bool has(long offset, long bytes) const { return offset >= 0 && bytes >= 0 && offset + bytes <= size_; }
+  long size() const { return static_cast<long>(map_.size()); }
+  const unsigned char* data() const { return map_.data(); }
+  bool has(long offset, long bytes) const { return offset >= 0 && bytes >= 0 && offset + bytes <= size(); }
 
  private:
   std::string path_;
-  const unsigned char* data_ = nullptr;
-  long size_ = 0;
+  MappedFile map_;
 };
 
 // Fields of the main and specific product headers that the extraction reads.
