@@ -1,12 +1,15 @@
 #pragma once
-// A whole file mapped read-only: its bytes are read in place from the page
-// cache, without a copy through a read buffer. The mapping ends with the
-// object.
+// File mappings. A whole file mapped read-only: its bytes are read in place
+// from the page cache, without a copy through a read buffer. The mapping
+// ends with the object.
 #include <fcntl.h>
 #include <sys/mman.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
 #include <string>
 
 class MappedFile {
@@ -53,4 +56,46 @@ class MappedFile {
  private:
   const unsigned char* data_ = nullptr;
   long long size_ = 0;
+};
+
+// A raster file written through a shared mapping, a window of rows at a
+// time: the threads copy into the page cache side by side, which a single
+// write call cannot do. The file is allocated before a window is mapped, so
+// that a full disk or a file size limit is met as a failed allocation and
+// not as a fault inside the mapping. The stream must be open for reading and
+// writing (a shared mapping for writing needs both).
+class MappedOutput {
+ public:
+  enum Reserved { kReady, kUnsupported, kFailed };
+
+  void attach(std::FILE* f) { fd_ = f ? fileno(f) : -1; }
+
+  // Allocates the file up to `end` bytes, extending it. kUnsupported when
+  // the file system cannot allocate (the caller then writes through the
+  // stream), kFailed for a full disk or a size limit.
+  Reserved reserve(long long end) const {
+    if (fd_ < 0 || end <= 0) return kUnsupported;
+    if (fallocate(fd_, 0, 0, static_cast<off_t>(end)) == 0) return kReady;
+    return errno == EOPNOTSUPP || errno == ENOSYS || errno == EINVAL ? kUnsupported : kFailed;
+  }
+
+  // Copies `rows` rows of rowBytes, `pitch` bytes apart in src, to the
+  // reserved bytes from `offset` on, one after the other.
+  bool put(const void* src, long long pitch, long long rowBytes, long long rows, long long offset) const {
+    if (rows <= 0 || rowBytes <= 0) return true;
+    const long long page = sysconf(_SC_PAGESIZE);
+    const long long base = offset / page * page;
+    const std::size_t length = static_cast<std::size_t>(offset - base + rows * rowBytes);
+    void* m = mmap(nullptr, length, PROT_READ | PROT_WRITE, MAP_SHARED, fd_, static_cast<off_t>(base));
+    if (m == MAP_FAILED) return false;
+    char* dst = static_cast<char*>(m) + (offset - base);
+    const char* from = static_cast<const char*>(src);
+#pragma omp parallel for schedule(static)
+    for (long long r = 0; r < rows; ++r)
+      std::memcpy(dst + r * rowBytes, from + r * pitch, static_cast<std::size_t>(rowBytes));
+    return munmap(m, length) == 0;
+  }
+
+ private:
+  int fd_ = -1;
 };

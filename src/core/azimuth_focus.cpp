@@ -10,6 +10,7 @@
 #include <new>
 
 #include "base/constants.h"
+#include "base/mapped_file.h"
 #include "base/status.h"
 #include "core/azimuth_block.h"
 #include "core/fft.h"
@@ -204,7 +205,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
       ORV_REPORT(files.input, REPORT_ERROR);
       return STATUS_NOT_OPENED;
     }
-    out.reset(std::fopen(files.output.c_str(), "wb"));
+    out.reset(std::fopen(files.output.c_str(), "w+b"));
     if (!out) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
       ORV_REPORT(files.output, REPORT_ERROR);
@@ -218,6 +219,12 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     return AF_FAIL("Out of memory for the azimuth block", STATUS_NO_MEMORY);
   }
   if (scene.verbose) waitbar_open("Azimuth Focusing");
+
+  // Focused rows go to the file through a shared mapping where the file
+  // system can allocate ahead, else through the stream.
+  MappedOutput mappedOut;
+  mappedOut.attach(out.get());
+  bool mapped = !scene.inCore;
 
   long long readPos = 0;  // first input row of the block
   long long outRow = 0;
@@ -260,7 +267,21 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     }
 
     const int rows = blockLines - A;
-    for (int r = 0; r < rows; ++r) {
+    const long long outRowBytes = static_cast<long long>(sizeof(fcomplex)) * outSamples;
+    if (mapped) {
+      const MappedOutput::Reserved reserved = mappedOut.reserve((outRow + rows) * outRowBytes);
+      if (reserved == MappedOutput::kUnsupported && outRow == 0) {
+        mapped = false;
+      } else if (reserved != MappedOutput::kReady ||
+                 !mappedOut.put(blockBuf.data() + static_cast<std::size_t>(A / 2) * samples,
+                                static_cast<long long>(rowBytes), outRowBytes, rows, outRow * outRowBytes)) {
+        if (scene.verbose) waitbar_close();
+        ORV_REPORT("File writing failed!", REPORT_ERROR);
+        ORV_REPORT(files.output, REPORT_ERROR);
+        return STATUS_WRITE_FAILED;
+      }
+    }
+    for (int r = 0; r < rows && !mapped; ++r) {
       const fcomplex* src = blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * samples;
       if (scene.inCore) {
         std::memmove(scene.buffer + (outRow + r) * outSamples, src,

@@ -1,9 +1,5 @@
 #include "core/range_focus.h"
 
-#include <fcntl.h>
-#include <sys/mman.h>
-#include <unistd.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <cmath>
@@ -14,6 +10,7 @@
 #include <string>
 #include <utility>
 
+#include "base/mapped_file.h"
 #include "base/status.h"
 #include "core/ortog.h"
 #include "diag/report.h"
@@ -27,43 +24,6 @@ struct FileCloser {
   }
 };
 using File = std::unique_ptr<std::FILE, FileCloser>;
-
-// The range-focused raster written through a shared mapping of the output
-// file, one pass at a time: both threads copy into the page cache, which a
-// single write call cannot share, and no second pass buffer is needed. The
-// file takes its whole size first, so that a full disk or a file size limit
-// is met there as a failed write and not as a fault inside the mapping.
-class MappedOutput {
- public:
-  enum Prepared { kReady, kUnsupported, kFailed };
-  Prepared prepare(std::FILE* f, long long bytes) {
-    if (bytes <= 0) return kUnsupported;
-    fd_ = fileno(f);
-    if (fallocate(fd_, 0, 0, static_cast<off_t>(bytes)) == 0) return kReady;
-    return errno == EOPNOTSUPP || errno == ENOSYS || errno == EINVAL ? kUnsupported : kFailed;
-  }
-  bool put(const void* src, long long offset, long long bytes) const {
-    if (bytes <= 0) return true;
-    const long long page = sysconf(_SC_PAGESIZE);
-    const long long base = offset / page * page;
-    const std::size_t length = static_cast<std::size_t>(offset - base + bytes);
-    void* m = mmap(nullptr, length, PROT_READ | PROT_WRITE, MAP_SHARED, fd_, static_cast<off_t>(base));
-    if (m == MAP_FAILED) return false;
-    char* dst = static_cast<char*>(m) + (offset - base);
-    const char* from = static_cast<const char*>(src);
-    constexpr int kParts = 16;
-    const long long part = (bytes + kParts - 1) / kParts;
-#pragma omp parallel for schedule(static)
-    for (int i = 0; i < kParts; ++i) {
-      const long long at = i * part;
-      if (at < bytes) std::memcpy(dst + at, from + at, static_cast<std::size_t>(std::min(part, bytes - at)));
-    }
-    return munmap(m, length) == 0;
-  }
-
- private:
-  int fd_ = -1;
-};
 
 // Rows per correlation chunk: about 2 MiB of samples, so that the forward
 // transform, the product and the backward transform work in cache.
@@ -229,10 +189,11 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     if (!out) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
     std::setvbuf(in.get(), nullptr, _IOFBF, 1 << 20);
     std::setvbuf(out.get(), nullptr, _IOFBF, 1 << 20);
-    const MappedOutput::Prepared prepared =
-        mappedOut.prepare(out.get(), static_cast<long long>(O) * lines * static_cast<long long>(sizeof(fcomplex)));
-    if (prepared == MappedOutput::kFailed) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
-    mapped = prepared == MappedOutput::kReady;
+    mappedOut.attach(out.get());
+    const MappedOutput::Reserved reserved =
+        mappedOut.reserve(static_cast<long long>(O) * lines * static_cast<long long>(sizeof(fcomplex)));
+    if (reserved == MappedOutput::kFailed) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
+    mapped = reserved == MappedOutput::kReady;
     P = work.linesPerBlock > 0 ? work.linesPerBlock : kDefaultLinesPerBlock;
     P = std::max(1, std::min(P, std::max(lines, 1)));
     q = lines / P;
@@ -286,7 +247,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
 
     if (mapped) {
       const long long rowBytes = static_cast<long long>(O) * static_cast<long long>(sizeof(fcomplex));
-      if (!mappedOut.put(data, first * rowBytes, nl * rowBytes))
+      if (!mappedOut.put(data, rowBytes, rowBytes, nl, first * rowBytes))
         return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
     } else if (!work.incore) {
       if (!written()) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
