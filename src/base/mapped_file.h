@@ -68,13 +68,14 @@ class MappedOutput {
  public:
   enum Reserved { kReady, kUnsupported, kFailed };
 
-  void attach(std::FILE* f) { fd_ = f ? fileno(f) : -1; }
+  void attach(std::FILE* f) { attach(f ? fileno(f) : -1); }
+  void attach(int fd) { fd_ = fd; }
 
   // Allocates the file up to `end` bytes, extending it. kUnsupported when
   // the file system cannot allocate (the caller then writes through the
   // stream), kFailed for a full disk or a size limit.
   Reserved reserve(long long end) const {
-    if (fd_ < 0 || end <= 0) return kUnsupported;
+    if (fd_ < 0 || end <= 0 || (fcntl(fd_, F_GETFL) & O_ACCMODE) != O_RDWR) return kUnsupported;
     if (fallocate(fd_, 0, 0, static_cast<off_t>(end)) == 0) return kReady;
     return errno == EOPNOTSUPP || errno == ENOSYS || errno == EINVAL ? kUnsupported : kFailed;
   }
