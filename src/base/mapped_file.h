@@ -7,6 +7,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -81,22 +82,35 @@ class MappedOutput {
   }
 
   // Copies `rows` rows of rowBytes, `pitch` bytes apart in src, to the
-  // reserved bytes from `offset` on, one after the other.
+  // reserved bytes from `offset` on, one after the other. The rows go in
+  // windows of at most kWindowBytes, each unmapped before the next, so that
+  // the process never holds more than a window of the file.
   bool put(const void* src, long long pitch, long long rowBytes, long long rows, long long offset) const {
     if (rows <= 0 || rowBytes <= 0) return true;
+    const long long perWindow = std::max(1LL, kWindowBytes / rowBytes);
+    const char* from = static_cast<const char*>(src);
+    for (long long r0 = 0; r0 < rows; r0 += perWindow) {
+      const long long n = std::min(perWindow, rows - r0);
+      if (!putWindow(from + r0 * pitch, pitch, rowBytes, n, offset + r0 * rowBytes)) return false;
+    }
+    return true;
+  }
+
+ private:
+  static constexpr long long kWindowBytes = 32LL << 20;
+
+  bool putWindow(const char* from, long long pitch, long long rowBytes, long long rows, long long offset) const {
     const long long page = sysconf(_SC_PAGESIZE);
     const long long base = offset / page * page;
     const std::size_t length = static_cast<std::size_t>(offset - base + rows * rowBytes);
     void* m = mmap(nullptr, length, PROT_READ | PROT_WRITE, MAP_SHARED, fd_, static_cast<off_t>(base));
     if (m == MAP_FAILED) return false;
     char* dst = static_cast<char*>(m) + (offset - base);
-    const char* from = static_cast<const char*>(src);
 #pragma omp parallel for schedule(static)
     for (long long r = 0; r < rows; ++r)
       std::memcpy(dst + r * rowBytes, from + r * pitch, static_cast<std::size_t>(rowBytes));
     return munmap(m, length) == 0;
   }
 
- private:
   int fd_ = -1;
 };

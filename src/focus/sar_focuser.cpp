@@ -7,7 +7,6 @@
 #include <vector>
 
 #include "base/constants.h"
-#include "base/mapped_file.h"
 #include "base/status.h"
 #include "core/azimuth_focus.h"
 #include "core/fft.h"
@@ -666,18 +665,10 @@ int ChainRun::dopplerStep() {
   if (conf.Flag_dcest) {
     DcEstInput in = dcEstInput(ctx.rgfocFile, ".", rgSamples, rgLines, ctx.prf_hz, ctx.azimuthStart);
     ORV_REPORT("DC Estimation", REPORT_CHECKPOINT);
-    // The range-focused raster, just written in this machine's byte order
-    // and without header, is scanned in place from the page cache when it
-    // can be mapped; else it is read through buffers.
-    MappedFile rgfocMap;
-    const fcomplex* raster = conf.Incore ? rw.data.data() : nullptr;
-    const long long rasterBytes = static_cast<long long>(rgSamples) * rgLines * sizeof(fcomplex);
-    if (!raster && rasterBytes > 0 && rgfocMap.open(ctx.rgfocFile) == MappedFile::kMapped &&
-        rgfocMap.size() >= rasterBytes)
-      raster = reinterpret_cast<const fcomplex*>(rgfocMap.data());
-    if (int st = centroidStep(conf, in, ctx.fc_hz, ctx.frg_hz, raster, dcPoly); st != 0)
+    if (int st = centroidStep(conf, in, ctx.fc_hz, ctx.frg_hz,
+                              conf.Incore ? rw.data.data() : nullptr, dcPoly);
+        st != 0)
       return calledError(st);
-    rgfocMap.reset();
 
     ORV_REPORT("GEOMETRIC POLYNOMIALS COMPUTATION", REPORT_CHECKPOINT);
     if (int st = geometricRatePoly(rawRecord.orbit(), ctx.azimuthStart,
