@@ -27,7 +27,7 @@ constexpr double kPi = consts::kPi;
 
 double rateAt(const AzimuthBlockPar& par, double t) {
   const double x = t - par.trg0;
-  return par.fr0 + par.fr1 * x + par.fr2 * x * x;
+  return par.fr0 + x * (par.fr1 + x * (par.fr2 + x * par.fr3));
 }
 
 double sinc(double u) {
