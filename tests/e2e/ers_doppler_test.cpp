@@ -164,13 +164,14 @@ TEST(ErsDopplerEndToEnd, GyrolessCentroidsResolvedAndPhaseFreeOfThem) {
   expectCentroidFreePhase(scenes);
 }
 
-// Peak phase bar of a centroid: 5 degrees up to 2.2 PRF; beyond, the
-// azimuth kernel's range sub-blocks leave a phase that steps from one
-// sub-block to the next (about -4 degrees per 1024-sample sub-block at
-// three PRFs, measured on exact hyperbolas in core), up to 8 degrees
-// across a full swath (measured); 10 there. A Doppler rate whose
-// hyperbola missed the depth of the range migration left -17 to -40.
-double phaseBarOf(double centroidHz) { return std::fabs(centroidHz) <= 2.2 * kPrf + 1.0 ? 5.0 : 10.0; }
+// Peak phase bar of a centroid: 5 degrees up to 1.5 PRF (the gyroless
+// 2300 Hz of the phase table); beyond, a term of one sign that grows with
+// the square of the centroid remains (measured 0.9 degrees at 1 PRF, 2 to
+// 5.5 at 2.2 PRF, -0.4 to 10.2 at 3 PRF, with 0.02 line of azimuth offset
+// of one sign at both +-3 PRF); 12 there. A Doppler rate whose hyperbola
+// missed the depth of the range migration left -17 to -40 degrees at
+// 3 PRF, and the kernels' range sub-blocks -4 degrees more per sub-block.
+double phaseBarOf(double centroidHz) { return std::fabs(centroidHz) <= 1.5 * kPrf ? 5.0 : 12.0; }
 
 // Centroids from -3 to +3 PRF in steps of 0.4 PRF on full scenes of
 // homogeneous clutter with four bright scatterers.
