@@ -46,6 +46,7 @@ struct AzimuthBlockPar {
                              // (0: the range of input sample overlap/2)
   double fr0y = 0.0;         // change of fr0 per second of azimuth time
   double fr1y = 0.0;         //   and of fr1
+  double fr3 = 0.0;          // cubic term of the Doppler rate in fast time
 };
 
 // What focazwk tells its caller about the block it focused.

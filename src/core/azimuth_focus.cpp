@@ -141,8 +141,10 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   par.scale = 1.0;
   par.reestimate = 0;
   par.prf = prf;
-  // Doppler rate at the scene centre; its azimuth terms (y, x y) follow
-  // the blocks and, within a block, the rows (see multirg).
+  // Doppler rate at the scene centre, up to its cubic term in range (a
+  // quadratic misses the rate across a full swath by some 5e-6, a tenth of
+  // a radian of phase three PRFs from zero Doppler); its azimuth terms (y,
+  // x y) follow the blocks and, within a block, the rows (see multirg).
   const double* pfr = scene.polyFR;
   const double yfr = (lines / 2) / prf + files.SlowStartTime - pfr[8];
   par.fr0y = pfr[2];
@@ -150,6 +152,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   par.fr0 = pfr[0] + pfr[2] * yfr;
   par.fr1 = pfr[1] + pfr[3] * yfr;
   par.fr2 = pfr[4];
+  par.fr3 = pfr[5];
   par.t0 = files.FastStartTime;
   par.trg0 = scene.polyFR[7];
   par.AntennaLength = conf.AntennaLength;

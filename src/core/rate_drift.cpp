@@ -42,7 +42,7 @@ WKRateDrift wk_rate_drift(const AzimuthBlockPar& par) {
   // (the equivalent speed of MyComputeEqPar also follows the range slope
   // of the rate, which is not a change of the range histories).
   const double x = par.t0 + (par.samples / 2) / par.frg - par.trg0;
-  const double rate = par.fr0 + par.fr1 * x + par.fr2 * x * x;
+  const double rate = par.fr0 + x * (par.fr1 + x * (par.fr2 + x * par.fr3));
   if (rate == 0.0) return d;
   d.alpha = 0.5 * (par.fr0y + par.fr1y * x) / rate;
 

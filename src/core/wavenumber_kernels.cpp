@@ -27,7 +27,7 @@ constexpr double kPi = consts::kPi;
 
 double rateAt(const AzimuthBlockPar& par, double t) {
   const double x = t - par.trg0;
-  return par.fr0 + par.fr1 * x + par.fr2 * x * x;
+  return par.fr0 + x * (par.fr1 + x * (par.fr2 + x * par.fr3));
 }
 
 double sinc(double u) {
@@ -502,12 +502,13 @@ namespace {
 // so neither the scene's nor the block's centroid reference would do.) The
 // reference function is the stationary-phase spectrum of the azimuth chirp,
 // which lacks the -pi/4 that the transform of a down-chirp carries; it is
-// put back here too (with the opposite sign for conjugated processing).
-void residualPhasors(const AzimuthBlockPar& par, double rw0, double r0, double dr, int n,
+// put back here too (with the opposite sign for conjugated processing),
+// and `extra`, a phase of the whole sub-block.
+void residualPhasors(const AzimuthBlockPar& par, double rw0, double r0, double dr, int n, double extra,
                      std::vector<fcomplex>& turn) {
   double k0, kx, kz;
   ComputeWaveNumbers(par, k0, kx, kz);
-  const double quarter = (par.conj ? -kPi : kPi) / 4.0;
+  const double quarter = (par.conj ? -kPi : kPi) / 4.0 + extra;
   turn.resize(n);
   for (int i = 0; i < n; ++i) {
     double sd, cd;
@@ -526,6 +527,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   const int nl = par.lines;
   const double t0keep = par.t0;
   const double fr0keep = par.fr0, fr1keep = par.fr1;
+  const double azshiftKeep = par.azshift;
   fcomplex* const blockData = par.data;
   auto dcAt = [&](double x) {
     return poly[0] + poly[1] * x + poly[2] * x * x + poly[3] * x * x * x +
@@ -535,6 +537,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     par.t0 = t0keep;
     par.fr0 = fr0keep;
     par.fr1 = fr1keep;
+    par.azshift = azshiftKeep;
     par.data = blockData;
     par.samples = S;
   };
@@ -573,7 +576,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
   par.data = work.data();
   par.samples = s;
 
-  double E = 0.0, H = 0.0, r = 1.0;
+  double E = 0.0, H = 0.0, r = 1.0, lagPhase = 0.0;
   std::vector<fcomplex> turn;
   for (int b = 0; b < nsub; ++b) {
     const int f = b * (s - o);
@@ -628,6 +631,15 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
       r = kz / k0;
       H += r * (o / 2) / par.frg;
       par.rgshift = 2.0 * (k0 / kz - 1.0) * par.Req / kC - H - E;
+      // The running shift H is applied before the Stolt mapping, where a
+      // range shift is not one of the focused image: moving the echoes by
+      // lag = H c / 2 in range leaves the targets lag sin(squint) / Veq
+      // seconds late and turned by (k0 - kz) lag (at three PRFs 1.5 m per
+      // 960 samples, 0.007 line and -4 degrees per sub-block). The azimuth
+      // shift and the sub-block's phase take both back.
+      const double lag = H * kC / 2.0;
+      par.azshift = azshiftKeep - lag * (kx / k0) / par.Veq;
+      lagPhase = (k0 - kz) * lag;
     }
 
     st = focazwk(par, out);
@@ -640,7 +652,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
       try {
         const double firstOut = range0 + (f - o / 2) * out.spacing;
         const double rw0 = par.interp == 0 ? firstOut + (s / 2) * out.spacing : firstOut;
-        residualPhasors(par, rw0, range0 + f * out.spacing, out.spacing, ncopyBack, turn);
+        residualPhasors(par, rw0, range0 + f * out.spacing, out.spacing, ncopyBack, lagPhase, turn);
       } catch (const std::bad_alloc&) {
         st = STATUS_NO_MEMORY;
         break;

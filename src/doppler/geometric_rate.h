@@ -7,10 +7,15 @@ class polyFR;
 
 // Rates of ten points across the swath (samples / frg seconds from swstMin,
 // seen at the centroid of dc) at the scene centre and at its first and last
-// lines, tStart and tEnd. The centre fit gives the constant, x and x^2
-// terms; the ends give the y and x y terms (per second, reference the
-// scene centre): an orbit's rate drifts by some 1e-5 per second, which
-// matters to the phase of scenes far from zero Doppler. Range reference
-// swstMin. Status 0, or the orbit's failure.
+// lines, tStart and tEnd. A point's rate is that of the hyperbola through
+// its range and Doppler at the beam centre and its closest range, scaled so
+// that the hyperbola the focusing kernel builds from the polynomial (a speed
+// and a range from the rate's change across the swath) has the depth of
+// the point's range migration; below 1 Hz of centroid the orbit's local
+// rate. The centre fit, a cubic, gives the constant, x, x^2 and x^3 terms;
+// the ends give the y and x y terms (per second, reference the scene
+// centre): an orbit's rate drifts by some 1e-5 per second, which matters to
+// the phase of scenes far from zero Doppler. Range reference swstMin.
+// Status 0, or the orbit's failure.
 int geometricRatePoly(GeneralSAROrbit& orbit, double tStart, double tEnd, double swstMin, int samples,
                       double frg, double fc, const polyDC& dc, double lookSign, polyFR& fr);
