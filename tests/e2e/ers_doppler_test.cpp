@@ -125,7 +125,9 @@ void expectFocused(const Focused& f, const DopplerScene& d, double phaseBar = 5.
   for (const PtaTarget& t : f.pta.targets) {
     EXPECT_LT(std::fabs(t.errorLine), bars::kProductPixels) << f.pta.table;
     EXPECT_LT(std::fabs(t.errorSample), bars::kProductPixels) << f.pta.table;
-    if (t.found) EXPECT_LT(std::fabs(t.phaseError) * 180.0 / M_PI, phaseBar) << f.pta.table;
+    if (t.found) {
+      EXPECT_LT(std::fabs(t.phaseError) * 180.0 / M_PI, phaseBar) << f.pta.table;
+    }
   }
 }
 
