@@ -10,6 +10,8 @@
 #include <cstring>
 #include <ctime>
 #include <fstream>
+#include <istream>
+#include <vector>
 #include <new>
 
 #include "base/constants.h"
@@ -52,6 +54,12 @@ std::string lineMessage(const char* format, int line) {
   char text[128];
   std::snprintf(text, sizeof text, format, line);
   return text;
+}
+
+// The fixed head of the next line record, and whether it is a signal record.
+bool readSignalHead(std::istream& in, std::vector<unsigned char>& head) {
+  return in.read(reinterpret_cast<char*>(head.data()), kLineHeadBytes) &&
+         std::equal(kSignalRecordType.begin(), kSignalRecordType.end(), head.begin() + 4);
 }
 
 std::uint32_t be32(const unsigned char* p) {
@@ -405,8 +413,7 @@ int radarextract::RADARExtract() {
   for (int pos = 0; pos < records && written < lines; ++pos) {
     const int lineNo = pos + 1;
     waitbar_update(0, static_cast<float>(100.0 * pos / records));
-    if (!in.read(reinterpret_cast<char*>(head.data()), kLineHeadBytes) ||
-        !std::equal(kSignalRecordType.begin(), kSignalRecordType.end(), head.begin() + 4)) {
+    if (!readSignalHead(in, head)) {
       status = RS_FAIL(lineMessage("Main header read failed at line %d", lineNo) + " of " + DataFile,
                        STATUS_READ_FAILED);
       break;
@@ -610,8 +617,7 @@ int radarextract::extractSLC() {
   for (int pos = 0; pos < records; ++pos) {
     const int lineNo = pos + 1;
     waitbar_update(0, static_cast<float>(100.0 * pos / records));
-    if (!in.read(reinterpret_cast<char*>(head.data()), kLineHeadBytes) ||
-        !std::equal(kSignalRecordType.begin(), kSignalRecordType.end(), head.begin() + 4)) {
+    if (!readSignalHead(in, head)) {
       status = RS_FAIL(lineMessage("Main header read failed at line %d", lineNo) + " of " + DataFile,
                        STATUS_READ_FAILED);
       break;
