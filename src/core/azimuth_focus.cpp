@@ -10,7 +10,7 @@
 #include <new>
 
 #include "base/constants.h"
-#include "base/mapped_file.h"
+#include "base/row_write.h"
 #include "base/status.h"
 #include "core/azimuth_block.h"
 #include "core/fft.h"
@@ -208,7 +208,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
       ORV_REPORT(files.input, REPORT_ERROR);
       return STATUS_NOT_OPENED;
     }
-    out.reset(std::fopen(files.output.c_str(), "w+b"));
+    out.reset(std::fopen(files.output.c_str(), "wb"));
     if (!out) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
       ORV_REPORT(files.output, REPORT_ERROR);
@@ -222,12 +222,6 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     return AF_FAIL("Out of memory for the azimuth block", STATUS_NO_MEMORY);
   }
   if (scene.verbose) waitbar_open("Azimuth Focusing");
-
-  // Focused rows go to the file through a shared mapping where the file
-  // system can allocate ahead, else through the stream.
-  MappedOutput mappedOut;
-  mappedOut.attach(out.get());
-  bool mapped = !scene.inCore;
 
   long long readPos = 0;  // first input row of the block
   long long outRow = 0;
@@ -271,31 +265,17 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
 
     const int rows = blockLines - A;
     const long long outRowBytes = static_cast<long long>(sizeof(fcomplex)) * outSamples;
-    if (mapped) {
-      const MappedOutput::Reserved reserved = mappedOut.reserve((outRow + rows) * outRowBytes);
-      if (reserved == MappedOutput::kUnsupported && outRow == 0) {
-        mapped = false;
-      } else if (reserved != MappedOutput::kReady ||
-                 !mappedOut.put(blockBuf.data() + static_cast<std::size_t>(A / 2) * samples,
-                                static_cast<long long>(rowBytes), outRowBytes, rows, outRow * outRowBytes)) {
-        if (scene.verbose) waitbar_close();
-        ORV_REPORT("File writing failed!", REPORT_ERROR);
-        ORV_REPORT(files.output, REPORT_ERROR);
-        return STATUS_WRITE_FAILED;
-      }
-    }
-    for (int r = 0; r < rows && !mapped; ++r) {
-      const fcomplex* src = blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * samples;
-      if (scene.inCore) {
-        std::memmove(scene.buffer + (outRow + r) * outSamples, src,
+    if (scene.inCore) {
+      for (int r = 0; r < rows; ++r)
+        std::memmove(scene.buffer + (outRow + r) * outSamples,
+                     blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * samples,
                      sizeof(fcomplex) * outSamples);
-      } else if (std::fwrite(src, sizeof(fcomplex), outSamples, out.get()) !=
-                 static_cast<std::size_t>(outSamples)) {
-        if (scene.verbose) waitbar_close();
-        ORV_REPORT("File writing failed!", REPORT_ERROR);
-        ORV_REPORT(files.output, REPORT_ERROR);
-        return STATUS_WRITE_FAILED;
-      }
+    } else if (!write_rows(fileno(out.get()), blockBuf.data() + static_cast<std::size_t>(A / 2) * samples,
+                           static_cast<long long>(rowBytes), outRowBytes, rows, outRow * outRowBytes)) {
+      if (scene.verbose) waitbar_close();
+      ORV_REPORT("File writing failed!", REPORT_ERROR);
+      ORV_REPORT(files.output, REPORT_ERROR);
+      return STATUS_WRITE_FAILED;
     }
     outRow += rows;
   }

@@ -10,7 +10,7 @@
 #include <string>
 #include <utility>
 
-#include "base/mapped_file.h"
+#include "base/row_write.h"
 #include "base/status.h"
 #include "core/ortog.h"
 #include "diag/report.h"
@@ -162,8 +162,6 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
   std::vector<int> fileShift;
   // File path: a pass is written while the next one is read and compressed,
   // from the other of two buffers.
-  MappedOutput mappedOut;
-  bool mapped = false;
   FFTBuffer spare;
   std::future<bool> pending;
   auto written = [&pending]() {
@@ -184,23 +182,16 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
   } else {
     in.reset(std::fopen(params.inputFile.c_str(), "rb"));
     if (!in) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
-    // Read and write: a shared mapping for writing needs both.
-    out.reset(std::fopen(params.outputFile.c_str(), "w+b"));
+    out.reset(std::fopen(params.outputFile.c_str(), "wb"));
     if (!out) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
     std::setvbuf(in.get(), nullptr, _IOFBF, 1 << 20);
-    std::setvbuf(out.get(), nullptr, _IOFBF, 1 << 20);
-    mappedOut.attach(out.get());
-    const MappedOutput::Reserved reserved =
-        mappedOut.reserve(static_cast<long long>(O) * lines * static_cast<long long>(sizeof(fcomplex)));
-    if (reserved == MappedOutput::kFailed) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
-    mapped = reserved == MappedOutput::kReady;
     P = work.linesPerBlock > 0 ? work.linesPerBlock : kDefaultLinesPerBlock;
     P = std::max(1, std::min(P, std::max(lines, 1)));
     q = lines / P;
     passes = lines % P ? q + 1 : q;
     try {
       work.data.assign(static_cast<std::size_t>(N) * P, fcomplex(0.0f, 0.0f));
-      if (passes > 1 && !mapped) spare.assign(static_cast<std::size_t>(N) * P, fcomplex(0.0f, 0.0f));
+      if (passes > 1) spare.assign(static_cast<std::size_t>(N) * P, fcomplex(0.0f, 0.0f));
       fileShift.assign(P, 0);
     } catch (const std::bad_alloc&) {
       return RF_FAIL("Memory allocation failed", STATUS_NO_MEMORY);
@@ -245,16 +236,12 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     }
     repackRows(data, nl, N, z.valid, O, shifts);
 
-    if (mapped) {
-      const long long rowBytes = static_cast<long long>(O) * static_cast<long long>(sizeof(fcomplex));
-      if (!mappedOut.put(data, rowBytes, rowBytes, nl, first * rowBytes))
-        return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
-    } else if (!work.incore) {
+    if (!work.incore) {
       if (!written()) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
-      const std::size_t count = static_cast<std::size_t>(O) * nl;
-      std::FILE* f = out.get();
-      pending = std::async(std::launch::async, [f, data, count] {
-        return std::fwrite(data, sizeof(fcomplex), count, f) == count;
+      const long long rowBytes = static_cast<long long>(O) * static_cast<long long>(sizeof(fcomplex));
+      const int fd = fileno(out.get());
+      pending = std::async(std::launch::async, [fd, data, rowBytes, nl, first] {
+        return write_rows(fd, data, rowBytes, rowBytes, nl, first * rowBytes);
       });
       if (!spare.empty()) std::swap(work.data, spare);
     }
