@@ -10,23 +10,16 @@
 #include <new>
 
 #include "base/constants.h"
-#include "base/row_write.h"
 #include "base/status.h"
 #include "core/azimuth_block.h"
 #include "core/fft.h"
 #include "diag/report.h"
 #include "diag/waitbar.h"
+#include "product/data_file.h"
 
 namespace {
 
 constexpr double kC = consts::kSpeedOfLight;
-
-struct FileCloser {
-  void operator()(std::FILE* f) const {
-    if (f) std::fclose(f);
-  }
-};
-using File = std::unique_ptr<std::FILE, FileCloser>;
 
 int fail(const char* message, int status, int line, const char* function) {
   orv_add_report(message, REPORT_ERROR, line, function, __FILE__);
@@ -200,16 +193,14 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   const int fullRg = 2 * conf.RangeOverlap;
   const int outSamples = samples - fullRg;
 
-  File in, out;
+  RasterStream in, out;
   if (!scene.inCore) {
-    in.reset(std::fopen(files.input.c_str(), "rb"));
-    if (!in) {
+    if (!in.open(files.input, "rb")) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
       ORV_REPORT(files.input, REPORT_ERROR);
       return STATUS_NOT_OPENED;
     }
-    out.reset(std::fopen(files.output.c_str(), "wb"));
-    if (!out) {
+    if (!out.open(files.output, "wb")) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
       ORV_REPORT(files.output, REPORT_ERROR);
       return STATUS_NOT_OPENED;
@@ -232,10 +223,8 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     if (scene.inCore) {
       std::memcpy(blockBuf.data(), scene.buffer + readPos * samples, rowBytes * blockLines);
     } else {
-      if (fseeko(in.get(), static_cast<off_t>(readPos) * static_cast<off_t>(rowBytes),
-                 SEEK_SET) != 0 ||
-          std::fread(blockBuf.data(), rowBytes, blockLines, in.get()) !=
-              static_cast<std::size_t>(blockLines)) {
+      const long long blockBytes = static_cast<long long>(rowBytes) * blockLines;
+      if (in.pread(blockBuf.data(), blockBytes, readPos * static_cast<long long>(rowBytes)) != blockBytes) {
         if (scene.verbose) waitbar_close();
         ORV_REPORT("File reading failed!", REPORT_ERROR);
         ORV_REPORT(files.input, REPORT_ERROR);
@@ -270,8 +259,8 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
         std::memmove(scene.buffer + (outRow + r) * outSamples,
                      blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * samples,
                      sizeof(fcomplex) * outSamples);
-    } else if (!write_rows(fileno(out.get()), blockBuf.data() + static_cast<std::size_t>(A / 2) * samples,
-                           static_cast<long long>(rowBytes), outRowBytes, rows, outRow * outRowBytes)) {
+    } else if (!out.pwriteRows(blockBuf.data() + static_cast<std::size_t>(A / 2) * samples,
+                               static_cast<long long>(rowBytes), outRowBytes, rows, outRow * outRowBytes)) {
       if (scene.verbose) waitbar_close();
       ORV_REPORT("File writing failed!", REPORT_ERROR);
       ORV_REPORT(files.output, REPORT_ERROR);
@@ -280,7 +269,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     outRow += rows;
   }
   if (scene.verbose) waitbar_close();
-  if (out && std::fflush(out.get()) != 0) {
+  if (out.is_open() && out.close() != 0) {
     ORV_REPORT("File writing failed!", REPORT_ERROR);
     return STATUS_WRITE_FAILED;
   }

@@ -10,10 +10,10 @@
 #include <string>
 #include <utility>
 
-#include "base/row_write.h"
 #include "base/status.h"
 #include "core/ortog.h"
 #include "diag/report.h"
+#include "product/data_file.h"
 #include "diag/waitbar.h"
 
 namespace {
@@ -157,7 +157,8 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     return st;
   }
 
-  File in, out;
+  File in;
+  RasterStream out;
   int P = 0, q = 0, passes = 0;
   std::vector<int> fileShift;
   // File path: a pass is written while the next one is read and compressed,
@@ -182,8 +183,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
   } else {
     in.reset(std::fopen(params.inputFile.c_str(), "rb"));
     if (!in) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
-    out.reset(std::fopen(params.outputFile.c_str(), "wb"));
-    if (!out) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
+    if (!out.open(params.outputFile, "wb")) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
     std::setvbuf(in.get(), nullptr, _IOFBF, 1 << 20);
     P = work.linesPerBlock > 0 ? work.linesPerBlock : kDefaultLinesPerBlock;
     P = std::max(1, std::min(P, std::max(lines, 1)));
@@ -239,9 +239,9 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     if (!work.incore) {
       if (!written()) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
       const long long rowBytes = static_cast<long long>(O) * static_cast<long long>(sizeof(fcomplex));
-      const int fd = fileno(out.get());
-      pending = std::async(std::launch::async, [fd, data, rowBytes, nl, first] {
-        return write_rows(fd, data, rowBytes, rowBytes, nl, first * rowBytes);
+      const RasterStream* to = &out;
+      pending = std::async(std::launch::async, [to, data, rowBytes, nl, first] {
+        return to->pwriteRows(data, rowBytes, rowBytes, nl, first * rowBytes);
       });
       if (!spare.empty()) std::swap(work.data, spare);
     }
@@ -253,7 +253,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
   if (!work.incore) {
     work.data = FFTBuffer();
     spare = FFTBuffer();
-    if (std::fclose(out.release()) != 0) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
+    if (out.close() != 0) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
   }
   return 0;
 }

@@ -17,6 +17,7 @@
 #include "doppler/dc_estimators.h"
 #include "numerics/fitting.h"
 #include "product/byte_order.h"
+#include "product/data_file.h"
 
 namespace {
 
@@ -68,10 +69,6 @@ struct MlbfGuard {
 };
 struct WdarGuard {
   ~WdarGuard() { wdar_close(); }
-};
-
-struct FileCloser {
-  void operator()(std::FILE* f) const { std::fclose(f); }
 };
 
 // Integrand of the Fisher information of a spectral shift: the azimuth power
@@ -367,18 +364,18 @@ int read_block(DcEstState& st, const DcEstInput& input, int y, int x) {
                   st.data + static_cast<std::size_t>(y + l) * input.samples + x, ns * sizeof(fcomplex));
     return STATUS_OK;
   }
-  std::unique_ptr<std::FILE, FileCloser> f(std::fopen(input.rasterFile.c_str(), "rb"));
-  if (!f) {
+  RasterStream f;
+  if (!f.open(input.rasterFile, "rb")) {
     ORV_REPORT("File not opened! " + input.rasterFile, REPORT_ERROR);
     return STATUS_NOT_OPENED;
   }
   const bool swap = (input.byteOrder == 1) != (get_endian() == kMsbFirst);
+  const long long lineBytes = static_cast<long long>(ns) * static_cast<long long>(sizeof(fcomplex));
   for (int l = 0; l < nl; ++l) {
     const long long off = input.headerOffset +
                           (static_cast<long long>(y + l) * input.samples + x) * static_cast<long long>(sizeof(fcomplex));
     fcomplex* dst = &st.blockBuf[static_cast<std::size_t>(l) * ns];
-    if (fseeko(f.get(), static_cast<off_t>(off), SEEK_SET) != 0 ||
-        std::fread(dst, sizeof(fcomplex), ns, f.get()) != static_cast<std::size_t>(ns)) {
+    if (f.pread(dst, lineBytes, off) != lineBytes) {
       ORV_REPORT("File reading failed! " + input.rasterFile, REPORT_ERROR);
       return STATUS_READ_FAILED;
     }

@@ -7,6 +7,7 @@
 
 #include <algorithm>
 #include <bit>
+#include <climits>
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
@@ -97,6 +98,37 @@ int64_t RasterStream::pwrite(const void* src, int64_t n, int64_t position) const
     done += put;
   }
   return done;
+}
+
+bool RasterStream::pwriteRows(const void* src, int64_t pitch, int64_t rowBytes, int64_t rows,
+                              int64_t position) const {
+  if (rows <= 0 || rowBytes <= 0) return true;
+  if (fd_ < 0 || position < 0) return false;
+  if (pitch == rowBytes) return pwrite(src, rows * rowBytes, position) == rows * rowBytes;
+  const char* from = static_cast<const char*>(src);
+  std::vector<iovec> iov;
+  for (int64_t r0 = 0; r0 < rows; r0 += IOV_MAX) {
+    const int64_t n = std::min<int64_t>(IOV_MAX, rows - r0);
+    iov.resize(size_t(n));
+    for (int64_t r = 0; r < n; ++r)
+      iov[size_t(r)] = {const_cast<char*>(from + (r0 + r) * pitch), size_t(rowBytes)};
+    int64_t at = position + r0 * rowBytes;
+    size_t first = 0;
+    while (first < iov.size()) {
+      const ssize_t put = ::pwritev(fd_, iov.data() + first, int(iov.size() - first), off_t(at));
+      if (put < 0 && errno == EINTR) continue;
+      if (put <= 0) return false;
+      at += put;
+      // Skip what was written; a row written in part continues where it stopped.
+      size_t left = size_t(put);
+      while (first < iov.size() && left >= iov[first].iov_len) left -= iov[first++].iov_len;
+      if (left > 0) {
+        iov[first].iov_base = static_cast<char*>(iov[first].iov_base) + left;
+        iov[first].iov_len -= left;
+      }
+    }
+  }
+  return true;
 }
 
 int64_t RasterStream::preadv(char* const* dst, const int64_t* len, int count,

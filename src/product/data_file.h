@@ -31,6 +31,11 @@ class RasterStream {
   // error before any byte moved.
   int64_t pread(void* dst, int64_t n, int64_t position) const;
   int64_t pwrite(const void* src, int64_t n, int64_t position) const;
+  // Gather write: `rows` rows of rowBytes, `pitch` bytes apart from src, one
+  // after the other from `position`, straight from memory (no stream buffer,
+  // no page of the file zeroed ahead of the copy as a shared mapping of a
+  // fresh file does). False on any failed or short write.
+  bool pwriteRows(const void* src, int64_t pitch, int64_t rowBytes, int64_t rows, int64_t position) const;
   // Current size of the file, -1 on error.
   int64_t size() const;
   // Scatter read: `count` pieces of lengths len[i] into dst[i] (a null dst
