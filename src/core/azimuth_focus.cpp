@@ -200,7 +200,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
       ORV_REPORT(files.input, REPORT_ERROR);
       return STATUS_NOT_OPENED;
     }
-    if (!out.open(files.output, "wb")) {
+    if (!out.open(files.output, "w+b")) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
       ORV_REPORT(files.output, REPORT_ERROR);
       return STATUS_NOT_OPENED;
@@ -259,8 +259,8 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
         std::memmove(scene.buffer + (outRow + r) * outSamples,
                      blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * samples,
                      sizeof(fcomplex) * outSamples);
-    } else if (!out.pwriteRows(blockBuf.data() + static_cast<std::size_t>(A / 2) * samples,
-                               static_cast<long long>(rowBytes), outRowBytes, rows, outRow * outRowBytes)) {
+    } else if (!out.putRowsShared(blockBuf.data() + static_cast<std::size_t>(A / 2) * samples,
+                                  static_cast<long long>(rowBytes), outRowBytes, rows, outRow * outRowBytes)) {
       if (scene.verbose) waitbar_close();
       ORV_REPORT("File writing failed!", REPORT_ERROR);
       ORV_REPORT(files.output, REPORT_ERROR);

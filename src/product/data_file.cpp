@@ -1,6 +1,7 @@
 #include "product/data_file.h"
 
 #include <fcntl.h>
+#include <sys/mman.h>
 #include <sys/stat.h>
 #include <sys/uio.h>
 #include <unistd.h>
@@ -127,6 +128,35 @@ bool RasterStream::pwriteRows(const void* src, int64_t pitch, int64_t rowBytes, 
         iov[first].iov_len -= left;
       }
     }
+  }
+  return true;
+}
+
+bool RasterStream::putRowsShared(const void* src, int64_t pitch, int64_t rowBytes, int64_t rows,
+                                 int64_t position) const {
+  if (rows <= 0 || rowBytes <= 0) return true;
+  if (fd_ < 0 || position < 0) return false;
+  const bool readable = (fcntl(fd_, F_GETFL) & O_ACCMODE) == O_RDWR;
+  if (!readable || fallocate(fd_, 0, off_t(position), off_t(rows * rowBytes)) != 0) {
+    if (readable && errno != EOPNOTSUPP && errno != ENOSYS && errno != EINVAL) return false;
+    return pwriteRows(src, pitch, rowBytes, rows, position);
+  }
+  constexpr int64_t kWindowBytes = int64_t(32) << 20;
+  const int64_t page = sysconf(_SC_PAGESIZE);
+  const int64_t perWindow = std::max<int64_t>(1, kWindowBytes / rowBytes);
+  const char* from = static_cast<const char*>(src);
+  for (int64_t r0 = 0; r0 < rows; r0 += perWindow) {
+    const int64_t n = std::min(perWindow, rows - r0);
+    const int64_t offset = position + r0 * rowBytes;
+    const int64_t base = offset / page * page;
+    const size_t length = size_t(offset - base + n * rowBytes);
+    void* m = mmap(nullptr, length, PROT_READ | PROT_WRITE, MAP_SHARED, fd_, off_t(base));
+    if (m == MAP_FAILED) return false;
+    char* dst = static_cast<char*>(m) + (offset - base);
+    const char* rowsFrom = from + r0 * pitch;
+#pragma omp parallel for schedule(static)
+    for (int64_t r = 0; r < n; ++r) std::memcpy(dst + r * rowBytes, rowsFrom + r * pitch, size_t(rowBytes));
+    if (munmap(m, length) != 0) return false;
   }
   return true;
 }
