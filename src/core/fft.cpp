@@ -2,6 +2,7 @@
 #include "base/status.h"
 
 #include <fftw3.h>
+#include <sys/mman.h>
 
 #include <algorithm>
 #include <atomic>
@@ -561,6 +562,17 @@ int czt_c(const fcomplex* in, int M, fcomplex* out, int K, double a, double b, i
 
 void* fft_malloc(std::size_t bytes) {
   constexpr std::size_t kAlign = 64;
+  // Blocks of many megabytes (azimuth blocks, range passes) start on a huge
+  // page and ask for huge pages: a column pass touches one page per row, so
+  // with 4 KiB pages it misses the address translation cache on every row,
+  // and a fresh block costs one fault per 4 KiB.
+  constexpr std::size_t kHuge = std::size_t(2) << 20;
+  if (bytes >= 4 * kHuge) {
+    const std::size_t rounded = (bytes + kHuge - 1) / kHuge * kHuge;
+    void* p = std::aligned_alloc(kHuge, rounded);
+    if (p) madvise(p, rounded, MADV_HUGEPAGE);  // advice only: a refusal changes nothing
+    return p;
+  }
   std::size_t rounded = (bytes + kAlign - 1) / kAlign * kAlign;
   if (rounded == 0) rounded = kAlign;
   return std::aligned_alloc(kAlign, rounded);
