@@ -3,8 +3,11 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdio>
+#include <functional>
+#include <future>
 #include <memory>
 #include <new>
+#include <utility>
 #include <vector>
 
 #include "base/constants.h"
@@ -205,9 +208,11 @@ int setprocbuf(DcEstInput& input, DcEstState& st) {
 
   const size_t blockSamples = size_t(st.blocks) * size_t(st.blockl);
   try {
-    if (!st.inMemory)
-      st.readBuf.assign(size_t(st.rowsPerRead) * size_t(st.blockl) * size_t(input.samples),
-                        fcomplex{});
+    if (!st.inMemory) {
+      const size_t n = size_t(st.rowsPerRead) * size_t(st.blockl) * size_t(input.samples);
+      st.readBuf.assign(n, fcomplex{});
+      if (m >= 2 * int64_t(st.rowsPerRead) && st.rowsPerRead < st.nBinsY) st.readAhead.assign(n, fcomplex{});
+    }
     st.bins.assign(size_t(st.nBinsX) * size_t(st.nBinsY), DcBin{});
     st.mlbfBlocks.assign(size_t(st.nBest), MlbfBlock{});
     for (MlbfBlock& b : st.mlbfBlocks) {
@@ -290,17 +295,33 @@ int getnadcbins(DcEstInput& input, DcEstState& st) {
   const size_t binRowSamples = size_t(st.blockl) * lineSamples;
   const int total = st.nBinsX * st.nBinsY;
   int done = 0;
+  // Reads the bin rows from row0 on into buf, in host byte order.
+  auto readRows = [&](int row0, std::vector<fcomplex>& buf) {
+    const size_t n = size_t(std::min(st.rowsPerRead, st.nBinsY - row0)) * binRowSamples;
+    if (std::fread(buf.data(), sizeof(fcomplex), n, file.get()) != n) return false;
+    toHostOrder(buf.data(), n, input.byteOrder);
+    return true;
+  };
+  std::future<bool> ahead;
   for (int row0 = 0; row0 < st.nBinsY; row0 += st.rowsPerRead) {
     const int rows = std::min(st.rowsPerRead, st.nBinsY - row0);
     const fcomplex* base = nullptr;
     if (st.inMemory) {
       base = st.data + size_t(row0) * binRowSamples;
     } else {
-      const size_t n = size_t(rows) * binRowSamples;
-      if (std::fread(st.readBuf.data(), sizeof(fcomplex), n, file.get()) != n)
-        return DC_FAIL("File reading failed! " + input.rasterFile, STATUS_READ_FAILED);
-      toHostOrder(st.readBuf.data(), n, input.byteOrder);
+      bool ok;
+      if (ahead.valid()) {
+        ok = ahead.get();
+        std::swap(st.readBuf, st.readAhead);
+      } else {
+        ok = readRows(row0, st.readBuf);
+      }
+      if (!ok) return DC_FAIL("File reading failed! " + input.rasterFile, STATUS_READ_FAILED);
       base = st.readBuf.data();
+      const int next = row0 + st.rowsPerRead;
+      if (!st.readAhead.empty() && next < st.nBinsY) {
+        ahead = std::async(std::launch::async, readRows, next, std::ref(st.readAhead));
+      }
     }
     for (int r = 0; r < rows; ++r) {
       scanBinRow(base + size_t(r) * binRowSamples, input.samples, (row0 + r) * st.blockl,
@@ -363,7 +384,10 @@ int getnadcpoly(DcEstInput& input, DcEstState& st, double poly[7]) {
   }
   if (int s = infodump(input, st, poly); s != 0) return DC_CALLED(s);
 
-  if (!st.inMemory) std::vector<fcomplex>().swap(st.readBuf);
+  if (!st.inMemory) {
+    std::vector<fcomplex>().swap(st.readBuf);
+    std::vector<fcomplex>().swap(st.readAhead);
+  }
   std::vector<fcomplex>().swap(st.blockBuf);
   std::vector<fcomplex>().swap(st.blockBuf2);
   return STATUS_OK;

@@ -359,15 +359,21 @@ int multimlbf(DcEstState& st, int blockIndex) {
         const fcomplex* line = &st.blockBuf[static_cast<std::size_t>(l) * ns];
         for (int j = 0; j < nd; ++j) {
           const int n = j * dec;
-          std::complex<double> a(0.0, 0.0), b(0.0, 0.0);
-          for (int k = 0; k < set.fLength; ++k) {
-            const int m = n + half - k;
-            if (m < 0 || m >= ns) continue;
-            const std::complex<double> x(line[m]);
-            a += std::complex<double>(up[k]) * x;
-            b += std::complex<double>(down[k]) * x;
+          // Taps whose sample lies inside the line, in ascending order.
+          const int k0 = std::max(0, n + half - (ns - 1));
+          const int k1 = std::min(set.fLength - 1, n + half);
+          double ar = 0.0, ai = 0.0, br = 0.0, bi = 0.0;
+          for (int k = k0; k <= k1; ++k) {
+            const fcomplex x = line[n + half - k];
+            const double xr = x.real(), xi = x.imag();
+            const double ur = up[k].real(), ui = up[k].imag();
+            const double dr = down[k].real(), di = down[k].imag();
+            ar += ur * xr - ui * xi;
+            ai += ur * xi + ui * xr;
+            br += dr * xr - di * xi;
+            bi += dr * xi + di * xr;
           }
-          std::complex<double> z = a * std::conj(b);
+          std::complex<double> z = std::complex<double>(ar, ai) * std::conj(std::complex<double>(br, bi));
           const double mag = std::abs(z);
           z /= std::max(mag, static_cast<double>(FLT_MIN));
           beat[static_cast<std::size_t>(j) * nl + l] = fcomplex(z);

@@ -105,9 +105,11 @@ struct DcEstState {
   std::vector<float> contrastPow;
   std::vector<float> contrastMap;
 
-  // Read buffer and its size in bin rows.
+  // Read buffer and its size in bin rows; where the memory budget holds
+  // two, the next rows are read into the second while the first is scanned.
   int rowsPerRead = 0;
   std::vector<fcomplex> readBuf;
+  std::vector<fcomplex> readAhead;
 
   // Results of the ambiguity estimation, for the resume file.
   int mlbfGood = 0;          // good MLBF estimates
