@@ -528,6 +528,7 @@ namespace {
 // the replica, the range focuser's work, the Doppler polynomials and the
 // result of azimuth focusing, handed from one step to the next.
 struct ChainRun {
+  explicit ChainRun(SARFocuser_conf& c) : conf(c) {}
   SARFocuser_conf& conf;
   ChainContext ctx;
   GeneralRAWData rawRecord;
@@ -809,7 +810,7 @@ int ChainRun::writeFocusedRecord() {
 }  // namespace
 
 int SARFocuser::process() {
-  ChainRun run{.conf = *conf_};
+  ChainRun run(*conf_);
   SARFocuser_conf& conf = run.conf;
   ChainContext& ctx = run.ctx;
 
