@@ -224,7 +224,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
       std::memcpy(blockBuf.data(), scene.buffer + readPos * samples, rowBytes * blockLines);
     } else {
       const long long blockBytes = static_cast<long long>(rowBytes) * blockLines;
-      if (in.pread(blockBuf.data(), blockBytes, readPos * static_cast<long long>(rowBytes)) != blockBytes) {
+      if (in.preadShared(blockBuf.data(), blockBytes, readPos * static_cast<long long>(rowBytes)) != blockBytes) {
         if (scene.verbose) waitbar_close();
         ORV_REPORT("File reading failed!", REPORT_ERROR);
         ORV_REPORT(files.input, REPORT_ERROR);

@@ -132,6 +132,19 @@ bool RasterStream::pwriteRows(const void* src, int64_t pitch, int64_t rowBytes, 
   return true;
 }
 
+int64_t RasterStream::preadShared(void* dst, int64_t n, int64_t position) const {
+  constexpr int64_t kPart = int64_t(16) << 20;
+  const int64_t parts = std::max<int64_t>(1, (n + kPart - 1) / kPart);
+  char* to = static_cast<char*>(dst);
+  bool whole = true;
+#pragma omp parallel for schedule(static) reduction(&& : whole)
+  for (int64_t p = 0; p < parts; ++p) {
+    const int64_t at = p * kPart, len = std::min(kPart, n - at);
+    whole = pread(to + at, len, position + at) == len && whole;
+  }
+  return whole ? n : -1;
+}
+
 bool RasterStream::putRowsShared(const void* src, int64_t pitch, int64_t rowBytes, int64_t rows,
                                  int64_t position) const {
   if (rows <= 0 || rowBytes <= 0) return true;

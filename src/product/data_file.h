@@ -30,6 +30,9 @@ class RasterStream {
   // Bytes transferred (short only at end of file or on error), -1 on an
   // error before any byte moved.
   int64_t pread(void* dst, int64_t n, int64_t position) const;
+  // The same read split between the threads, each copying its part out of
+  // the page cache. n when every part was read whole, else -1.
+  int64_t preadShared(void* dst, int64_t n, int64_t position) const;
   int64_t pwrite(const void* src, int64_t n, int64_t position) const;
   // Gather write: `rows` rows of rowBytes, `pitch` bytes apart from src, one
   // after the other from `position`, straight from memory (no stream buffer,
