@@ -157,10 +157,10 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     return st;
   }
 
-  File in;
-  RasterStream out;
+  RasterStream in, out;
   int P = 0, q = 0, passes = 0;
   std::vector<int> fileShift;
+  std::vector<float> swst;  // SWST prefixes of the lines of a pass
   // File path: a pass is written while the next one is read and compressed,
   // from the other of two buffers.
   FFTBuffer spare;
@@ -181,10 +181,8 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     q = 0;
     passes = 1;
   } else {
-    in.reset(std::fopen(params.inputFile.c_str(), "rb"));
-    if (!in) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
+    if (!in.open(params.inputFile, "rb")) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
     if (!out.open(params.outputFile, "wb")) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
-    std::setvbuf(in.get(), nullptr, _IOFBF, 1 << 20);
     P = work.linesPerBlock > 0 ? work.linesPerBlock : kDefaultLinesPerBlock;
     P = std::max(1, std::min(P, std::max(lines, 1)));
     q = lines / P;
@@ -193,6 +191,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
       work.data.assign(static_cast<std::size_t>(N) * P, fcomplex(0.0f, 0.0f));
       if (passes > 1) spare.assign(static_cast<std::size_t>(N) * P, fcomplex(0.0f, 0.0f));
       fileShift.assign(P, 0);
+      swst.assign(P, 0.0f);
     } catch (const std::bad_alloc&) {
       return RF_FAIL("Memory allocation failed", STATUS_NO_MEMORY);
     }
@@ -208,20 +207,47 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     const int* shifts = work.incore ? work.shift.data() : fileShift.data();
 
     if (!work.incore) {
+      // The lines (SWST prefix, then samples) go straight into the rows, read
+      // by the threads side by side in scatter reads of up to 256 lines.
+      const long long prefixBytes = work.prefix ? static_cast<long long>(sizeof(float)) : 0;
+      const long long lineBytes = prefixBytes + static_cast<long long>(S) * static_cast<long long>(sizeof(fcomplex));
+      constexpr int kChunk = 256;
+      const int chunks = (nl + kChunk - 1) / kChunk;
+      std::vector<long long> got(chunks, 0);
+#pragma omp parallel for schedule(static)
+      for (int c = 0; c < chunks; ++c) {
+        const int l0 = c * kChunk, count = std::min(kChunk, nl - l0);
+        char* to[2 * kChunk];
+        int64_t len[2 * kChunk];
+        int pieces = 0;
+        for (int l = l0; l < l0 + count; ++l) {
+          if (work.prefix) {
+            to[pieces] = reinterpret_cast<char*>(&swst[l]);
+            len[pieces++] = prefixBytes;
+          }
+          to[pieces] = reinterpret_cast<char*>(data + static_cast<std::size_t>(l) * N);
+          len[pieces++] = lineBytes - prefixBytes;
+        }
+        got[c] = std::max<int64_t>(0, in.preadv(to, len, pieces, (static_cast<long long>(first) + l0) * lineBytes));
+      }
+      // Bytes of the pass read without a gap: a short chunk is the end of the file.
+      long long avail = 0;
+      for (int c = 0; c < chunks; ++c) {
+        avail += got[c];
+        if (got[c] < static_cast<long long>(std::min(kChunk, nl - c * kChunk)) * lineBytes) break;
+      }
       for (int l = 0; l < nl; ++l) {
         fcomplex* row = data + static_cast<std::size_t>(l) * N;
         std::fill(row + S, row + N, fcomplex(0.0f, 0.0f));  // zero padding
         fileShift[l] = 0;
         if (work.prefix) {
-          float swst = 0.0f;
-          if (std::fread(&swst, sizeof swst, 1, in.get()) != 1)
+          if (avail < l * lineBytes + prefixBytes)
             return RF_FAIL_AFTER_WRITE("File reading failed!", STATUS_READ_FAILED);
-          if (!lineShift((static_cast<double>(swst) - params.swstMin) * params.fs, z.maxShift,
+          if (!lineShift((static_cast<double>(swst[l]) - params.swstMin) * params.fs, z.maxShift,
                          fileShift[l]))
             return RF_FAIL_AFTER_WRITE(wrongSwst(first + l).c_str(), STATUS_BAD_CONDITION);
         }
-        if (std::fread(row, sizeof(fcomplex), S, in.get()) !=
-            static_cast<std::size_t>(S))
+        if (avail < (l + 1) * lineBytes)
           return RF_FAIL_AFTER_WRITE("File reading failed!", STATUS_READ_FAILED);
       }
     }
