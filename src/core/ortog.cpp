@@ -226,58 +226,97 @@ double sum4(const double (&s)[4]) { return (s[0] + s[1]) + (s[2] + s[3]); }
 }  // namespace
 
 int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
-  if (samples < 1) return 0;
+  if (samples < 1 || lines < 1) return 0;
   OrtogNState& st = g_ortogN;
-  std::vector<float> I(samples), Q(samples);
   auto smooth = [block](double& state, double value) {
     state = block == 0 ? value : kKeep * state + kTake * value;
   };
+  auto rowOf = [&](int l) { return data + static_cast<std::size_t>(l) * pitch; };
+  // The sums of a line are independent of the other lines; the smoothed
+  // statistics run through the lines in order. So each of the three sums
+  // goes over all lines on all threads, and the statistics follow in a
+  // short pass in line order (a line of block 0 restarts them; an empty
+  // line leaves them as they are and passes unchanged). Sums over a line run
+  // in four interleaved partial sums (sample k into sum k mod 4, added
+  // pairwise at the end), so that neighbouring additions do not wait for
+  // each other.
+  std::vector<double> a(lines), b(lines), c(lines);
+  std::vector<float> smi(lines), smq(lines), ratio(lines), sinSkew(lines), invCos(lines);
+  std::vector<char> empty(lines);
+#pragma omp parallel for schedule(static)
   for (int l = 0; l < lines; ++l) {
-    fcomplex* row = data + static_cast<std::size_t>(l) * pitch;
-    if (block == 0) st = OrtogNState{};
-    // Sums over a line run in four interleaved partial sums (sample k into
-    // sum k mod 4, added pairwise at the end), so that the additions of
-    // neighbouring samples do not wait for each other.
+    const fcomplex* row = rowOf(l);
     double si4[4] = {}, sq4[4] = {};
     for (int k = 0; k < samples; ++k) {
-      I[k] = row[k].real();
-      Q[k] = row[k].imag();
-      si4[k & 3] += I[k];
-      sq4[k & 3] += Q[k];
+      si4[k & 3] += row[k].real();
+      sq4[k & 3] += row[k].imag();
     }
-    const double si = sum4(si4), sq = sum4(sq4);
-    const double mi = si / samples, mq = sq / samples;
-    if (mi == 0.0) continue;  // an empty line passes unchanged
-    smooth(st.meanI, mi);
-    smooth(st.meanQ, mq);
-    const float smi = static_cast<float>(st.meanI), smq = static_cast<float>(st.meanQ);
+    a[l] = sum4(si4) / samples;
+    b[l] = sum4(sq4) / samples;
+  }
+  for (int l = 0; l < lines; ++l) {
+    if (block == 0) st.meanI = st.meanQ = 0.0;
+    empty[l] = a[l] == 0.0;
+    if (empty[l]) continue;
+    smooth(st.meanI, a[l]);
+    smooth(st.meanQ, b[l]);
+    smi[l] = static_cast<float>(st.meanI);
+    smq[l] = static_cast<float>(st.meanQ);
+  }
+#pragma omp parallel for schedule(static)
+  for (int l = 0; l < lines; ++l) {
+    if (empty[l]) continue;
+    const fcomplex* row = rowOf(l);
     double pi4[4] = {}, pq4[4] = {};
     for (int k = 0; k < samples; ++k) {
-      I[k] -= smi;
-      Q[k] -= smq;
-      pi4[k & 3] += static_cast<double>(I[k]) * I[k];
-      pq4[k & 3] += static_cast<double>(Q[k]) * Q[k];
+      const float I = row[k].real() - smi[l], Q = row[k].imag() - smq[l];
+      pi4[k & 3] += static_cast<double>(I) * I;
+      pq4[k & 3] += static_cast<double>(Q) * Q;
     }
-    const double pi = sum4(pi4), pq = sum4(pq4);
-    smooth(st.levelI, std::sqrt(pi / samples));
-    smooth(st.levelQ, std::sqrt(pq / samples));
-    const float ratio = st.levelQ > 1e-08 ? static_cast<float>(st.levelI / st.levelQ) : 1.0f;
+    a[l] = sum4(pi4);
+    b[l] = sum4(pq4);
+  }
+  for (int l = 0; l < lines; ++l) {
+    if (block == 0) st.levelI = st.levelQ = 0.0;
+    if (empty[l]) continue;
+    smooth(st.levelI, std::sqrt(a[l] / samples));
+    smooth(st.levelQ, std::sqrt(b[l] / samples));
+    ratio[l] = st.levelQ > 1e-08 ? static_cast<float>(st.levelI / st.levelQ) : 1.0f;
+  }
+#pragma omp parallel for schedule(static)
+  for (int l = 0; l < lines; ++l) {
+    if (empty[l]) continue;
+    const fcomplex* row = rowOf(l);
     double cross4[4] = {}, ii4[4] = {}, qq4[4] = {};
     for (int k = 0; k < samples; ++k) {
-      Q[k] *= ratio;
-      cross4[k & 3] += static_cast<double>(I[k]) * Q[k];
-      ii4[k & 3] += static_cast<double>(I[k]) * I[k];
-      qq4[k & 3] += static_cast<double>(Q[k]) * Q[k];
+      const float I = row[k].real() - smi[l], Q = (row[k].imag() - smq[l]) * ratio[l];
+      cross4[k & 3] += static_cast<double>(I) * Q;
+      ii4[k & 3] += static_cast<double>(I) * I;
+      qq4[k & 3] += static_cast<double>(Q) * Q;
     }
-    const double cross = sum4(cross4), ii = sum4(ii4), qq = sum4(qq4);
-    smooth(st.cross, cross);
-    smooth(st.powI, ii);
-    smooth(st.powQ, qq);
+    a[l] = sum4(cross4);
+    b[l] = sum4(ii4);
+    c[l] = sum4(qq4);
+  }
+  for (int l = 0; l < lines; ++l) {
+    if (block == 0) st.cross = st.powI = st.powQ = 0.0;
+    if (empty[l]) continue;
+    smooth(st.cross, a[l]);
+    smooth(st.powI, b[l]);
+    smooth(st.powQ, c[l]);
     // Block 0 runs on per-line values and leaves the skew alone.
     const double ph = block == 0 ? 0.0 : skewOf(st.cross, st.powI, st.powQ);
-    const float s = static_cast<float>(std::sin(ph));
-    const float invCos = static_cast<float>(1.0 / std::cos(ph));
-    for (int k = 0; k < samples; ++k) row[k] = fcomplex(I[k], (Q[k] - I[k] * s) * invCos);
+    sinSkew[l] = static_cast<float>(std::sin(ph));
+    invCos[l] = static_cast<float>(1.0 / std::cos(ph));
+  }
+#pragma omp parallel for schedule(static)
+  for (int l = 0; l < lines; ++l) {
+    if (empty[l]) continue;
+    fcomplex* row = rowOf(l);
+    for (int k = 0; k < samples; ++k) {
+      const float I = row[k].real() - smi[l], Q = (row[k].imag() - smq[l]) * ratio[l];
+      row[k] = fcomplex(I, (Q - I * sinSkew[l]) * invCos[l]);
+    }
   }
   return 0;
 }
