@@ -331,14 +331,12 @@ struct LSRows {
       // gain sums over the processed band in four partial sums added in a
       // fixed order.
       float* W = rb.weight.data();
-      bool silent = false;
+      // First and last sample of non-zero weight.
+      int wlo = 0, whi = padded - 1;
       if (weighted) {
-        bool any = false;
-        for (int i = 0; i < padded; ++i) {
-          W[i] = static_cast<float>(rowTerm[i] * (rwin ? rwin[i] : 1.0));
-          any |= W[i] != 0.0f;
-        }
-        silent = !any;
+        for (int i = 0; i < padded; ++i) W[i] = static_cast<float>(rowTerm[i] * (rwin ? rwin[i] : 1.0));
+        while (wlo < padded && W[wlo] == 0.0f) ++wlo;
+        while (whi > wlo && W[whi] == 0.0f) --whi;
         double n4[4] = {0.0, 0.0, 0.0, 0.0}, d4[4] = {0.0, 0.0, 0.0, 0.0};
         for (int i = band0; i < band1; ++i) {
           const double P = rowP[i], w = W[i];
@@ -351,7 +349,7 @@ struct LSRows {
       // A row the azimuth window leaves out (a fifth of them with a window
       // over 80 % of the band) focuses to zeros: it keeps its gain sums and
       // skips the transforms and the interpolation.
-      if (silent) {
+      if (wlo == padded) {
         grid.store(j, line, n);
         return;
       }
@@ -394,6 +392,8 @@ struct LSRows {
         const double u = roundHalfAway(x);
         const int iu = static_cast<int>(u);
         if (iu < 0 || iu >= padded) continue;
+        // Taps that reach only samples of zero weight give zero.
+        if (iu + H < wlo || iu - H > whi) continue;
         const int r = static_cast<int>(roundHalfAway((x - u) / 0.01)) + 50;
         line[grid.idx[q]] = mul(taps.apply(r, buf + iu), back[q]);
       }
