@@ -364,17 +364,20 @@ struct LSRows {
       const double azPhase = kx[j] * az;
       double* phase = rb.phase.data();
       const double kx2j = kx2[j];
-      for (int i = 0; i < padded; ++i) {
+      // Samples of zero weight stay zero; the others get the reference phase,
+      // their weight and the scale.
+      for (int i = wlo; i <= whi; ++i) {
         const double k = kin[i];
         phase[i] = (std::sqrt(k * k - kx2j) - kzc) * R2 - (k - k0) * rg + azPhase;
       }
       const float* cs = rb.cosv.data();
       const float* sn = rb.sinv.data();
-      wk_phasors(phase, padded, rb.cosv.data(), rb.sinv.data());
-      // Reference phase, weight and scale of every sample.
+      wk_phasors(phase + wlo, whi - wlo + 1, rb.cosv.data() + wlo, rb.sinv.data() + wlo);
       float* sp = reinterpret_cast<float*>(spectrum);
       const float im = conj ? -1.0f : 1.0f;
-      for (int i = 0; i < padded; ++i) {
+      std::fill(spectrum, spectrum + wlo, fcomplex(0.0f, 0.0f));
+      std::fill(spectrum + whi + 1, spectrum + padded, fcomplex(0.0f, 0.0f));
+      for (int i = wlo; i <= whi; ++i) {
         const float re = sp[2 * i], ii = im * sp[2 * i + 1];
         const float ws = W[i] * scale;
         sp[2 * i] = (re * cs[i] - ii * sn[i]) * ws;
