@@ -94,13 +94,6 @@ TEST(FourierInterpolation, TonesAlongRowsAndColumnsStayTones) {
 
 TEST(StripMultilook, ConstantImageKeepsItsValueCoherentlyAndInAmplitude) {
   const std::string dir = record_test::freshDir();
-  struct Cleanup {
-    std::string dir;
-    ~Cleanup() {
-      std::error_code ec;
-      std::filesystem::remove_all(dir, ec);
-    }
-  } cleanup{dir};
   const std::string slc = dir + "/slc";
   const fcomplex value(0.75f, -1.0f);
   constantProduct(slc, 9, 12, value);

@@ -50,6 +50,19 @@ inline const char* binDir() { return TESSIVOR_BINARY_DIR "/bin/"; }
 inline const char* realData() { return TESSIVOR_REALDATA_DIR; }
 inline bool realDataPresent() { return fs::is_directory(TESSIVOR_REALDATA_DIR); }
 
+// A test with a scratch folder of its own: path() names a file in it, make()
+// writes one and returns its path, slurp() reads a file back.
+class ScratchFolderTest : public ::testing::Test {
+ protected:
+  std::string path(const std::string& name) const { return dir / name; }
+  std::string make(const std::string& name, const std::string& text) const {
+    writeText(path(name), text);
+    return path(name);
+  }
+  static std::string slurp(const std::string& file) { return readText(file); }
+  TempFolder dir{"params"};
+};
+
 // A working folder per test with the focuser's environment variables (working
 // folder, progress file, catalogues of the source tree, tracing on); the
 // report, error and environment state starts and ends empty. With
