@@ -3,6 +3,7 @@
 // and a working-folder fixture with the run-time environment of the focuser.
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <filesystem>
 #include <string>
 #include <vector>
@@ -38,7 +39,15 @@ class TempFolder {
 std::string readText(const std::string& file);
 void writeText(const std::string& file, const std::string& text);  // makes the parent folders
 std::vector<unsigned char> readBytes(const std::string& file);
-std::vector<fcomplex> readComplex(const std::string& file);
+// The whole file as cells of T (a trailing part cell is dropped).
+template <class T>
+std::vector<T> readValues(const std::string& file) {
+  const std::vector<unsigned char> bytes = readBytes(file);
+  std::vector<T> out(bytes.size() / sizeof(T));
+  std::memcpy(out.data(), bytes.data(), out.size() * sizeof(T));
+  return out;
+}
+inline std::vector<fcomplex> readComplex(const std::string& file) { return readValues<fcomplex>(file); }
 inline bool contains(const std::string& text, const std::string& part) {
   return text.find(part) != std::string::npos;
 }
