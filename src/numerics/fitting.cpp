@@ -110,44 +110,6 @@ int lfit_mod(const NrVector<double>& y, const NrVector<double>& sig, int ndat, N
   return status;
 }
 
-int svdfit(const NrVector<double>& x, const NrVector<double>& y, const NrVector<double>& sig,
-           int ndata, NrVector<double>& a, int ma, NrMatrix<double>& u, NrMatrix<double>& v,
-           NrVector<double>& w, double* chisq, const BasisFunction& funcs) {
-  try {
-    NrVector<double> b(1, ndata), afunc(1, ma);
-    for (int i = 1; i <= ndata; ++i) {
-      funcs(x[i], afunc, ma);
-      const double inv = 1.0 / sig[i];
-      for (int j = 1; j <= ma; ++j) u[i][j] = afunc[j] * inv;
-      b[i] = y[i] * inv;
-    }
-    const int status = svdcmp(u, ndata, ma, w, v);
-    if (status != STATUS_OK) {
-      ORV_REPORT_CALLED_ERROR();
-      return status;
-    }
-    double wmax = 0.0;
-    for (int j = 1; j <= ma; ++j) wmax = std::max(wmax, w[j]);
-    const double thresh = 1e-5 * wmax;
-    for (int j = 1; j <= ma; ++j)
-      if (w[j] < thresh) w[j] = 0.0;
-    svbksb(u, w, v, ndata, ma, b, a);
-    double chi = 0.0;
-    for (int i = 1; i <= ndata; ++i) {
-      funcs(x[i], afunc, ma);
-      double s = 0.0;
-      for (int j = 1; j <= ma; ++j) s += a[j] * afunc[j];
-      const double r = (y[i] - s) / sig[i];
-      chi += r * r;
-    }
-    if (chisq) *chisq = chi;
-  } catch (const std::bad_alloc&) {
-    ORV_REPORT("Out of memory", REPORT_ERROR);
-    return STATUS_NO_MEMORY;
-  }
-  return STATUS_OK;
-}
-
 namespace {
 
 // Polynomial with ncoef coefficients (lowest power first) by the normal
@@ -199,12 +161,6 @@ int normalPolyFit(const double* x, const double* y, int n, double* out, int ncoe
 
 int polfit(const double* x, const double* y, int n, double* out, int m) {
   const int status = normalPolyFit(x, y, n, out, m + 1, nullptr);
-  if (status != STATUS_OK) ORV_REPORT_CALLED_ERROR();
-  return status;
-}
-
-int gen_polfit(int m, const double* x, const double* y, int n, double* out, double* err) {
-  const int status = normalPolyFit(x, y, n, out, m, err);
   if (status != STATUS_OK) ORV_REPORT_CALLED_ERROR();
   return status;
 }

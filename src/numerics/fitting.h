@@ -1,6 +1,6 @@
 #pragma once
 // Linear least-squares fits: general basis with a mask of fitted terms
-// (normal equations in extended precision), SVD fit, and polynomial fits.
+// (normal equations in extended precision) and polynomial fits.
 // Return 0 on success; failures are reported at level 0 with non-zero status.
 #include <functional>
 
@@ -29,19 +29,9 @@ int lfit_mod(const NrVector<double>& y, const NrVector<double>& sig, int ndat, N
              const NrVector<int>& ia, int ma, NrMatrix<double>& covar, double* chisq,
              const IndexedBasisFunction& funcs);
 
-// Fit by singular value decomposition: a[1..ma], with u[1..ndata][1..ma],
-// v[1..ma][1..ma], w[1..ma] as work and result; singular values below
-// 1e-5 times the largest are set to 0.
-int svdfit(const NrVector<double>& x, const NrVector<double>& y, const NrVector<double>& sig,
-           int ndata, NrVector<double>& a, int ma, NrMatrix<double>& u, NrMatrix<double>& v,
-           NrVector<double>& w, double* chisq, const BasisFunction& funcs);
-
 // Polynomial of degree m through n pairs (0-based arrays) by least squares;
 // out[0..m] lowest power first. Status 1 for a singular system or n < 1.
 int polfit(const double* x, const double* y, int n, double* out, int m);
-// Polynomial of order m - 1 (m coefficients, lowest power first) with the sum
-// of squared residuals in err (if given).
-int gen_polfit(int m, const double* x, const double* y, int n, double* out, double* err);
 // One polynomial per axis of order n - 1 through n equally spaced 3-vectors
 // pts[3 i + k] at times t0 + i dt; coefficients lowest power first in
 // cx, cy, cz (n each). With n points the fit interpolates exactly.

@@ -103,13 +103,8 @@ TEST(AzimuthFoc, FileAndInCoreFormsAgreeAndThreadsDoNotChangeBits) {
   EXPECT_EQ(fileScene.polyDCOut[0], 250.0);
   EXPECT_EQ(fileScene.polyFROut[7], s.scene.polyFR[7]);
   const std::size_t n = static_cast<std::size_t>(1000) * 224;
-  std::vector<fcomplex> fromFile(n);
-  {
-    std::ifstream f(s.files.output, std::ios::binary | std::ios::ate);
-    ASSERT_EQ(static_cast<std::size_t>(f.tellg()), n * sizeof(fcomplex));
-    f.seekg(0);
-    f.read(reinterpret_cast<char*>(fromFile.data()), static_cast<std::streamsize>(n * 8));
-  }
+  const std::vector<fcomplex> fromFile = support::readComplex(s.files.output);
+  ASSERT_EQ(fromFile.size(), n);
   EXPECT_EQ(std::memcmp(fromFile.data(), buf.data(), n * sizeof(fcomplex)), 0);
   // Both targets are focused: their peaks stand far above the clutter-free
   // background.

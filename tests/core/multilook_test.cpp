@@ -39,15 +39,6 @@ void constantProduct(const std::string& name, int lines, int samples, fcomplex v
   ASSERT_EQ(record.GSwrite(name + ".hdr"), 0);
 }
 
-template <class T>
-std::vector<T> readAll(const std::string& file) {
-  std::ifstream in(file, std::ios::binary | std::ios::ate);
-  std::vector<T> data(std::size_t(in.tellg()) / sizeof(T));
-  in.seekg(0);
-  in.read(reinterpret_cast<char*>(data.data()), std::streamsize(data.size() * sizeof(T)));
-  return data;
-}
-
 }  // namespace
 
 TEST(FourierInterpolation, TonesAlongRowsAndColumnsStayTones) {
@@ -94,13 +85,6 @@ TEST(FourierInterpolation, TonesAlongRowsAndColumnsStayTones) {
 
 TEST(StripMultilook, ConstantImageKeepsItsValueCoherentlyAndInAmplitude) {
   const std::string dir = record_test::freshDir();
-  struct Cleanup {
-    std::string dir;
-    ~Cleanup() {
-      std::error_code ec;
-      std::filesystem::remove_all(dir, ec);
-    }
-  } cleanup{dir};
   const std::string slc = dir + "/slc";
   const fcomplex value(0.75f, -1.0f);
   constantProduct(slc, 9, 12, value);
@@ -114,7 +98,7 @@ TEST(StripMultilook, ConstantImageKeepsItsValueCoherentlyAndInAmplitude) {
   ml.CoherentFlag = 1;
   ASSERT_EQ(ml.readSLCData(), 0);
   ASSERT_EQ(ml.coherml(), 0);
-  const auto coherent = readAll<fcomplex>(dir + "/coh");
+  const auto coherent = support::readValues<fcomplex>(dir + "/coh");
   ASSERT_EQ(coherent.size(), 3u * 3u);
   for (const fcomplex& v : coherent) EXPECT_NEAR(std::abs(v - value), 0.0, 1e-6);
   GeneralSAR record;
@@ -131,7 +115,7 @@ TEST(StripMultilook, ConstantImageKeepsItsValueCoherentlyAndInAmplitude) {
   ml.outputFullRootName = dir + "/amp";
   ASSERT_EQ(ml.readSLCData(), 0);
   ASSERT_EQ(ml.runall("", 0), 0);
-  const auto amplitude = readAll<float>(dir + "/amp");
+  const auto amplitude = support::readValues<float>(dir + "/amp");
   ASSERT_EQ(amplitude.size(), 4u * 4u);
   for (int o = 0; o < 4; ++o)
     for (int c = 0; c < 4; ++c) {

@@ -3,13 +3,10 @@
 #include "base/status.h"
 #include "diag/report.h"
 #include "diag/ckerr.h"
-#include "diag/report.h"
 #include "support/files.h"
 
 using namespace support;
-using DiagEnvironment = WorkingFolderTest;
-
-using Reports = DiagEnvironment;
+using Reports = WorkingFolderTest;
 
 TEST_F(Reports, LevelsReachTheirLogs) {
   const long before = report_count();

@@ -104,7 +104,6 @@ TEST(DcDriver, FractionalCentroidVaryingInRangeAndAzimuth) {
     EXPECT_TRUE(hasKey("WDAR_Ambiguity_estimation", "Legend", resume));
     FreeProfile(resume);
   }
-  std::filesystem::remove_all(dir);
 }
 
 TEST(DcDriver, BinRejectsUncorrelatedAndEmptyBlocks) {
@@ -182,5 +181,4 @@ TEST(DcDriver, FailuresEndWithTheirStatuses) {
     DcEstInput in = inputFor(rd, path, dir + "/no/such/dir", 512, 1024);
     EXPECT_EQ(getnadcpoly(in, st, poly), 9);
   }
-  std::filesystem::remove_all(dir);
 }

@@ -39,14 +39,6 @@ std::string commandOutput(const std::string& command) {
 
 bool haveGdal() { return std::system("command -v gdalinfo > /dev/null 2>&1") == 0; }
 
-// A whole raster of fixed-size cells read into memory.
-template <class T>
-std::vector<T> readRaster(const std::string& file, std::size_t cells) {
-  std::vector<T> data(cells);
-  std::ifstream(file, std::ios::binary).read(reinterpret_cast<char*>(data.data()), cells * sizeof(T));
-  return data;
-}
-
 double dB(double ratio) { return 10.0 * std::log10(ratio); }
 
 }  // namespace
@@ -103,7 +95,8 @@ TEST(ErsProducts, GeoTiffKmlEnviAndMultilookOfAFocusedScene) {
   EXPECT_TRUE(contains(envi, "Driver: ENVI/")) << envi;
   EXPECT_TRUE(contains(envi, "Size is " + std::to_string(S) + ", " + std::to_string(L))) << envi;
   EXPECT_TRUE(contains(envi, "Type=CFloat32")) << envi;
-  const std::vector<fcomplex> slc = readRaster<fcomplex>(product, std::size_t(L) * S);
+  const std::vector<fcomplex> slc = readValues<fcomplex>(product);
+  ASSERT_EQ(slc.size(), std::size_t(L) * S);
   const fcomplex probe = slc[std::size_t(L / 2) * S + S / 3];
   const std::string value = commandOutput("gdallocationinfo -valonly '" + product + "' " +
                                           std::to_string(S / 3) + " " + std::to_string(L / 2));
@@ -137,7 +130,7 @@ TEST(ErsProducts, GeoTiffKmlEnviAndMultilookOfAFocusedScene) {
   EXPECT_DOUBLE_EQ(out.FastTimeDelta, in.FastTimeDelta);
   EXPECT_NEAR(out.SlowTimeLength, OL * out.SlowTimeDelta, 1e-9);
   ASSERT_EQ(fs::file_size(dir / "look_mla"), std::uintmax_t(OL) * OS * 4u);
-  const std::vector<float> amp = readRaster<float>(dir / "look_mla", std::size_t(OL) * OS);
+  const std::vector<float> amp = readValues<float>(dir / "look_mla");
 
   auto slcPower = [&](int l0, int l1, int s0, int s1) {
     double e = 0.0;

@@ -3,19 +3,13 @@
 #include "focus/multiplatform_focuser.h"
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <filesystem>
-#include <fstream>
 #include <string>
 #include <vector>
 
 #include "focus/sensors/envisat.h"
 #include "focus/sensors/ers.h"
-#include "focus/sensors/palsar.h"
-#include "focus/sensors/radarsat.h"
-#include "focus/sar_focuser.h"
-#include "product/par_element.h"
 #include "support/files.h"
 
 namespace {
@@ -34,21 +28,6 @@ struct Scratch : support::TempFolder {
 
 const char* const kErsProfile = TESSIVOR_SOURCE_DIR "/resources/parameters_ERS.hdr";
 
-// An ERS job whose every file is given.
-void fillErsJob(ATmultiplatformFocuser& f, const Scratch& s) {
-  f.platform = "ERS";
-  f.level0Filename = s.path("scene") + "/DAT_01.001";
-  f.auxFile1 = s.touch("ODR.123");
-  f.auxFile2 = s.touch("LEA_01.001");
-  f.auxDirectory1.clear();
-  f.processingConfFilename = kErsProfile;
-  f.outputFilename = s.path("out");
-  f.ReportFilename = "ATmultiplatformFocuser.report";
-  f.skipLines = 3;
-  f.extractLines = 700;
-  f.Memory = 300;
-}
-
 // The MPH beginning of an ENVISAT product of the given type.
 std::string envisatHead(const std::string& product) {
   return "PRODUCT=\"" + product + std::string(80, ' ');
@@ -64,25 +43,6 @@ TEST(MultiplatformFocuser, CheckparRefusesNegativeLineCounts) {
   f.skipLines = 0;
   f.extractLines = -5;
   EXPECT_EQ(f.checkpar(), 1);
-}
-
-TEST(MultiplatformFocuser, ErsFocuserReceivesSceneFilesAndProfile) {
-  Scratch s;
-  ATmultiplatformFocuser f;
-  fillErsJob(f, s);
-  ASSERT_EQ(f.InitProcessing(), 0);
-  auto* ers = dynamic_cast<ersLevel0Focuser*>(f.sensorFocuser());
-  ASSERT_NE(ers, nullptr);
-  EXPECT_EQ(ers->level0Filename, f.level0Filename);
-  EXPECT_EQ(ers->orbitFilename, s.path("ODR.123"));
-  EXPECT_EQ(ers->LEAFilename, s.path("LEA_01.001"));
-  EXPECT_EQ(ers->configurationFilename, kErsProfile);
-  EXPECT_EQ(ers->outputFilename, s.path("out"));
-  EXPECT_EQ(ers->skipLines, 3);
-  EXPECT_EQ(ers->extractLines, 700);
-  EXPECT_EQ(ers->Memory, 300);
-  EXPECT_EQ(f.FinalizeProcessing("headerfile", 0), 0);
-  EXPECT_EQ(f.sensorFocuser(), nullptr);
 }
 
 TEST(MultiplatformFocuser, EnvisatFillsFourAuxiliaryFiles) {

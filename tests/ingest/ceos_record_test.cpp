@@ -9,13 +9,9 @@
 #include <vector>
 
 #include "ingest/ers/ers_ceos_layout.h"
+#include "support/files.h"
 
 namespace {
-
-std::vector<char> fileBytes(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
-}
 
 // The archive file, or a skip naming it when the folder is absent.
 #define REAL_FILE_OR_SKIP(var, name)                                                 \
@@ -30,7 +26,7 @@ TEST(ErsLayoutOnArchiveFiles, LeadersReadThroughTheFieldTables) {
   namespace dss = ers_leader::dss;
   namespace ppr = ers_leader::ppr;
   REAL_FILE_OR_SKIP(ers2, "ers2_2010_orbit77106/LEA_01.001");
-  const std::vector<char> bytes = fileBytes(ers2);
+  const std::vector<char> bytes = support::readValues<char>(ers2);
   const CeosRecord summary(bytes, ers_leader::kDataSetSummary);
   const CeosRecord position(bytes, ers_leader::kPlatformPosition);
   ASSERT_TRUE(summary.has(dss::kLastLineTime));
@@ -48,7 +44,7 @@ TEST(ErsLayoutOnArchiveFiles, LeadersReadThroughTheFieldTables) {
   EXPECT_FALSE(position.has({ppr::kVectorComponent.offset, 1000 * ppr::kVectorStride}));
 
   REAL_FILE_OR_SKIP(ers1, "ers1_2000_orbit44928/lea_01.001");
-  const std::vector<char> bytes1 = fileBytes(ers1);
+  const std::vector<char> bytes1 = support::readValues<char>(ers1);
   const CeosRecord summary1(bytes1, ers_leader::kDataSetSummary);
   const CeosRecord position1(bytes1, ers_leader::kPlatformPosition);
   EXPECT_EQ(summary1.text(dss::kMissionTag), "ERS1");
@@ -63,7 +59,7 @@ TEST(ErsLayoutOnArchiveFiles, LeadersReadThroughTheFieldTables) {
 // head of the first data record.
 TEST(ErsLayoutOnArchiveFiles, ImageDescriptorAndFirstRecordHead) {
   REAL_FILE_OR_SKIP(image, "ers1_2000_orbit44928/dat_01.001");
-  const std::vector<char> bytes = fileBytes(image);
+  const std::vector<char> bytes = support::readValues<char>(image);
   const CeosRecord descriptor(bytes, 0);
   EXPECT_EQ(descriptor.integer(ers_image::descriptor::kRecordCount), 28000);
   EXPECT_EQ(descriptor.integer(ers_image::descriptor::kSamples), 5616);

@@ -2,7 +2,6 @@
 // codec through the decoder, a clean image-mode scene, injected damage, a
 // truncated product and the burst alternation of an AP scene.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <cmath>
 #include <cstring>
@@ -20,6 +19,7 @@
 #include "product/profile.h"
 #include "sim/envisat_aux_writer.h"
 #include "sim/envisat_level0_writer.h"
+#include "support/files.h"
 
 namespace {
 
@@ -33,10 +33,6 @@ constexpr int kCalibrationLine = 323;
 class AsarSceneTest : public testing::Test {
  protected:
   void SetUp() override {
-    const auto* info = testing::UnitTest::GetInstance()->current_test_info();
-    dir_ = fs::path(testing::TempDir()) / ("asar_sim_" + std::to_string(getpid()) + "_" + info->name());
-    fs::remove_all(dir_);
-    fs::create_directories(dir_);
     SimIni ini;
     std::string error;
     ASSERT_TRUE(ini.load(TESSIVOR_SOURCE_DIR "/tests/sim/data/asar_im_small_scene.txt", error)) << error;
@@ -46,24 +42,20 @@ class AsarSceneTest : public testing::Test {
     scene_.samples = kSamples;
     scene_.pixelTargets = {{350.0, 300.0, 0.0, 4.0}};
   }
-  void TearDown() override {
-    std::error_code ec;
-    fs::remove_all(dir_, ec);
-  }
 
   // Simulates and extracts; the extraction status.
   int extract() {
     applyAsarInstrument(cfg_, scene_);
     sim_ = std::make_unique<RawSceneSimulator>(scene_);
     std::string error;
-    EXPECT_EQ(writeEnvisatScene(*sim_, cfg_, dir_.string(), &files_, error), 0) << error;
+    EXPECT_EQ(writeEnvisatScene(*sim_, cfg_, dir_.path(), &files_, error), 0) << error;
     ex_.input.ASA_Level0_File = files_.level0;
     ex_.input.ASA_INS_File = files_.ins;
     ex_.input.ASA_XCA_File = files_.xca;
     ex_.input.Orbit_File = files_.orbit;
-    ex_.output.OutputRawFile = (dir_ / "raw").string();
-    ex_.output.OutputChirpFile = (dir_ / "raw.chirp").string();
-    ex_.output.OutputAntennaPatternFile = (dir_ / "raw.pattern").string();
+    ex_.output.OutputRawFile = dir_ / "raw";
+    ex_.output.OutputChirpFile = dir_ / "raw.chirp";
+    ex_.output.OutputAntennaPatternFile = dir_ / "raw.pattern";
     return ex_.run();
   }
 
@@ -91,7 +83,7 @@ class AsarSceneTest : public testing::Test {
     return std::sqrt(e / p);
   }
 
-  fs::path dir_;
+  support::TempFolder dir_{"asar_sim"};
   SceneDescription scene_;
   AsarSimConfig cfg_;
   std::unique_ptr<RawSceneSimulator> sim_;
@@ -137,7 +129,7 @@ TEST_F(AsarSceneTest, CleanImageModeScene) {
   EXPECT_TRUE(fs::exists(ex_.output.OutputAntennaPatternFile));
 
   // The extraction parameter record of the scene carries the same values.
-  const std::string record = (dir_ / "extraction.par").string();
+  const std::string record = dir_ / "extraction.par";
   ASSERT_EQ(write_param(record, ex_.par, &ex_.ext, files_.level0, files_.ins, 1), 0);
   const char* s = "ExtractionParameters";
   std::vector<int> ints;

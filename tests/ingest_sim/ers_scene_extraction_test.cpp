@@ -64,14 +64,6 @@ class ErsSceneTest : public testing::Test {
     return bytes;
   }
 
-  static std::vector<float> rasterRows(const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    std::vector<char> bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
-    std::vector<float> v(bytes.size() / 4);
-    std::memcpy(v.data(), bytes.data(), v.size() * 4);
-    return v;
-  }
-
   static float prefixOf(int code) { return static_cast<float>(ersSwstSeconds(code)); }
 
   support::TempFolder dir_{"ingest_sim"};
@@ -91,7 +83,7 @@ TEST_F(ErsSceneTest, CleanSceneRasterRecordAndVectors) {
   // The raster is the simulated I/Q less 15.5 (no biases), each line
   // prefixed with its window start.
   const std::vector<unsigned char> iq = quantised(*sim);
-  const std::vector<float> raster = rasterRows(out());
+  const std::vector<float> raster = support::readValues<float>(out());
   const std::size_t row = 1 + 2 * std::size_t(kSamples);
   ASSERT_EQ(raster.size(), row * kLines);
   int mismatches = 0;

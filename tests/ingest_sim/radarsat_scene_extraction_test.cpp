@@ -20,13 +20,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-std::vector<float> floats(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  std::vector<char> bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
-  std::vector<float> v(bytes.size() / 4);
-  std::memcpy(v.data(), bytes.data(), v.size() * 4);
-  return v;
-}
+std::vector<float> floats(const std::string& path) { return support::readValues<float>(path); }
 
 class RadarsatSceneTest : public support::WorkingFolderTest {
  protected:

@@ -37,21 +37,6 @@ TEST(LinearSolvers, LuAndGaussJordanSolveTheSameSystemAndInvert) {
     for (int i = 1; i <= 4; ++i) EXPECT_NEAR(b[i], kSolution[i - 1], 1e-13);
   }
   {
-    NrMatrix<double> a = testMatrix(), b(1, 4, 1, 1);
-    NrVector<double> rhs = rhsOf(a);
-    for (int i = 1; i <= 4; ++i) b[i][1] = rhs[i];
-    ASSERT_EQ(gaussj(a, 4, b, 1), 0);
-    for (int i = 1; i <= 4; ++i) EXPECT_NEAR(b[i][1], kSolution[i - 1], 1e-13);
-    // a now holds the inverse: A^-1 A = I.
-    const NrMatrix<double> orig = testMatrix();
-    for (int i = 1; i <= 4; ++i)
-      for (int j = 1; j <= 4; ++j) {
-        double s = 0;
-        for (int k = 1; k <= 4; ++k) s += a[i][k] * orig[k][j];
-        EXPECT_NEAR(s, i == j ? 1.0 : 0.0, 1e-14);
-      }
-  }
-  {
     const NrMatrix<double> orig = testMatrix();
     NrMatrix<long double> a(1, 4, 1, 4), b(1, 4, 1, 1);
     NrVector<double> rhs = rhsOf(orig);
@@ -76,14 +61,11 @@ TEST(LinearSolvers, LuAndGaussJordanSolveTheSameSystemAndInvert) {
 }
 
 TEST(LinearSolvers, SingularSystemsReportAndFail) {
-  NrMatrix<double> a(1, 3, 1, 3);
   const double v[9] = {1, 2, 3, 2, 4, 6, 1, 0, 1};  // rows 1 and 2 dependent
   NrMatrix<double> s1 = convert_matrix(v, 1, 3, 1, 3);
   NrVector<int> indx(1, 3);
   double d;
   EXPECT_EQ(ludcmp(s1, 3, indx, &d), 1);
-  NrMatrix<double> s2 = convert_matrix(v, 1, 3, 1, 3), b(1, 3, 1, 1);
-  EXPECT_NE(gaussj(s2, 3, b, 1), 0);
   NrMatrix<long double> s3(1, 3, 1, 3), lb(1, 3, 1, 1);
   for (int i = 1; i <= 3; ++i)
     for (int j = 1; j <= 3; ++j) s3[i][j] = v[(i - 1) * 3 + j - 1];

@@ -87,16 +87,7 @@ class ATOther : public GeneralSAR_Base {
   int Level = 2;
 };
 
-class GeneralSarBaseTest : public ::testing::Test {
- protected:
-  std::string path(const std::string& name) const { return dir / name; }
-  std::string make(const std::string& name, const std::string& text) const {
-    support::writeText(path(name), text);
-    return path(name);
-  }
-  static std::string slurp(const std::string& p) { return support::readText(p); }
-  support::TempFolder dir{"params"};
-};
+using GeneralSarBaseTest = support::ScratchFolderTest;
 
 bool xmllintAccepts(const std::string& file) {
   if (std::system("command -v xmllint >/dev/null 2>&1") != 0) return true;  // not installed

@@ -17,16 +17,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-class OrvaneXmlTest : public ::testing::Test {
- protected:
-  std::string path(const std::string& name) const { return dir / name; }
-  std::string make(const std::string& name, const std::string& text) const {
-    support::writeText(path(name), text);
-    return path(name);
-  }
-  static std::string slurp(const std::string& p) { return support::readText(p); }
-  support::TempFolder dir{"params"};
-};
+using OrvaneXmlTest = support::ScratchFolderTest;
 
 bool haveXmllint() { return std::system("command -v xmllint >/dev/null 2>&1") == 0; }
 

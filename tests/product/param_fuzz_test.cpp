@@ -55,17 +55,10 @@ class FuzzTool : public GeneralSAR_Base {
   std::vector<float> Table;
 };
 
-class ParamFuzzTest : public ::testing::Test {
+class ParamFuzzTest : public support::ScratchFolderTest {
  protected:
   void SetUp() override { FreeProfile(); }
   void TearDown() override { FreeProfile(); }
-  std::string path(const std::string& name) const { return dir / name; }
-  std::string make(const std::string& name, const std::string& text) const {
-    support::writeText(path(name), text);
-    return path(name);
-  }
-  static std::string slurp(const std::string& p) { return support::readText(p); }
-  support::TempFolder dir{"params"};
 };
 
 std::string randomText(std::mt19937& rng, size_t maxLen, bool syntaxHeavy) {

@@ -18,21 +18,14 @@ namespace {
 
 namespace fs = std::filesystem;
 
-class ProfileTest : public ::testing::Test {
+class ProfileTest : public support::ScratchFolderTest {
  protected:
   void SetUp() override { FreeProfile(); }
   void TearDown() override { FreeProfile(); }
-  std::string path(const std::string& name) const { return dir / name; }
-  std::string make(const std::string& name, const std::string& text) const {
-    support::writeText(path(name), text);
-    return path(name);
-  }
-  static std::string slurp(const std::string& p) { return support::readText(p); }
   static std::string get(const std::string& s, const std::string& k, const std::string& f) {
     std::string v;
     return GetMyProfileString(s, k, v, f) == 0 ? v : std::string("<absent>");
   }
-  support::TempFolder dir{"params"};
 };
 
 TEST_F(ProfileTest, ParserConsequences) {

@@ -19,13 +19,9 @@
 #include "product/time_base.h"
 #include "sim/ers_ceos_writer.h"
 #include "sim/raw_scene.h"
+#include "support/files.h"
 
 namespace {
-
-std::vector<char> readAll(const std::string& path) {
-  std::ifstream f(path, std::ios::binary);
-  return std::vector<char>((std::istreambuf_iterator<char>(f)), std::istreambuf_iterator<char>());
-}
 
 std::uint32_t be32(const char* p) {
   const auto* u = reinterpret_cast<const unsigned char*>(p);
@@ -126,7 +122,7 @@ bool masked(int off) {
 TEST(ErsLeaderLayout, MatchesTheArchiveLeaderFieldByField) {
   const std::string path = TESSIVOR_REALDATA_DIR "/ers1_2000_orbit44928/lea_01.001";
   if (!std::filesystem::exists(path)) GTEST_SKIP() << "real data folder absent";
-  const std::vector<char> real = readAll(path);
+  const std::vector<char> real = support::readValues<char>(path);
   const std::vector<char> mine = buildErsLeader(realErs1Values());
   ASSERT_EQ(mine.size(), real.size());
   // Record heads: sequence, type bytes and length of all five records.
@@ -146,7 +142,7 @@ TEST(ErsLeaderLayout, MatchesTheArchiveLeaderFieldByField) {
 TEST(ErsImageLayout, DescriptorAndRecordHeadMatchTheArchive) {
   const std::string path = TESSIVOR_REALDATA_DIR "/ers1_2000_orbit44928/dat_01.001";
   if (!std::filesystem::exists(path)) GTEST_SKIP() << "real data folder absent";
-  const std::vector<char> real = readAll(path);
+  const std::vector<char> real = support::readValues<char>(path);
   const std::vector<char> d = buildErsImageDescriptor("ERS1", "ERS1-RAW-6.8", 28000, 5616);
   ASSERT_EQ(d.size(), 11644u);
   EXPECT_EQ(0, std::memcmp(d.data(), real.data(), 11644));

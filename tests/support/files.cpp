@@ -95,13 +95,6 @@ std::vector<unsigned char> readBytes(const std::string& file) {
   return {std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>()};
 }
 
-std::vector<fcomplex> readComplex(const std::string& file) {
-  const std::vector<unsigned char> bytes = readBytes(file);
-  std::vector<fcomplex> out(bytes.size() / sizeof(fcomplex));
-  std::memcpy(out.data(), bytes.data(), out.size() * sizeof(fcomplex));
-  return out;
-}
-
 void WorkingFolderTest::SetUp() {
   working_ = scratchDir("work");
   setenv("TESSIVOR_WORKING_DIR", working_.c_str(), 1);

@@ -3,6 +3,7 @@
 // and a working-folder fixture with the run-time environment of the focuser.
 #include <gtest/gtest.h>
 
+#include <cstring>
 #include <filesystem>
 #include <string>
 #include <vector>
@@ -38,7 +39,15 @@ class TempFolder {
 std::string readText(const std::string& file);
 void writeText(const std::string& file, const std::string& text);  // makes the parent folders
 std::vector<unsigned char> readBytes(const std::string& file);
-std::vector<fcomplex> readComplex(const std::string& file);
+// The whole file as cells of T (a trailing part cell is dropped).
+template <class T>
+std::vector<T> readValues(const std::string& file) {
+  const std::vector<unsigned char> bytes = readBytes(file);
+  std::vector<T> out(bytes.size() / sizeof(T));
+  std::memcpy(out.data(), bytes.data(), out.size() * sizeof(T));
+  return out;
+}
+inline std::vector<fcomplex> readComplex(const std::string& file) { return readValues<fcomplex>(file); }
 inline bool contains(const std::string& text, const std::string& part) {
   return text.find(part) != std::string::npos;
 }
@@ -49,6 +58,19 @@ inline const char* binDir() { return TESSIVOR_BINARY_DIR "/bin/"; }
 // Genuine mission files (absent on machines without the data set).
 inline const char* realData() { return TESSIVOR_REALDATA_DIR; }
 inline bool realDataPresent() { return fs::is_directory(TESSIVOR_REALDATA_DIR); }
+
+// A test with a scratch folder of its own: path() names a file in it, make()
+// writes one and returns its path, slurp() reads a file back.
+class ScratchFolderTest : public ::testing::Test {
+ protected:
+  std::string path(const std::string& name) const { return dir / name; }
+  std::string make(const std::string& name, const std::string& text) const {
+    writeText(path(name), text);
+    return path(name);
+  }
+  static std::string slurp(const std::string& file) { return readText(file); }
+  TempFolder dir{"params"};
+};
 
 // A working folder per test with the focuser's environment variables (working
 // folder, progress file, catalogues of the source tree, tracing on); the
