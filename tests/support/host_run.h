@@ -49,13 +49,13 @@ struct RunningFocuser {
 using ProgressHook = std::function<void(const RunningFocuser&)>;
 
 struct RunOptions {
-  ProgressHook hook;             // called at every poll
+  ProgressHook hook{};           // called at every poll
   int pollMilliseconds = 50;
   int timeoutSeconds = 1200;
-  std::string executable;        // the focuser of the build tree when empty
-  std::string command;           // "main_focussing_stripmap#" + job file when empty
+  std::string executable{};      // the focuser of the build tree when empty
+  std::string command{};         // "main_focussing_stripmap#" + job file when empty
   bool hostVariables = true;     // set the TESSIVOR_* variables of a host
-  std::map<std::string, std::string> variables;  // then these (an empty value unsets)
+  std::map<std::string, std::string> variables{};  // then these (an empty value unsets)
   long long fileSizeLimit = 0;   // > 0: no file of the run grows past it (a full disk)
 };
 
