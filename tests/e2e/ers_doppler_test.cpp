@@ -166,18 +166,18 @@ TEST(ErsDopplerEndToEnd, GyrolessCentroidsResolvedAndPhaseFreeOfThem) {
   expectCentroidFreePhase(scenes);
 }
 
-// Peak phase bar of a centroid: 5 degrees up to 1.5 PRF (the gyroless
-// 2300 Hz of the phase table); beyond, 12. At +-2.6 and +-3 PRF most
-// targets lie within 2 degrees; those whose zero-Doppler time lies beyond
-// the end of the raw lines (+3 PRF) or before their start (-3 PRF) reach
-// -9.2 and 9.8. A Doppler rate taken at the echo's two-way delay instead of
+// Peak phase bar of a centroid: 5 degrees up to 2.4 PRF; beyond, 12
+// (measured: within 1 degree up to 1.8 PRF, 2.5 at 2.2 PRF; at 2.6 and
+// 3 PRF most targets within 2 degrees, but those whose zero-Doppler time
+// lies beyond the end of the raw lines (+) or before their start (-) reach
+// 3.9 and 4.9 at 2.6 PRF, -9.2 and 9.8 at 3 PRF). A Doppler rate taken at the echo's two-way delay instead of
 // its compressed peak (0.4 of a sample later: the rate of a range 3 m off)
 // left a term of one sign with the square of the centroid, 8 degrees at
 // 3 PRF; the sub-block's hyperbola, the chord of a rate whose inverse is
 // not linear in range, up to 3 more; a rate whose hyperbola missed the
 // depth of the range migration -17 to -40 degrees, and the kernels' range
 // sub-blocks -4 degrees more per sub-block.
-double phaseBarOf(double centroidHz) { return std::fabs(centroidHz) <= 1.5 * kPrf ? 5.0 : 12.0; }
+double phaseBarOf(double centroidHz) { return std::fabs(centroidHz) <= 2.4 * kPrf ? 5.0 : 12.0; }
 
 // Centroids from -3 to +3 PRF in steps of 0.4 PRF on full scenes of
 // homogeneous clutter with four bright scatterers.
