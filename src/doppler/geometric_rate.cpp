@@ -75,9 +75,10 @@ bool migrationOf(const WindowOrbit& o, double t, const double P[3], double lambd
 }
 
 // Rates of kPoints points across the swath at azimuth t, fitted by a cubic
-// in fast time from swstMin (a[0..3]).
-int rangeFit(GeneralSAROrbit& orbit, double t, double swstMin, int samples, double frg, double fc,
-             const polyDC& dc, double lookSign, double a[kTerms]) {
+// in fast time from swstMin (a[0..3]). The point of a sample lies at the
+// two-way delay peakDelay seconds before the sample's time.
+int rangeFit(GeneralSAROrbit& orbit, double t, double swstMin, double peakDelay, int samples, double frg,
+             double fc, const polyDC& dc, double lookSign, double a[kTerms]) {
   if (int st = orbit.updatePolys(t); st != 0) return st;
   const double* pos = orbit.getCurPos();
   if (!pos) {
@@ -88,7 +89,7 @@ int rangeFit(GeneralSAROrbit& orbit, double t, double swstMin, int samples, doub
   double fr[kPoints];
   Migration mig[kPoints];
   bool squinted[kPoints];
-  int st = get_geo_grid(t, swstMin, 1, kPoints, 0.0, dtau, fr, nullptr, nullptr, pos, orbit.getCurT0(),
+  int st = get_geo_grid(t, swstMin - peakDelay, 1, kPoints, 0.0, dtau, fr, nullptr, nullptr, pos, orbit.getCurT0(),
                         orbit.dt, fc, &dc, lookSign);
   WindowOrbit o;
   o.t0 = orbit.getCurT0();
@@ -103,7 +104,7 @@ int rangeFit(GeneralSAROrbit& orbit, double t, double swstMin, int samples, doub
   for (int i = 0; i < kPoints; ++i) {
     const double tau = swstMin + i * dtau;
     double P[3];
-    squinted[i] = gr_pt(P, S, V, tau, DCeval(&dc, tau, t), lambda, 0.0, lookSign, consts::kWgs84A,
+    squinted[i] = gr_pt(P, S, V, tau - peakDelay, DCeval(&dc, tau, t), lambda, 0.0, lookSign, consts::kWgs84A,
                         consts::kWgs84B) == 0 &&
                   migrationOf(o, t, P, lambda, mig[i]);
     // An orbit's range history is not quite a hyperbola: its local rate at
@@ -148,13 +149,15 @@ int rangeFit(GeneralSAROrbit& orbit, double t, double swstMin, int samples, doub
 
 }  // namespace
 
-int geometricRatePoly(GeneralSAROrbit& orbit, double tStart, double tEnd, double swstMin, int samples,
-                      double frg, double fc, const polyDC& dc, double lookSign, polyFR& fr) {
+int geometricRatePoly(GeneralSAROrbit& orbit, double tStart, double tEnd, double swstMin, double peakDelay,
+                      int samples, double frg, double fc, const polyDC& dc, double lookSign, polyFR& fr) {
   const double tMid = 0.5 * (tStart + tEnd);
   double mid[kTerms] = {}, first[kTerms] = {}, last[kTerms] = {};
-  int st = rangeFit(orbit, tMid, swstMin, samples, frg, fc, dc, lookSign, mid);
-  if (st == 0 && tEnd > tStart) st = rangeFit(orbit, tStart, swstMin, samples, frg, fc, dc, lookSign, first);
-  if (st == 0 && tEnd > tStart) st = rangeFit(orbit, tEnd, swstMin, samples, frg, fc, dc, lookSign, last);
+  int st = rangeFit(orbit, tMid, swstMin, peakDelay, samples, frg, fc, dc, lookSign, mid);
+  if (st == 0 && tEnd > tStart)
+    st = rangeFit(orbit, tStart, swstMin, peakDelay, samples, frg, fc, dc, lookSign, first);
+  if (st == 0 && tEnd > tStart)
+    st = rangeFit(orbit, tEnd, swstMin, peakDelay, samples, frg, fc, dc, lookSign, last);
   if (st != 0) {
     ORV_REPORT_CALLED_ERROR();
     return st;
@@ -172,4 +175,10 @@ int geometricRatePoly(GeneralSAROrbit& orbit, double tStart, double tEnd, double
   fr.taz0 = tMid;
   // Leave the orbit's window where the scene centre needs it.
   return orbit.updatePolys(tMid);
+}
+
+double compressedPeakDelay(double pulseLength, int replicaSamples, double frg) {
+  if (!(frg > 0.0) || !(pulseLength > 0.0) || replicaSamples < 1) return 0.0;
+  const double offset = (frg * pulseLength - (replicaSamples - 1)) / 2.0;  // samples
+  return std::fabs(offset) <= 2.0 ? offset / frg : 0.0;
 }

@@ -672,9 +672,12 @@ int ChainRun::dopplerStep() {
       return calledError(st);
 
     ORV_REPORT("GEOMETRIC POLYNOMIALS COMPUTATION", REPORT_CHECKPOINT);
+    const int replicaSamples =
+        chirp.empty() ? rawRecord.pulse.chirpSamples() : static_cast<int>(chirp.size());
+    const double peakDelay = compressedPeakDelay(rawRecord.pulse.PulseLength, replicaSamples, ctx.frg_hz);
     if (int st = geometricRatePoly(rawRecord.orbit(), ctx.azimuthStart,
-                                   ctx.azimuthStart + ctx.lines / ctx.prf_hz, ctx.swstMin, rgSamples,
-                                   ctx.frg_hz, ctx.fc_hz, dcPoly, ctx.lookSign, frPoly);
+                                   ctx.azimuthStart + ctx.lines / ctx.prf_hz, ctx.swstMin, peakDelay,
+                                   rgSamples, ctx.frg_hz, ctx.fc_hz, dcPoly, ctx.lookSign, frPoly);
         st != 0)
       return calledError(st);
     if (conf.DeleteTempFiles) removeReported("./DCEST_resume.txt");

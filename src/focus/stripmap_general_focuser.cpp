@@ -13,6 +13,7 @@
 #include "core/azimuth_focus.h"
 #include "core/range_focuser.h"
 #include "diag/report.h"
+#include "doppler/geometric_rate.h"
 #include "orbit/general_sar_orbit.h"
 #include "product/buffer_io.h"
 #include "product/roi.h"
@@ -266,8 +267,15 @@ int stripmapGeneralFocuserModular::frEst(const std::string& file) {
   const polyDC dc = record.polynomials.DC[0];
   record.polynomials.CreatePolys(1, 1);
   record.polynomials.DC[0] = dc;
-  if (int st = record.orbit().SVGetFRpoly(&record.roi.roi, &record.polynomials.DC[0],
-                                          &record.polynomials.FR[0]);
+  // The rate the focusing kernel needs, as the one-pass chain computes it.
+  const ROI_Obj& roi = record.roi.roi;
+  const SamplingConstants_Obj& smp = record.sampling;
+  const double peakDelay =
+      compressedPeakDelay(record.pulse.PulseLength, record.pulse.chirpSamples(), smp.frg_hz);
+  if (int st = geometricRatePoly(record.orbit(), roi.SlowStartTime,
+                                 roi.SlowStartTime + roi.Lines * roi.SlowTimeDelta, roi.FastStartTime,
+                                 peakDelay, record.dataFile.NrOfPixelsPerLine, smp.frg_hz, smp.fc_hz,
+                                 record.polynomials.DC[0], lookSign, record.polynomials.FR[0]);
       st != 0)
     return calledError(st);
   record.GSenable(GeneralSAR::GS_POLYNOMIALS);

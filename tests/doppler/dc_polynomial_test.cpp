@@ -12,6 +12,7 @@
 
 #include "doppler/dc_driver.h"
 #include "doppler/dc_estimators.h"
+#include "doppler/geometric_rate.h"
 #include "support/files.h"
 #include "support/scenes.h"
 #include "product/byte_order.h"
@@ -305,3 +306,13 @@ TEST(DcAmbiguityEstimate, DecisionBetweenMlbfAndWdar) {
 }
 
 }  // namespace
+
+// The geometric rate is taken at the delay of each range-focused sample's
+// compressed peak: an ERS echo (a 704-sample replica of a 37.12 us pulse at
+// 18.96 MHz, centred on the pulse) peaks 0.3976 of a sample after its
+// two-way delay. A replica that does not span the pulse gives no delay.
+TEST(GeometricRate, CompressedPeakTrailsTheEchoDelay) {
+  EXPECT_NEAR(compressedPeakDelay(37.12e-6, 704, 18.96e6) * 18.96e6, 0.3976, 1e-9);
+  EXPECT_EQ(compressedPeakDelay(37.12e-6, 1024, 18.96e6), 0.0);
+  EXPECT_EQ(compressedPeakDelay(-999.0, 704, 18.96e6), 0.0);
+}

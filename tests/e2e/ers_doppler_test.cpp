@@ -166,15 +166,18 @@ TEST(ErsDopplerEndToEnd, GyrolessCentroidsResolvedAndPhaseFreeOfThem) {
   expectCentroidFreePhase(scenes);
 }
 
-// Peak phase bar of a centroid: 5 degrees up to 1.5 PRF (the gyroless
-// 2300 Hz of the phase table); beyond, a term of one sign that grows with
-// the square of the centroid remains (measured 0.9 degrees at 1 PRF, 2 to
-// 6.7 at 2.2 PRF, -1.4 to 10.7 at 3 PRF, 15 to 18 on targets near the ends
-// of the kept rows at -3 PRF, with 0.01 to 0.03 line of azimuth offset of
-// one sign at both +-3 PRF); 20 there. A Doppler rate whose hyperbola
-// missed the depth of the range migration left -17 to -40 degrees at
-// 3 PRF, and the kernels' range sub-blocks -4 degrees more per sub-block.
-double phaseBarOf(double centroidHz) { return std::fabs(centroidHz) <= 1.5 * kPrf ? 5.0 : 20.0; }
+// Peak phase bar of a centroid: 5 degrees up to 2.4 PRF; beyond, 12
+// (measured: within 1 degree up to 1.8 PRF, 2.5 at 2.2 PRF; at 2.6 and
+// 3 PRF most targets within 2 degrees, but those whose zero-Doppler time
+// lies beyond the end of the raw lines (+) or before their start (-) reach
+// 3.9 and 4.9 at 2.6 PRF, -9.2 and 9.8 at 3 PRF). A Doppler rate taken at the echo's two-way delay instead of
+// its compressed peak (0.4 of a sample later: the rate of a range 3 m off)
+// left a term of one sign with the square of the centroid, 8 degrees at
+// 3 PRF; the sub-block's hyperbola, the chord of a rate whose inverse is
+// not linear in range, up to 3 more; a rate whose hyperbola missed the
+// depth of the range migration -17 to -40 degrees, and the kernels' range
+// sub-blocks -4 degrees more per sub-block.
+double phaseBarOf(double centroidHz) { return std::fabs(centroidHz) <= 2.4 * kPrf ? 5.0 : 12.0; }
 
 // Centroids from -3 to +3 PRF in steps of 0.4 PRF on full scenes of
 // homogeneous clutter with four bright scatterers.
@@ -203,9 +206,10 @@ TEST(HeavyErsDopplerEndToEnd, AmbiguityMatrixStrongContrast) {
 }
 
 // The same scatterers at yaw-steered and gyroless centroids on full scenes,
-// all within 5 degrees (measured: within 0.6 up to 450 Hz; 1.0 to 1.9 at
-// 2300 Hz, where a rate that did not follow the orbit's drift of about
-// 1e-5 per second left 0.4, -7.6, -0.4, 4.7).
+// all within 5 degrees (measured: within 0.5 at 0, 320, -450 and 2300 Hz;
+// a rate that did not follow the orbit's drift of about 1e-5 per second
+// left 0.4, -7.6, -0.4, 4.7 at 2300 Hz; a rate taken at the echo's delay
+// instead of its compressed peak, with the sub-block's chord, 1.0 to 1.9).
 TEST(HeavyErsDopplerEndToEnd, PhaseTableAcrossCentroids) {
   std::vector<Focused> all;
   for (double centroid : {0.0, 320.0, -450.0, 2300.0}) {
