@@ -2,6 +2,7 @@
 #include <cmath>
 
 #include "base/fcomplex.h"
+#include "core/fft.h"
 
 // Omega-K focusing of one azimuth block: the block parameter record, the
 // wavenumber grids and the kernels. A block is stored as `lines` rows, each
@@ -101,9 +102,12 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
 // wavenumber and Rq the target's range in the sub-block's equivalent
 // geometry; it is taken out as the sub-block is copied back, so that every
 // target ends at -k0 R0 whatever the centroid. par.range0 gives the slant
-// range of the block's first output sample.
+// range of the block's first output sample. `scratch`, when given, holds the
+// sub-block work area from one block to the next (a fresh one per block
+// costs the clearing of its pages).
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
-            const double poly[5], double tref, int block = 0, int blocks = 1);
+            const double poly[5], double tref, int block = 0, int blocks = 1,
+            FFTBuffer* scratch = nullptr);
 
 // Doppler rate that drifts along the azimuth time of a block (fr0y, fr1y):
 // a target's range history follows the equivalent speed of its own beam

@@ -212,6 +212,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   } catch (const std::bad_alloc&) {
     return AF_FAIL("Out of memory for the azimuth block", STATUS_NO_MEMORY);
   }
+  FFTBuffer subBlockWork;  // range sub-block work area, kept from block to block
   if (scene.verbose) waitbar_open("Azimuth Focusing");
 
   long long readPos = 0;  // first input row of the block
@@ -245,7 +246,7 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     par.data = blockBuf.data();
     AzimuthBlockOut bo;
     st = multirg(par, bo, conf.SamplesInBlock, fullRg, poly, pdc[7], b,
-                 std::max(1, plan.progressTotal));
+                 std::max(1, plan.progressTotal), &subBlockWork);
     if (st != 0) {
       if (scene.verbose) waitbar_close();
       ORV_REPORT_CALLED_ERROR();

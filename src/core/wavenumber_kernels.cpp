@@ -545,7 +545,7 @@ void residualPhasors(const AzimuthBlockPar& par, double rw0, double r0, double d
 }  // namespace
 
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
-            const double poly[5], double tref, int block, int blocks) {
+            const double poly[5], double tref, int block, int blocks, FFTBuffer* scratch) {
   const int S = par.samples;
   const int s = subSamples;
   const int o = overlap;
@@ -591,9 +591,10 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     ORV_REPORT("cannot allocate memory", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
-  FFTBuffer work;
+  FFTBuffer own;
+  FFTBuffer& work = scratch ? *scratch : own;
   try {
-    work.resize(workSize);
+    if (work.size() < workSize) work.resize(workSize);
   } catch (const std::bad_alloc&) {
     ORV_REPORT("cannot allocate memory", REPORT_ERROR);
     return STATUS_NO_MEMORY;
