@@ -575,9 +575,9 @@ void* fft_malloc(std::size_t bytes) {
     // The threads fault the pages in side by side: the kernel clears every
     // fresh page, which on a virtual machine costs about 3 s per GB.
     const long pages = static_cast<long>(rounded / kHuge);
-    volatile char* const bytes = static_cast<char*>(p);
+    volatile char* const first = static_cast<char*>(p);
 #pragma omp parallel for schedule(static)
-    for (long i = 0; i < pages; ++i) bytes[static_cast<std::size_t>(i) * kHuge] = 0;
+    for (long i = 0; i < pages; ++i) first[static_cast<std::size_t>(i) * kHuge] = 0;
     return p;
   }
   std::size_t rounded = (bytes + kAlign - 1) / kAlign * kAlign;

@@ -13,8 +13,8 @@
 #include "base/status.h"
 #include "core/ortog.h"
 #include "diag/report.h"
-#include "product/data_file.h"
 #include "diag/waitbar.h"
+#include "product/data_file.h"
 
 namespace {
 

@@ -8,8 +8,8 @@
 
 #include <algorithm>
 #include <bit>
-#include <climits>
 #include <cerrno>
+#include <climits>
 #include <cstdio>
 #include <cstring>
 #include <new>
