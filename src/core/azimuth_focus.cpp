@@ -194,13 +194,17 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   const int outSamples = samples - fullRg;
 
   RasterStream in, out;
+  // Output rows are never longer than input rows and block b writes only
+  // the rows before the first line block b + 1 reads, so the output may be
+  // written over the input's file.
+  const bool overwrite = !scene.inCore && files.overwriteInput && handOverFile(files.input, files.output);
   if (!scene.inCore) {
-    if (!in.open(files.input, "rb")) {
+    if (!in.open(overwrite ? files.output : files.input, "rb")) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
       ORV_REPORT(files.input, REPORT_ERROR);
       return STATUS_NOT_OPENED;
     }
-    if (!out.open(files.output, "w+b")) {
+    if (!out.open(files.output, overwrite ? "r+b" : "w+b")) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
       ORV_REPORT(files.output, REPORT_ERROR);
       return STATUS_NOT_OPENED;
@@ -270,6 +274,11 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     outRow += rows;
   }
   if (scene.verbose) waitbar_close();
+  const long long outBytes = static_cast<long long>(sizeof(fcomplex)) * outSamples * outRow;
+  if (overwrite && !out.truncate(outBytes)) {
+    ORV_REPORT("File writing failed!", REPORT_ERROR);
+    return STATUS_WRITE_FAILED;
+  }
   if (out.is_open() && out.close() != 0) {
     ORV_REPORT("File writing failed!", REPORT_ERROR);
     return STATUS_WRITE_FAILED;

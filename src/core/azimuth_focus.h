@@ -17,6 +17,9 @@ struct AzimuthFocusFiles {
   double FastStartTime = 0.0;  // two-way delay of sample 0, s
   double bandwidth_hz = 0.0;   // range bandwidth
   double SlowStartTime = 0.0;  // time of line 0, s
+  // The input is a temporary the job erases: the output may take over its
+  // file and be written over the lines already read (see handOverFile).
+  bool overwriteInput = false;
 };
 
 // The scene: sizes, Doppler models in, geometry and output sizes out.

@@ -150,6 +150,7 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
   const int S = params.samples, N = z.fftLength, O = z.outSamples, lines = params.lines;
   work.outSamples = O;
   work.outLines = lines;
+  work.inputOverwritten = false;
 
   RangeCompressor rc;
   if (int st = rc.init(work.replica, work.replicaLen, N); st != 0) {
@@ -181,8 +182,18 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
     q = 0;
     passes = 1;
   } else {
-    if (!in.open(params.inputFile, "rb")) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
-    if (!out.open(params.outputFile, "wb")) return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
+    // An output row is never longer than an input line, so a pass written
+    // over the file ends before the first line the next pass reads.
+    const long long inLineBytes = (work.prefix ? static_cast<long long>(sizeof(float)) : 0) +
+                                  static_cast<long long>(S) * static_cast<long long>(sizeof(fcomplex));
+    work.inputOverwritten =
+        params.overwriteInput &&
+        static_cast<long long>(O) * static_cast<long long>(sizeof(fcomplex)) <= inLineBytes &&
+        handOverFile(params.inputFile, params.outputFile);
+    if (!in.open(work.inputOverwritten ? params.outputFile : params.inputFile, "rb"))
+      return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
+    if (!out.open(params.outputFile, work.inputOverwritten ? "r+b" : "wb"))
+      return RF_FAIL("File not opened!", STATUS_NOT_OPENED);
     P = work.linesPerBlock > 0 ? work.linesPerBlock : kDefaultLinesPerBlock;
     P = std::max(1, std::min(P, std::max(lines, 1)));
     q = lines / P;
@@ -279,6 +290,9 @@ int rangefoc(const RangeFocParams& params, RangeFocWork& work) {
   if (!work.incore) {
     work.data = FFTBuffer();
     spare = FFTBuffer();
+    const long long outBytes = static_cast<long long>(O) * static_cast<long long>(sizeof(fcomplex)) * lines;
+    if (work.inputOverwritten && !out.truncate(outBytes))
+      return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
     if (out.close() != 0) return RF_FAIL("File writing failed!", STATUS_WRITE_FAILED);
   }
   return 0;

@@ -55,6 +55,9 @@ struct RangeFocParams {
   double prf = 0.0;        // Hz, for the in-core prefix rule
   int lines = 0;
   int samples = 0;
+  // The input is a temporary the job erases: the output may take over its
+  // file and be written over the lines already read (see handOverFile).
+  bool overwriteInput = false;
 };
 
 // Work record of rangefoc.
@@ -70,6 +73,7 @@ struct RangeFocWork {
   FFTBuffer data;           // in core: N * lines samples, then O * lines after rangefoc
   std::vector<int> shift;   // in core: per-line shift in samples
   int linesPerBlock = 0;    // file path: lines per pass (0: 1024)
+  bool inputOverwritten = false;  // set when the output took over the input's file
 };
 
 // Range-focuses params.inputFile into params.outputFile, or work.data in

@@ -621,6 +621,7 @@ int ChainRun::rangeStep(const std::string& raw) {
   rp.prf = ctx.prf_hz;
   rp.lines = ctx.lines;
   rp.samples = ctx.samples;
+  rp.overwriteInput = conf.TemporariesErased || conf.DeleteTempFiles;
   rw.verbose = conf.Verbose;
   rw.replica = chirp.data();
   rw.replicaLen = static_cast<int>(chirp.size());
@@ -736,8 +737,9 @@ int ChainRun::writeRangeFocusedRecord() {
 int ChainRun::azimuthStage() {
   const SamplingConstants_Obj& smp = rawRecord.sampling;
   if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
-  const AzimuthFocusFiles files =
+  AzimuthFocusFiles files =
       azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
+  files.overwriteInput = conf.TemporariesErased || conf.DeleteTempFiles;
   scene.verbose = conf.Verbose;
   scene.DCref = conf.DCref;
   scene.inCore = conf.Incore;

@@ -28,6 +28,9 @@ struct SARFocuser_conf {
   std::string ProcessingConfFile;
   double DCref = 0.0;
   int DeleteTempFiles = 0;
+  // Set by the job, not the profile: the job erases the chain's temporary
+  // rasters at its end, so each stage may write its output over its input.
+  bool TemporariesErased = false;
 
   // "DCestConf"
   double RgBand = 0.0;

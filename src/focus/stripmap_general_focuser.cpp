@@ -133,6 +133,9 @@ int stripmapGeneralFocuser::run(const std::string& raw, const std::string& chirp
 int stripmapGeneralFocuser::sarfocuser() {
   if (!conf_->Flag_set) return STATUS_BAD_CONDITION;
   conf_->Verbose = 1;
+  // Only the chain's own temporaries may be overwritten, never rasters a
+  // caller names.
+  conf_->TemporariesErased = temporariesErased;
   int status = sarFocuser_->run();
   if (status != 0) {
     ORV_REPORT_CALLED_ERROR();
@@ -149,6 +152,7 @@ int stripmapGeneralFocuser::sarfocuser(const std::string& raw, const std::string
   sarFocuser_->ChirpFile = chirp;
   if (!antenna.empty()) sarFocuser_->AntennaFile = antenna;
   sarFocuser_->OutputFilename = output;
+  conf_->TemporariesErased = false;
   int status = sarFocuser_->run();
   if (status != 0) {
     ORV_REPORT_CALLED_ERROR();

@@ -53,6 +53,7 @@ class stripmapGeneralFocuser {
   std::string outputFilename;         // root of every output
   int skipLines = 0;
   int extractLines = 0;
+  bool temporariesErased = false;     // the job erases the temporaries at its end
 
   SARFocuser& focuser() { return *sarFocuser_; }
   SARFocuser_conf& conf() { return *conf_; }

@@ -203,6 +203,22 @@ int64_t RasterStream::size() const {
   return int64_t(st.st_size);
 }
 
+bool RasterStream::truncate(int64_t bytes) const {
+  if (fd_ < 0 || bytes < 0) return false;
+  int rc;
+  do {
+    rc = ::ftruncate(fd_, off_t(bytes));
+  } while (rc != 0 && errno == EINTR);
+  return rc == 0;
+}
+
+bool handOverFile(const std::string& from, const std::string& to) {
+  if (from == to || std::rename(from.c_str(), to.c_str()) != 0) return false;
+  const int fd = ::open(from.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0666);
+  if (fd >= 0) ::close(fd);
+  return true;
+}
+
 int host_byte_order() { return std::endian::native == std::endian::big ? 1 : 0; }
 
 // ---- DataFile ----------------------------------------------------------------

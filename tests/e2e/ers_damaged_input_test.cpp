@@ -3,6 +3,8 @@
 // product record flags the missing lines and the focusing stays sound.
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 #include "product/general_sar.h"
 #include "support/files.h"
 #include "support/host_run.h"
@@ -55,6 +57,10 @@ TEST(ErsDamagedInput, DroppedLineIsFlaggedInTheRecordAndTheSceneStillFocuses) {
   EXPECT_EQ(raw.roi.roi.Lines, 4095);
   EXPECT_EQ(raw.dataSetInfo.MissingLines, 4095 - 400);
   EXPECT_EQ(product.dataSetInfo.MissingLines, 4095 - 400);
+  // A job that keeps its temporaries keeps them whole: no stage writes over
+  // the raster it reads unless the job erases it.
+  EXPECT_EQ(std::filesystem::file_size(dir / "out.extracted"),
+            4095u * (4u + 8u * static_cast<unsigned>(raw.roi.roi.Samples)));
 
   const PtaReport pta =
       analyseProduct(dir.str(), dir / "out_slc", dir / "out_slc.TessivorParameterExtracted", focused.files.truth);

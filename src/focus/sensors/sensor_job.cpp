@@ -9,6 +9,7 @@ void fillScene(const FocuserJobFields& job, stripmapGeneralFocuser& focuser) {
   focuser.level0Filename = job.level0Filename;
   focuser.skipLines = job.skipLines;
   focuser.extractLines = job.extractLines;
+  focuser.temporariesErased = job.eraseTemporaryFiles == 1;
   if (auto* modular = dynamic_cast<stripmapGeneralFocuserModular*>(&focuser))
     modular->Memory = job.Memory;
 }
