@@ -463,6 +463,14 @@ bool DataFile::exists() const {
   return ::stat(filename.c_str(), &st) == 0;
 }
 
+int DataFile::writeRows(const void* src, int64_t pitch, int64_t rowBytes, int64_t rows) {
+  if (!is_open()) return reportNotOpened(filename);
+  if (pitch < rowBytes || rowBytes < 0 || rows < 0 || is_buffered()) return STATUS_BAD_CONDITION;
+  if (!stream_.putRowsShared(src, pitch, rowBytes, rows, position_)) return reportWriteFailed(filename);
+  position_ += rows * rowBytes;
+  return STATUS_OK;
+}
+
 int DataFile::write_hdr() {
   CheckedCall cc("DataFile::write_hdr()");
   hdrname = filename + ".hdr";

@@ -114,6 +114,10 @@ class DataFile : public GeneralSAR_Base {
   int read(void* dst, int64_t n);
   // 5 "File writing failed!" on a short write.
   int write(const void* src, int64_t n);
+  // `rows` rows of rowBytes, `pitch` bytes apart from src, written at the
+  // current position by every thread (RasterStream::putRowsShared: the file
+  // open with mode 2, unbuffered). 5 "File writing failed!" on failure.
+  int writeRows(const void* src, int64_t pitch, int64_t rowBytes, int64_t rows);
   int64_t tell() const;
   // Pixel size of CellType (0 for a number outside 0..9).
   int element_sizeof() const { return cell_type_size(CellType); }
