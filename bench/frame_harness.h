@@ -222,9 +222,13 @@ inline void timeRasterPass(const std::string& file, std::uintmax_t bytes, double
   fs::remove(file);
 }
 
+// A stage may write its output over the file it reads and rename it (a job
+// that erases its temporaries does), so a raster is known by its name: its
+// size is the last one seen, its writer the stage in which the name first
+// held data.
 struct Raster {
   std::uintmax_t bytes = 0;
-  int writer = -1;  // stage during which it last grew
+  int writer = -1;
 };
 
 // Runs the focuser once on `jobFile` in `folder` and measures its floor.
@@ -245,19 +249,24 @@ inline FrameRun runFrame(const std::string& folder, const std::string& jobFile, 
   options.timeoutSeconds = 7200;
   options.variables = variables;
   options.variables["TESSIVOR_FFT_LEDGER"] = ledger;
-  options.hook = [&](const support::RunningFocuser& running) {
+  auto scanRasters = [&] {
     std::error_code ec;
     for (const auto& entry : fs::directory_iterator(folder, ec)) {
       std::error_code sizeError;
       const std::uintmax_t size = entry.is_regular_file(sizeError) ? entry.file_size(sizeError) : 0;
       if (sizeError || size < (std::uintmax_t(1) << 20)) continue;
       Raster& r = rasters[entry.path().filename().string()];
-      if (size > r.bytes) {
-        r.bytes = size;
-        r.writer = static_cast<int>(next);
-      }
+      r.bytes = size;
+      if (r.writer < 0) r.writer = static_cast<int>(next);
     }
-    if (next + 1 >= stages.size()) return;
+  };
+  options.hook = [&](const support::RunningFocuser& running) {
+    // The stage first: a raster that appears with a checkpoint belongs to
+    // the stage the checkpoint opens.
+    if (next + 1 >= stages.size()) {
+      scanRasters();
+      return;
+    }
     const double cpu = processCpu(running.pid);
     const std::string text = support::readText(running.folder + "Process.trace");
     while (next + 1 < stages.size() && text.find(stages[next].endMarker) != std::string::npos) {
@@ -270,8 +279,10 @@ inline FrameRun runFrame(const std::string& folder, const std::string& jobFile, 
       if (cpu >= 0.0) lastCpu = cpu;
       ++next;
     }
+    scanRasters();
   };
   const support::FocuserRun r = support::runFocuser(folder, jobFile, options);
+  scanRasters();  // final sizes of what the run keeps
   t.totalWall = r.seconds;
   t.totalCpu = r.cpuSeconds;
   t.peakMiB = r.peakMiB;
