@@ -1,5 +1,6 @@
 #pragma once
 #include <cmath>
+#include <functional>
 
 #include "base/fcomplex.h"
 #include "core/fft.h"
@@ -95,6 +96,17 @@ int OutImagePar(const AzimuthBlockPar& par, int& fftlen, double& spacing, int& p
 // par.interp.
 int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
 
+// A block held as a strip of its columns, `pitch` samples a row, that
+// follows the range sub-blocks across the block. Before each sub-block
+// multirg asks for its columns [first, first + count): `columns` makes them
+// present (the columns left of `first` hold focused samples and are no
+// longer needed) and sets `at` to column `first` of the block's row 0.
+// Status 0, else the status multirg returns. count never exceeds pitch.
+struct BlockStrip {
+  int pitch = 0;
+  std::function<int(int first, int count, fcomplex*& at)> columns;
+};
+
 // Walks the block in overlapping range sub-blocks of `subSamples` samples,
 // `overlap` the full overlap. poly[5]: Doppler centroid in fast time about
 // `tref`. block / blocks feed the progress bar. Each sub-block leaves its
@@ -104,10 +116,11 @@ int focazwk(AzimuthBlockPar& par, AzimuthBlockOut& out);
 // target ends at -k0 R0 whatever the centroid. par.range0 gives the slant
 // range of the block's first output sample. `scratch`, when given, holds the
 // sub-block work area from one block to the next (a fresh one per block
-// costs the clearing of its pages).
+// costs the clearing of its pages). `strip`, when given, holds the block as
+// a strip of its columns rather than whole (see BlockStrip).
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
             const double poly[5], double tref, int block = 0, int blocks = 1,
-            FFTBuffer* scratch = nullptr);
+            FFTBuffer* scratch = nullptr, const BlockStrip* strip = nullptr);
 
 // Doppler rate that drifts along the azimuth time of a block (fr0y, fr1y):
 // a target's range history follows the equivalent speed of its own beam

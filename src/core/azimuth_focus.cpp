@@ -27,6 +27,22 @@ int fail(const char* message, int status, int line, const char* function) {
 }
 #define AF_FAIL(message, status) fail((message), (status), __LINE__, __func__)
 
+// Columns of a block held at a time: all of them, unless the block and the
+// sub-block work area (`LinesInBlock` rows each) need more than `Memory` less
+// kReserveMiB, left to the kernels' row buffers, the transform plans and the
+// rest of the process; then as many as fit, at least one sub-block. In core
+// the block is held whole: its focused rows overwrite the input raster
+// that a later strip would still read.
+int blockColumns(const AzimuthFocusConf& conf, int samples, bool inCore) {
+  constexpr double kReserveMiB = 64.0;
+  if (inCore || conf.Memory <= 0) return samples;
+  const double columnBytes = static_cast<double>(sizeof(fcomplex)) * conf.LinesInBlock;
+  const double room = (conf.Memory - kReserveMiB) * 1048576.0 - columnBytes * conf.SamplesInBlock;
+  const double fit = std::floor(room / columnBytes);
+  if (fit >= samples) return samples;
+  return std::min(samples, std::max(conf.SamplesInBlock, static_cast<int>(std::max(0.0, fit))));
+}
+
 }  // namespace
 
 int azimuth_block_plan(int lines, int linesInBlock, int halfOverlap, AzimuthBlockPlan& plan) {
@@ -210,9 +226,10 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
       return STATUS_NOT_OPENED;
     }
   }
+  const int columns = blockColumns(conf, samples, scene.inCore != 0);
   FFTBuffer blockBuf;
   try {
-    blockBuf.resize(static_cast<std::size_t>(samples) * conf.LinesInBlock);
+    blockBuf.resize(static_cast<std::size_t>(columns) * conf.LinesInBlock);
   } catch (const std::bad_alloc&) {
     return AF_FAIL("Out of memory for the azimuth block", STATUS_NO_MEMORY);
   }
@@ -222,10 +239,14 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   long long readPos = 0;  // first input row of the block
   long long outRow = 0;
   const std::size_t rowBytes = sizeof(fcomplex) * samples;
+  const long long outRowBytes = static_cast<long long>(sizeof(fcomplex)) * outSamples;
   for (int b = 0; b <= plan.last; ++b) {
     const int blockLines = b < plan.last ? conf.LinesInBlock : lines - plan.step * plan.last;
     if (blockLines <= A) break;
-    if (scene.inCore) {
+    const int rows = blockLines - A;
+    if (columns < samples) {
+      // Nothing read yet: the strip is filled as the sub-blocks ask for it.
+    } else if (scene.inCore) {
       std::memcpy(blockBuf.data(), scene.buffer + readPos * samples, rowBytes * blockLines);
     } else {
       const long long blockBytes = static_cast<long long>(rowBytes) * blockLines;
@@ -249,17 +270,67 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
     par.samples = samples;
     par.data = blockBuf.data();
     AzimuthBlockOut bo;
-    st = multirg(par, bo, conf.SamplesInBlock, fullRg, poly, pdc[7], b,
-                 std::max(1, plan.progressTotal), &subBlockWork);
+    // A block wider than the budget allows is held as a strip of its
+    // columns [first, first + columns), of which [first, loaded) are read.
+    // When the next sub-block runs past it, the focused columns left of
+    // that sub-block are written out, the unfocused ones move to the front
+    // and the rest is read.
+    int first = 0, loaded = 0, failed = 0;
+    auto putFocused = [&](int end) {
+      const int n = std::min(end, outSamples) - first;
+      bool whole = true;
+      if (n <= 0) return whole;
+      const long long bytes = static_cast<long long>(sizeof(fcomplex)) * n;
+#pragma omp parallel for schedule(static) reduction(&& : whole)
+      for (int r = 0; r < rows; ++r)
+        whole = out.pwrite(blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * columns, bytes,
+                           (outRow + r) * outRowBytes + first * static_cast<long long>(sizeof(fcomplex))) ==
+                    bytes &&
+                whole;
+      return whole;
+    };
+    BlockStrip strip;
+    strip.pitch = columns;
+    strip.columns = [&](int from, int count, fcomplex*& at) {
+      if (from + count > loaded) {
+        if (!putFocused(from)) return failed = STATUS_WRITE_FAILED;
+        const int keep = std::max(0, loaded - from), end = std::min(samples, from + columns);
+        const long long bytes = static_cast<long long>(sizeof(fcomplex)) * (end - from - keep);
+        bool whole = true;
+#pragma omp parallel for schedule(static) reduction(&& : whole)
+        for (int j = 0; j < blockLines; ++j) {
+          fcomplex* row = blockBuf.data() + static_cast<std::size_t>(j) * columns;
+          if (keep > 0) std::memmove(row, row + (from - first), sizeof(fcomplex) * keep);
+          whole = in.pread(row + keep, bytes,
+                           (firstLine + j) * static_cast<long long>(rowBytes) +
+                               (from + keep) * static_cast<long long>(sizeof(fcomplex))) == bytes &&
+                  whole;
+        }
+        first = from;
+        loaded = end;
+        if (!whole) return failed = STATUS_READ_FAILED;
+      }
+      at = blockBuf.data() + (from - first);
+      return 0;
+    };
+    st = multirg(par, bo, conf.SamplesInBlock, fullRg, poly, pdc[7], b, std::max(1, plan.progressTotal),
+                 &subBlockWork, columns < samples ? &strip : nullptr);
+    if (st == 0 && columns < samples && !putFocused(samples)) failed = st = STATUS_WRITE_FAILED;
+    if (failed != 0) {
+      if (scene.verbose) waitbar_close();
+      ORV_REPORT(failed == STATUS_READ_FAILED ? "File reading failed!" : "File writing failed!", REPORT_ERROR);
+      ORV_REPORT(failed == STATUS_READ_FAILED ? files.input : files.output, REPORT_ERROR);
+      return failed;
+    }
     if (st != 0) {
       if (scene.verbose) waitbar_close();
       ORV_REPORT_CALLED_ERROR();
       return st;
     }
 
-    const int rows = blockLines - A;
-    const long long outRowBytes = static_cast<long long>(sizeof(fcomplex)) * outSamples;
-    if (scene.inCore) {
+    if (columns < samples) {
+      // Written out column by column above.
+    } else if (scene.inCore) {
       for (int r = 0; r < rows; ++r)
         std::memmove(scene.buffer + (outRow + r) * outSamples,
                      blockBuf.data() + static_cast<std::size_t>(A / 2 + r) * samples,

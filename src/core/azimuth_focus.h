@@ -72,6 +72,10 @@ struct AzimuthFocusConf {
   int AzimuthOverlapFromScene = 0;
   double ApplyAzShift = 0.0;
   double ApplyRgShift = 0.0;
+  // Budget of the job in MiB: a block that does not fit in it with the
+  // sub-block work area is held as a strip of its columns that follows the
+  // range sub-blocks (same product). 0: the block is held whole.
+  int Memory = 0;
 };
 
 // Status 0, 1, 4, 5, 7, 9 or a kernel's status. In core, the focused rows

@@ -545,7 +545,8 @@ void residualPhasors(const AzimuthBlockPar& par, double rw0, double r0, double d
 }  // namespace
 
 int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int overlap,
-            const double poly[5], double tref, int block, int blocks, FFTBuffer* scratch) {
+            const double poly[5], double tref, int block, int blocks, FFTBuffer* scratch,
+            const BlockStrip* strip) {
   const int S = par.samples;
   const int s = subSamples;
   const int o = overlap;
@@ -612,13 +613,21 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
     par.fr0 = fr0keep;
     par.fr1 = fr1keep;
     const WKRateDrift drift = wk_rate_drift(par);
+    // The sub-block's columns of the block: row j at cols + j * pitch.
+    fcomplex* cols = blockData + f;
+    int pitch = S;
+    if (strip) {
+      st = strip->columns(f, ncopy, cols);
+      if (st != 0) break;
+      pitch = strip->pitch;
+    }
     std::vector<double> centroids;
     if (drift.active) {
       // Resampled to the speed of the block's centre row.
       try {
         centroids.resize(ncopy);
         for (int i = 0; i < ncopy; ++i) centroids[i] = dcAt(par.t0 + i / par.frg - tref);
-        wk_resample_rows(blockData + f, S, work.data(), s, nl, ncopy, par.prf, -drift.alpha, 0.0,
+        wk_resample_rows(cols, pitch, work.data(), s, nl, ncopy, par.prf, -drift.alpha, 0.0,
                          0.0, centroids.data());
       } catch (const std::bad_alloc&) {
         st = STATUS_NO_MEMORY;
@@ -632,7 +641,7 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
 #pragma omp parallel for schedule(static)
       for (int j = 0; j < nl; ++j) {
         fcomplex* dst = work.data() + static_cast<std::size_t>(j) * s;
-        std::memcpy(dst, blockData + static_cast<std::size_t>(j) * S + f, sizeof(fcomplex) * ncopy);
+        std::memcpy(dst, cols + static_cast<std::size_t>(j) * pitch, sizeof(fcomplex) * ncopy);
         std::fill(dst + ncopy, dst + s, fcomplex(0.0f, 0.0f));
       }
     }
@@ -685,18 +694,18 @@ int multirg(AzimuthBlockPar& par, AzimuthBlockOut& out, int subSamples, int over
       }
       if (drift.active) {
         // Targets back at their zero-Doppler times (see wk_resample_rows).
-        wk_resample_rows(work.data() + o / 2, s, blockData + f, S, nl, ncopyBack, par.prf,
+        wk_resample_rows(work.data() + o / 2, s, cols, pitch, nl, ncopyBack, par.prf,
                          drift.alpha, out.aztime, drift.beamLead, centroids.data() + o / 2);
 #pragma omp parallel for schedule(static)
         for (int j = 0; j < nl; ++j) {
-          fcomplex* dst = blockData + static_cast<std::size_t>(j) * S + f;
+          fcomplex* dst = cols + static_cast<std::size_t>(j) * pitch;
           for (int i = 0; i < ncopyBack; ++i) dst[i] *= turn[i];
         }
       } else {
 #pragma omp parallel for schedule(static)
         for (int j = 0; j < nl; ++j) {
           const fcomplex* src = work.data() + static_cast<std::size_t>(j) * s + o / 2;
-          fcomplex* dst = blockData + static_cast<std::size_t>(j) * S + f;
+          fcomplex* dst = cols + static_cast<std::size_t>(j) * pitch;
           for (int i = 0; i < ncopyBack; ++i) dst[i] = src[i] * turn[i];
         }
       }

@@ -270,6 +270,7 @@ AzimuthFocusConf azimuthFocusConf(const SARFocuser_conf& conf, double frg, doubl
   ac.RangeOverlap = conf.RangeOverlap;
   ac.AzimuthOverlap = conf.AzimuthOverlap;
   ac.AzimuthOverlapFromScene = conf.AzimuthOverlapFromScene;
+  ac.Memory = conf.Memory;
   return ac;
 }
 

@@ -69,6 +69,9 @@ struct SmallScene {
 
 TEST(AzimuthFoc, FileAndInCoreFormsAgreeAndThreadsDoNotChangeBits) {
   SmallScene s;
+  // A budget below what a block needs: the file form holds each block as a
+  // strip of one sub-block's columns, the in-core form holds it whole.
+  s.conf.Memory = 1;
   const std::string dir = support::scratchDir("forms");
   s.files.input = dir + "/in.rgfoc";
   s.files.output = dir + "/out";
