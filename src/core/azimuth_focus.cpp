@@ -209,11 +209,15 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
   const int fullRg = 2 * conf.RangeOverlap;
   const int outSamples = samples - fullRg;
 
+  const int columns = blockColumns(conf, samples, scene.inCore != 0);
   RasterStream in, out;
-  // Output rows are never longer than input rows and block b writes only
-  // the rows before the first line block b + 1 reads, so the output may be
-  // written over the input's file.
-  const bool overwrite = !scene.inCore && files.overwriteInput && handOverFile(files.input, files.output);
+  // A block held whole is read before any of its rows is written; output
+  // rows are never longer than input rows and block b writes only the rows
+  // before the first line block b + 1 reads, so the output may then be
+  // written over the input's file. A strip writes rows of its own block
+  // while other columns of it are still to be read.
+  const bool overwrite = !scene.inCore && columns == samples && files.overwriteInput &&
+                         handOverFile(files.input, files.output);
   if (!scene.inCore) {
     if (!in.open(overwrite ? files.output : files.input, "rb")) {
       ORV_REPORT("File not opened!", REPORT_ERROR);
@@ -226,7 +230,6 @@ int azimuthfoc(const AzimuthFocusFiles& files, AzimuthFocusScene& scene,
       return STATUS_NOT_OPENED;
     }
   }
-  const int columns = blockColumns(conf, samples, scene.inCore != 0);
   FFTBuffer blockBuf;
   try {
     blockBuf.resize(static_cast<std::size_t>(columns) * conf.LinesInBlock);

@@ -4,6 +4,7 @@
 #include "focus/multiplatform_focuser.h"
 
 #include <climits>
+#include <cstdio>
 
 #include "base/status.h"
 #include "diag/report.h"
@@ -106,6 +107,10 @@ int ATmultiplatformFocuser::InitProcessing() {
     if (focuser) fillCommon(*focuser);
     status = sensor->check(*this, focuser.get());
   }
+  if (status == 0 && focuser && eraseTemporaryFiles == 1) {
+    for (const TemporaryFile& file : sensor->temporaryFiles(*this))
+      focuser->erasedTemporaries.push_back(file.name);
+  }
   focuser_ = std::move(focuser);
   if (status == 0 && !focuser_)
     status = MP_FAIL("No " + std::string(sensor->family) + " focuser in this build: the " +
@@ -125,9 +130,13 @@ int ATmultiplatformFocuser::run() {
 int ATmultiplatformFocuser::FinalizeProcessing(const std::string&, int) {
   int status = 0;
   if (eraseTemporaryFiles == 1) {
-    if (const SensorDriver* sensor = findSensor(platform))
-      sensor->eraseTemporary(*this);
-    else
+    if (const SensorDriver* sensor = findSensor(platform)) {
+      // A failed removal is a level 1 report, not an error.
+      for (const TemporaryFile& file : sensor->temporaryFiles(*this)) {
+        if (std::remove(file.name.c_str()) != 0) ORV_REPORT("Cannot remove file", REPORT_WARNING);
+        if (!file.announce.empty()) ORV_REPORT(file.announce, REPORT_CHECKPOINT);
+      }
+    } else
       status = MP_FAIL("Invalid name for platform", STATUS_BAD_PARAMETER);
   }
   focuser_.reset();

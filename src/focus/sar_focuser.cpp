@@ -1,5 +1,6 @@
 #include "focus/sar_focuser.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
 #include <cstdio>
@@ -169,6 +170,12 @@ bool fileOpens(const std::string& name) {
   if (!f) return false;
   std::fclose(f);
   return true;
+}
+
+// Whether the chain or the job erases `file` once its stage has read it.
+bool erasedByTheJob(const SARFocuser_conf& conf, const std::string& file) {
+  return conf.DeleteTempFiles != 0 || std::find(conf.ErasedTemporaries.begin(), conf.ErasedTemporaries.end(),
+                                                file) != conf.ErasedTemporaries.end();
 }
 
 void removeReported(const std::string& name) {
@@ -622,7 +629,7 @@ int ChainRun::rangeStep(const std::string& raw) {
   rp.prf = ctx.prf_hz;
   rp.lines = ctx.lines;
   rp.samples = ctx.samples;
-  rp.overwriteInput = conf.TemporariesErased || conf.DeleteTempFiles;
+  rp.overwriteInput = erasedByTheJob(conf, ctx.rawFile);
   rw.verbose = conf.Verbose;
   rw.replica = chirp.data();
   rw.replicaLen = static_cast<int>(chirp.size());
@@ -740,7 +747,7 @@ int ChainRun::azimuthStage() {
   if (conf.ApplyRgShift == ctx.samples) conf.ApplyRgShift = rgSamples;
   AzimuthFocusFiles files =
       azimuthFocusFiles(ctx.rgfocFile, ctx.outputFile, smp, ctx.swstMin, ctx.azimuthStart);
-  files.overwriteInput = conf.TemporariesErased || conf.DeleteTempFiles;
+  files.overwriteInput = erasedByTheJob(conf, ctx.rgfocFile);
   scene.verbose = conf.Verbose;
   scene.DCref = conf.DCref;
   scene.inCore = conf.Incore;

@@ -5,6 +5,7 @@
 // and each channel is de-scalloped.
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "base/fcomplex.h"
 #include "core/azimuth_focus.h"
@@ -28,9 +29,9 @@ struct SARFocuser_conf {
   std::string ProcessingConfFile;
   double DCref = 0.0;
   int DeleteTempFiles = 0;
-  // Set by the job, not the profile: the job erases the chain's temporary
-  // rasters at its end, so each stage may write its output over its input.
-  bool TemporariesErased = false;
+  // Set by the job, not the profile: the files the job erases at its end.
+  // A stage may write its output over an input named here.
+  std::vector<std::string> ErasedTemporaries;
 
   // "DCestConf"
   double RgBand = 0.0;

@@ -17,6 +17,13 @@ struct FinishingTag {
   std::string second;  // second file handed to the export (ASA_XCA, ERSDAC orbit)
 };
 
+// A temporary file of a job and, where its erasure is announced, the
+// checkpoint reported after the removal.
+struct TemporaryFile {
+  std::string name;
+  std::string announce{};
+};
+
 struct SensorDriver {
   const char* platform;  // job parameter 0, exact
   // Name of the parameter profile for the job (a file of the description
@@ -33,8 +40,9 @@ struct SensorDriver {
   // Tests after the fill and the common fields; 10 when something the
   // sensor needs is missing.
   int (*check)(const FocuserJobFields& job, const stripmapGeneralFocuser* focuser);
-  // Removes the chain's temporary files of the job.
-  void (*eraseTemporary)(const FocuserJobFields& job);
+  // The chain's temporary files of the job, in the order in which the job
+  // erases them.
+  std::vector<TemporaryFile> (*temporaryFiles)(const FocuserJobFields& job);
   // Export tag of a single-scene product; `parameters` is the job.
   FinishingTag (*finishingTag)(const FocuserJobFields& job,
                                const std::vector<std::string>& parameters);

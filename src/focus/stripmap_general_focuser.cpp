@@ -135,7 +135,7 @@ int stripmapGeneralFocuser::sarfocuser() {
   conf_->Verbose = 1;
   // Only the chain's own temporaries may be overwritten, never rasters a
   // caller names.
-  conf_->TemporariesErased = temporariesErased;
+  conf_->ErasedTemporaries = erasedTemporaries;
   int status = sarFocuser_->run();
   if (status != 0) {
     ORV_REPORT_CALLED_ERROR();
@@ -152,7 +152,7 @@ int stripmapGeneralFocuser::sarfocuser(const std::string& raw, const std::string
   sarFocuser_->ChirpFile = chirp;
   if (!antenna.empty()) sarFocuser_->AntennaFile = antenna;
   sarFocuser_->OutputFilename = output;
-  conf_->TemporariesErased = false;
+  conf_->ErasedTemporaries.clear();
   int status = sarFocuser_->run();
   if (status != 0) {
     ORV_REPORT_CALLED_ERROR();

@@ -5,6 +5,7 @@
 // product records.
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "focus/sar_focuser.h"
 #include "product/general_sar.h"
@@ -53,7 +54,7 @@ class stripmapGeneralFocuser {
   std::string outputFilename;         // root of every output
   int skipLines = 0;
   int extractLines = 0;
-  bool temporariesErased = false;     // the job erases the temporaries at its end
+  std::vector<std::string> erasedTemporaries;  // files the job erases at its end
 
   SARFocuser& focuser() { return *sarFocuser_; }
   SARFocuser_conf& conf() { return *conf_; }

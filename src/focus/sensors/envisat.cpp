@@ -96,18 +96,18 @@ int checkEnvisat(const FocuserJobFields&, const stripmapGeneralFocuser* generic)
 
 // The single-scene temporaries with the antenna pattern, and those of both
 // channels of an alternating-polarisation product.
-void eraseTemporaryEnvisat(const FocuserJobFields& job) {
+std::vector<TemporaryFile> envisatTemporaries(const FocuserJobFields& job) {
   const std::string& out = job.outputFilename;
-  removeTemporaryFiles(out, {".chirp", ".extracted", ".chirp.hdr", ".extracted.hdr", ".rgfoc",
-                             ".rgfoc.hdr", ".antenna", ".antenna.hdr"});
-  if (!isAlternating(EnvisatTypes(job.level0Filename.substr(0, kNameBuffer - 1)))) return;
+  std::vector<TemporaryFile> files;
+  appendTemporaryFiles(files, out, {".chirp", ".extracted", ".chirp.hdr", ".extracted.hdr", ".rgfoc",
+                                    ".rgfoc.hdr", ".antenna", ".antenna.hdr"});
+  if (!isAlternating(EnvisatTypes(job.level0Filename.substr(0, kNameBuffer - 1)))) return files;
   for (const char* suffix :
        {".chirp1.hdr", ".chirp1", ".extracted1", ".extracted1.hdr", ".antenna1", ".antenna1.hdr",
         "1.rgfoc", "1.rgfoc.hdr", ".chirp2", ".chirp2.hdr", ".extracted2", ".extracted2.hdr",
-        ".antenna2", ".antenna2.hdr", "2.rgfoc", "2.rgfoc.hdr"}) {
-    removeTemporaryFile(out + suffix);
-    ORV_REPORT(std::string(suffix) + " removed", REPORT_CHECKPOINT);
-  }
+        ".antenna2", ".antenna2.hdr", "2.rgfoc", "2.rgfoc.hdr"})
+    files.push_back({out + suffix, std::string(suffix) + " removed"});
+  return files;
 }
 
 FinishingTag envisatFinishingTag(const FocuserJobFields& job, const std::vector<std::string>&) {
@@ -121,7 +121,7 @@ const SensorDriver kEnvisatSensor = {.platform = "ENVISAT",
                                      .makeFocuser = makeEnvisatFocuser,
                                      .fill = fillEnvisat,
                                      .check = checkEnvisat,
-                                     .eraseTemporary = eraseTemporaryEnvisat,
+                                     .temporaryFiles = envisatTemporaries,
                                      .finishingTag = envisatFinishingTag,
                                      .family = "ENVISAT",
                                      .auxiliaryInDescriptionFiles = true,

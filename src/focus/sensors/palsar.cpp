@@ -57,29 +57,28 @@ int checkPalsarErsdac(const FocuserJobFields&, const stripmapGeneralFocuser*) { 
 
 // The temporaries of each scene of a multi-polarisation job, or those of the
 // single scene.
-void eraseTemporaryPalsar(const FocuserJobFields& job) {
+std::vector<TemporaryFile> palsarTemporaries(const FocuserJobFields& job) {
   const std::string& out = job.outputFilename;
+  std::vector<TemporaryFile> files;
   if (!job.level0FilenameSecondPol.empty()) {
     for (const std::string* scene : {&job.level0Filename, &job.level0FilenameSecondPol,
                                      &job.level0FilenameThirdPol, &job.level0FilenameFourthPol}) {
       if (scene->empty()) continue;
       const std::string root =
           out + "_" + polarisationLabel(PalsarTypes(job.auxFile2, *scene).getPol());
-      removeTemporaryFiles(root, {".chirp", ".extracted", ".extracted.interf", ".chirp.hdr",
-                                  ".extracted.hdr", ".extracted.interf.hdr", ".rgfoc",
-                                  ".rgfoc.hdr"});
+      appendTemporaryFiles(files, root, {".chirp", ".extracted", ".extracted.interf", ".chirp.hdr",
+                                         ".extracted.hdr", ".extracted.interf.hdr", ".rgfoc",
+                                         ".rgfoc.hdr"});
     }
-    return;
+    return files;
   }
   const std::string label = polarisationLabel(PalsarTypes(job.auxFile2, job.level0Filename).getPol());
-  removeTemporaryFile(out + ".chirp");
-  removeTemporaryFile(out + ".extracted_" + label);
-  removeTemporaryFile(out + ".extracted_" + label + ".interf");
-  removeTemporaryFile(out + ".chirp.hdr");
-  removeTemporaryFile(out + ".extracted_" + label + ".hdr");
-  removeTemporaryFile(out + ".extracted_" + label + ".interf.hdr");
-  removeTemporaryFile(out + ".rgfoc");
-  removeTemporaryFile(out + ".rgfoc.hdr");
+  const std::string extracted = ".extracted_" + label;
+  for (const std::string& suffix : {std::string(".chirp"), extracted, extracted + ".interf", std::string(".chirp.hdr"),
+                                    extracted + ".hdr", extracted + ".interf.hdr", std::string(".rgfoc"),
+                                    std::string(".rgfoc.hdr")})
+    files.push_back({out + suffix});
+  return files;
 }
 
 FinishingTag palsarFinishingTag(const FocuserJobFields& job, const std::vector<std::string>&) {
@@ -128,7 +127,7 @@ const SensorDriver kPalsarSensor = {.platform = "PALSAR",
                                     .makeFocuser = makePalsarFocuser,
                                     .fill = fillPalsar,
                                     .check = checkPalsar,
-                                    .eraseTemporary = eraseTemporaryPalsar,
+                                    .temporaryFiles = palsarTemporaries,
                                     .finishingTag = palsarFinishingTag,
                                     .family = "PALSAR",
                                     .auxiliaryInDescriptionFiles = false,
@@ -140,7 +139,7 @@ const SensorDriver kPalsarErsdacSensor = {.platform = "PALSAR_ERSDAC",
                                           .makeFocuser = makePalsarErsdacFocuser,
                                           .fill = fillPalsar,
                                           .check = checkPalsarErsdac,
-                                          .eraseTemporary = eraseTemporaryPalsar,
+                                          .temporaryFiles = palsarTemporaries,
                                           .finishingTag = palsarErsdacFinishingTag,
                                           .family = "PALSAR",
                                           .auxiliaryInDescriptionFiles = false,

@@ -9,7 +9,6 @@ void fillScene(const FocuserJobFields& job, stripmapGeneralFocuser& focuser) {
   focuser.level0Filename = job.level0Filename;
   focuser.skipLines = job.skipLines;
   focuser.extractLines = job.extractLines;
-  focuser.temporariesErased = job.eraseTemporaryFiles == 1;
   if (auto* modular = dynamic_cast<stripmapGeneralFocuserModular*>(&focuser))
     modular->Memory = job.Memory;
 }
@@ -25,17 +24,14 @@ int sensorCalled(int status, int line, const char* function) {
   return status;
 }
 
-bool removeTemporaryFile(const std::string& name) {
-  if (std::remove(name.c_str()) == 0) return true;
-  ORV_REPORT("Cannot remove file", REPORT_WARNING);
-  return false;
+void appendTemporaryFiles(std::vector<TemporaryFile>& files, const std::string& root,
+                          std::initializer_list<const char*> suffixes) {
+  for (const char* suffix : suffixes) files.push_back({root + suffix});
 }
 
-void removeTemporaryFiles(const std::string& root, std::initializer_list<const char*> suffixes) {
-  for (const char* suffix : suffixes) removeTemporaryFile(root + suffix);
-}
-
-void eraseSingleSceneTemporaries(const FocuserJobFields& job) {
-  removeTemporaryFiles(job.outputFilename, {".chirp", ".extracted", ".chirp.hdr", ".extracted.hdr",
-                                            ".rgfoc", ".rgfoc.hdr"});
+std::vector<TemporaryFile> singleSceneTemporaries(const FocuserJobFields& job) {
+  std::vector<TemporaryFile> files;
+  appendTemporaryFiles(files, job.outputFilename,
+                       {".chirp", ".extracted", ".chirp.hdr", ".extracted.hdr", ".rgfoc", ".rgfoc.hdr"});
+  return files;
 }

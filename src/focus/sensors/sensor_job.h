@@ -3,8 +3,10 @@
 // focuser, failure reports and the removal of temporary files.
 #include <initializer_list>
 #include <string>
+#include <vector>
 
 #include "focus/job_fields.h"
+#include "focus/sensor_registry.h"
 
 class stripmapGeneralFocuser;
 
@@ -18,14 +20,13 @@ int sensorFail(const std::string& message, int status, int line, const char* fun
 int sensorCalled(int status, int line, const char* function);
 #define SENSOR_CALLED(status) sensorCalled((status), __LINE__, __func__)
 
-// Removes one file; a failure is a level 1 report, not an error.
-bool removeTemporaryFile(const std::string& name);
-// "<root><suffix>" for each suffix, in order.
-void removeTemporaryFiles(const std::string& root, std::initializer_list<const char*> suffixes);
+// "<root><suffix>" for each suffix, in order, appended to `files`.
+void appendTemporaryFiles(std::vector<TemporaryFile>& files, const std::string& root,
+                          std::initializer_list<const char*> suffixes);
 
 // The chain's temporary rasters of a single scene: chirp, extracted raw
 // data and range-focused data with their headers.
-void eraseSingleSceneTemporaries(const FocuserJobFields& job);
+std::vector<TemporaryFile> singleSceneTemporaries(const FocuserJobFields& job);
 
 // Profile line of a sensor with one profile.
 template <const char* Name>
