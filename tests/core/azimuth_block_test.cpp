@@ -85,7 +85,11 @@ TEST(AzimuthFoc, FileAndInCoreFormsAgreeAndThreadsDoNotChangeBits) {
   omp_set_num_threads(1);
 #endif
   AzimuthFocusScene fileScene = s.scene;
+  // A strip writes rows of its block while other columns of it are still
+  // to be read: it never writes over its input, even where it may.
+  s.files.overwriteInput = true;
   ASSERT_EQ(azimuthfoc(s.files, fileScene, s.conf), 0);
+  EXPECT_EQ(std::filesystem::file_size(s.files.input), s.raw.size() * sizeof(fcomplex));
 #ifdef _OPENMP
   omp_set_num_threads(std::max(2, threads));
 #endif
