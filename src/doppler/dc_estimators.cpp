@@ -374,7 +374,9 @@ int multimlbf(DcEstState& st, int blockIndex) {
             bi += dr * xi + di * xr;
           }
           std::complex<double> z = std::complex<double>(ar, ai) * std::conj(std::complex<double>(br, bi));
-          const double mag = std::abs(z);
+          // The beat's magnitude from its squared norm: no overflow is
+          // possible at these values, and hypot costs a quarter of the block.
+          const double mag = std::sqrt(std::norm(z));
           z /= std::max(mag, static_cast<double>(FLT_MIN));
           beat[static_cast<std::size_t>(j) * nl + l] = fcomplex(z);
         }
@@ -442,22 +444,36 @@ void wdar_close() { g_wdar.reset(); }
 
 int wdar(DcEstState& st, const double poly[7], int blockIndex) {
   if (!g_wdar) return -1;
-  WdarSetup& set = *g_wdar;
+  const int ns = g_wdar->blocks, nl = g_wdar->blockl;
+  if (static_cast<long>(st.blockBuf.size()) < static_cast<long>(ns) * nl) {
+    ORV_REPORT("wdar: block buffer does not match the set-up", REPORT_ERROR);
+    return STATUS_BAD_CONDITION;
+  }
+  (void)poly;
+  try {
+    FFTBuffer work(st.blockBuf.begin(), st.blockBuf.begin() + static_cast<long>(ns) * nl);
+    return wdarInPlace(st, blockIndex, work.data());
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("wdar: out of memory", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+}
+
+int wdarInPlace(DcEstState& st, int blockIndex, fcomplex* work) {
+  if (!g_wdar) return -1;
+  const WdarSetup& set = *g_wdar;
   if (blockIndex < 0 || blockIndex >= static_cast<int>(st.wdarBlocks.size())) {
     ORV_REPORT("wdar: block index out of range", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
   const int ns = set.blocks, nl = set.blockl;
-  if (st.blocks != ns || st.blockl != nl ||
-      static_cast<long>(st.blockBuf.size()) < static_cast<long>(ns) * nl) {
+  if (st.blocks != ns || st.blockl != nl) {
     ORV_REPORT("wdar: block buffer does not match the set-up", REPORT_ERROR);
     return STATUS_BAD_CONDITION;
   }
   WdarBlock& blk = st.wdarBlocks[blockIndex];
-  (void)poly;
   try {
-    FFTBuffer work(st.blockBuf.begin(), st.blockBuf.begin() + static_cast<long>(ns) * nl);
-    pfft_c(set.plan, work.data(), work.data());
+    pfft_c(set.plan, work, work);
     // Lag-one azimuth correlation per range frequency (rows are lines, so the
     // azimuth neighbour of a sample is one row further).
     std::vector<std::complex<double>> corr(ns, std::complex<double>(0.0, 0.0));

@@ -66,6 +66,9 @@ int wdar_init(DcEstState& state);
 // poly is the wrapped centroid polynomial in samples and lines (PRF units),
 // giving the phase at zero range frequency. -1 without set-up.
 int wdar(DcEstState& state, const double poly[7], int blockIndex);
+// The same on a block in `work` (ns x nl samples), transformed in place;
+// blocks may be estimated side by side on different threads.
+int wdarInPlace(DcEstState& state, int blockIndex, fcomplex* work);
 // Releases the WDAR set-up.
 void wdar_close();
 bool wdar_ready();

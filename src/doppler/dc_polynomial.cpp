@@ -6,6 +6,7 @@
 #include <cstring>
 #include <memory>
 #include <new>
+#include <string>
 #include <vector>
 
 #include "base/constants.h"
@@ -338,53 +339,73 @@ int dcnastd(const double* values, int n, double varTh, double* mean, double* std
   return STATUS_OK;
 }
 
-int read_block(DcEstState& st, const DcEstInput& input, int y, int x) {
+namespace {
+
+// The block of st.blocks x st.blockl samples at sample x, line y into dst,
+// in host byte order, from memory or through `file`. On failure the report
+// text is left in `message`.
+int readBlockInto(const DcEstState& st, const DcEstInput& input, const RasterStream& file, int y, int x,
+                  fcomplex* dst, std::string& message) {
   const int ns = st.blocks, nl = st.blockl;
   if (ns < 1 || nl < 1 || x < 0 || y < 0 || x + ns > input.samples || y + nl > input.lines) {
-    ORV_REPORT("read_block: block of " + std::to_string(ns) + " x " + std::to_string(nl) +
-                   " at sample " + std::to_string(x) + ", line " + std::to_string(y) +
-                   " lies outside the raster " + input.rasterFile,
-               REPORT_ERROR);
+    message = "read_block: block of " + std::to_string(ns) + " x " + std::to_string(nl) + " at sample " +
+              std::to_string(x) + ", line " + std::to_string(y) + " lies outside the raster " + input.rasterFile;
     return STATUS_BAD_CONDITION;
-  }
-  const std::size_t n = static_cast<std::size_t>(ns) * nl;
-  try {
-    if (st.blockBuf.size() < n) st.blockBuf.resize(n);
-  } catch (const std::bad_alloc&) {
-    ORV_REPORT("read_block: out of memory", REPORT_ERROR);
-    return STATUS_NO_MEMORY;
   }
   if (st.inMemory) {
     if (!st.data) {
-      ORV_REPORT("read_block: no raster in memory", REPORT_ERROR);
+      message = "read_block: no raster in memory";
       return STATUS_BAD_CONDITION;
     }
     for (int l = 0; l < nl; ++l)
-      std::memcpy(&st.blockBuf[static_cast<std::size_t>(l) * ns],
+      std::memcpy(dst + static_cast<std::size_t>(l) * ns,
                   st.data + static_cast<std::size_t>(y + l) * input.samples + x, ns * sizeof(fcomplex));
     return STATUS_OK;
-  }
-  RasterStream f;
-  if (!f.open(input.rasterFile, "rb")) {
-    ORV_REPORT("File not opened! " + input.rasterFile, REPORT_ERROR);
-    return STATUS_NOT_OPENED;
   }
   const bool swap = (input.byteOrder == 1) != (get_endian() == kMsbFirst);
   const long long lineBytes = static_cast<long long>(ns) * static_cast<long long>(sizeof(fcomplex));
   for (int l = 0; l < nl; ++l) {
     const long long off = input.headerOffset +
                           (static_cast<long long>(y + l) * input.samples + x) * static_cast<long long>(sizeof(fcomplex));
-    fcomplex* dst = &st.blockBuf[static_cast<std::size_t>(l) * ns];
-    if (f.pread(dst, lineBytes, off) != lineBytes) {
-      ORV_REPORT("File reading failed! " + input.rasterFile, REPORT_ERROR);
+    fcomplex* line = dst + static_cast<std::size_t>(l) * ns;
+    if (file.pread(line, lineBytes, off) != lineBytes) {
+      message = "File reading failed! " + input.rasterFile;
       return STATUS_READ_FAILED;
     }
     if (swap) {
-      float* v = reinterpret_cast<float*>(dst);
+      float* v = reinterpret_cast<float*>(line);
       for (int i = 0; i < 2 * ns; ++i) swp4(&v[i]);
     }
   }
   return STATUS_OK;
+}
+
+// The raster of a file-based estimation, open for the block reads.
+int openRaster(const DcEstState& st, const DcEstInput& input, RasterStream& file) {
+  if (st.inMemory || file.open(input.rasterFile, "rb")) return STATUS_OK;
+  ORV_REPORT("File not opened! " + input.rasterFile, REPORT_ERROR);
+  return STATUS_NOT_OPENED;
+}
+
+}  // namespace
+
+int read_block(DcEstState& st, const DcEstInput& input, int y, int x) {
+  const std::size_t n = static_cast<std::size_t>(std::max(st.blocks, 0)) * std::max(st.blockl, 0);
+  try {
+    if (st.blockBuf.size() < n) st.blockBuf.resize(n);
+  } catch (const std::bad_alloc&) {
+    ORV_REPORT("read_block: out of memory", REPORT_ERROR);
+    return STATUS_NO_MEMORY;
+  }
+  RasterStream file;
+  std::string message;
+  int s = STATUS_OK;
+  if (st.blocks >= 1 && st.blockl >= 1 && x >= 0 && y >= 0 && x + st.blocks <= input.samples &&
+      y + st.blockl <= input.lines)
+    s = openRaster(st, input, file);
+  if (s == STATUS_OK) s = readBlockInto(st, input, file, y, x, st.blockBuf.data(), message);
+  if (s != STATUS_OK && !message.empty()) ORV_REPORT(message, REPORT_ERROR);
+  return s;
 }
 
 int bestblocksproc(DcEstState& st, DcEstInput& input, const double poly[7]) {
@@ -418,17 +439,45 @@ int bestblocksproc(DcEstState& st, DcEstInput& input, const double poly[7]) {
       ORV_REPORT_CALLED_ERROR();
       return s;
     }
+    // The blocks are independent: each thread reads its own into its own
+    // buffer and estimates it; the reports follow in block order.
+    (void)poly;
     const int n = static_cast<int>(st.wdarBlocks.size());
+    RasterStream file;
+    if (int s = openRaster(st, input, file); s != 0) {
+      ORV_REPORT_CALLED_ERROR();
+      return s;
+    }
+    std::vector<int> readStatus(n, STATUS_OK), estimateStatus(n, STATUS_OK);
+    std::vector<std::string> messages(n);
+#pragma omp parallel
+    {
+      FFTBuffer work;
+#pragma omp for schedule(dynamic, 1)
+      for (int i = 0; i < n; ++i) {
+        const WdarBlock& b = st.wdarBlocks[i];
+        try {
+          work.resize(static_cast<std::size_t>(st.blocks) * st.blockl);
+        } catch (const std::bad_alloc&) {
+          readStatus[i] = STATUS_NO_MEMORY;
+          messages[i] = "read_block: out of memory";
+          continue;
+        }
+        readStatus[i] = readBlockInto(st, input, file, b.line - st.blockl / 2, b.range - st.blocks / 2,
+                                      work.data(), messages[i]);
+        if (readStatus[i] == STATUS_OK) estimateStatus[i] = wdarInPlace(st, i, work.data());
+      }
+    }
     for (int i = 0; i < n; ++i) {
-      const WdarBlock& b = st.wdarBlocks[i];
-      if (int s = read_block(st, input, b.line - st.blockl / 2, b.range - st.blocks / 2); s != 0) {
+      if (readStatus[i] != STATUS_OK) {
+        ORV_REPORT(messages[i], REPORT_ERROR);
         ORV_REPORT_CALLED_ERROR();
-        return s;
+        return readStatus[i];
       }
       std::printf("\nProcessing WDAR best block %d of %d.\n", i + 1, n);
-      if (int s = wdar(st, poly, i); s != 0) {
+      if (estimateStatus[i] != STATUS_OK) {
         ORV_REPORT_CALLED_ERROR();
-        return s;
+        return estimateStatus[i];
       }
     }
   }
