@@ -222,7 +222,31 @@ int Ortog::apply_ortog(const OrtogRaster& raster) {
 void ortogN_reset() { g_ortogN = OrtogNState{}; }
 
 namespace {
-double sum4(const double (&s)[4]) { return (s[0] + s[1]) + (s[2] + s[3]); }
+
+// Q sums over the n samples of a line, each in four interleaved partial sums
+// (sample k into partial sum k mod 4, added pairwise at the end), so that
+// neighbouring additions do not wait for each other. The samples go four at
+// a time so that the partial sums stay in registers; the order of the
+// additions is that of one sample after the other.
+template <int Q, class Term>
+inline void interleavedSums(int n, Term term, double (&out)[Q]) {
+  double acc[4][Q] = {};
+  int k = 0;
+  for (; k + 4 <= n; k += 4) {
+    for (int u = 0; u < 4; ++u) {
+      double v[Q];
+      term(k + u, v);
+      for (int q = 0; q < Q; ++q) acc[u][q] += v[q];
+    }
+  }
+  for (int u = 0; k < n; ++k, ++u) {
+    double v[Q];
+    term(k, v);
+    for (int q = 0; q < Q; ++q) acc[u][q] += v[q];
+  }
+  for (int q = 0; q < Q; ++q) out[q] = (acc[0][q] + acc[1][q]) + (acc[2][q] + acc[3][q]);
+}
+
 }  // namespace
 
 int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
@@ -236,23 +260,20 @@ int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
   // statistics run through the lines in order. So each of the three sums
   // goes over all lines on all threads, and the statistics follow in a
   // short pass in line order (a line of block 0 restarts them; an empty
-  // line leaves them as they are and passes unchanged). Sums over a line run
-  // in four interleaved partial sums (sample k into sum k mod 4, added
-  // pairwise at the end), so that neighbouring additions do not wait for
-  // each other.
+  // line leaves them as they are and passes unchanged).
   std::vector<double> a(lines), b(lines), c(lines);
   std::vector<float> smi(lines), smq(lines), ratio(lines), sinSkew(lines), invCos(lines);
   std::vector<char> empty(lines);
 #pragma omp parallel for schedule(static)
   for (int l = 0; l < lines; ++l) {
     const fcomplex* row = rowOf(l);
-    double si4[4] = {}, sq4[4] = {};
-    for (int k = 0; k < samples; ++k) {
-      si4[k & 3] += row[k].real();
-      sq4[k & 3] += row[k].imag();
-    }
-    a[l] = sum4(si4) / samples;
-    b[l] = sum4(sq4) / samples;
+    double sum[2];
+    interleavedSums(samples, [row](int k, double (&v)[2]) {
+      v[0] = row[k].real();
+      v[1] = row[k].imag();
+    }, sum);
+    a[l] = sum[0] / samples;
+    b[l] = sum[1] / samples;
   }
   for (int l = 0; l < lines; ++l) {
     if (block == 0) st.meanI = st.meanQ = 0.0;
@@ -267,14 +288,15 @@ int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
   for (int l = 0; l < lines; ++l) {
     if (empty[l]) continue;
     const fcomplex* row = rowOf(l);
-    double pi4[4] = {}, pq4[4] = {};
-    for (int k = 0; k < samples; ++k) {
-      const float I = row[k].real() - smi[l], Q = row[k].imag() - smq[l];
-      pi4[k & 3] += static_cast<double>(I) * I;
-      pq4[k & 3] += static_cast<double>(Q) * Q;
-    }
-    a[l] = sum4(pi4);
-    b[l] = sum4(pq4);
+    const float mi = smi[l], mq = smq[l];
+    double sum[2];
+    interleavedSums(samples, [row, mi, mq](int k, double (&v)[2]) {
+      const float I = row[k].real() - mi, Q = row[k].imag() - mq;
+      v[0] = static_cast<double>(I) * I;
+      v[1] = static_cast<double>(Q) * Q;
+    }, sum);
+    a[l] = sum[0];
+    b[l] = sum[1];
   }
   for (int l = 0; l < lines; ++l) {
     if (block == 0) st.levelI = st.levelQ = 0.0;
@@ -287,16 +309,17 @@ int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
   for (int l = 0; l < lines; ++l) {
     if (empty[l]) continue;
     const fcomplex* row = rowOf(l);
-    double cross4[4] = {}, ii4[4] = {}, qq4[4] = {};
-    for (int k = 0; k < samples; ++k) {
-      const float I = row[k].real() - smi[l], Q = (row[k].imag() - smq[l]) * ratio[l];
-      cross4[k & 3] += static_cast<double>(I) * Q;
-      ii4[k & 3] += static_cast<double>(I) * I;
-      qq4[k & 3] += static_cast<double>(Q) * Q;
-    }
-    a[l] = sum4(cross4);
-    b[l] = sum4(ii4);
-    c[l] = sum4(qq4);
+    const float mi = smi[l], mq = smq[l], r = ratio[l];
+    double sum[3];
+    interleavedSums(samples, [row, mi, mq, r](int k, double (&v)[3]) {
+      const float I = row[k].real() - mi, Q = (row[k].imag() - mq) * r;
+      v[0] = static_cast<double>(I) * Q;
+      v[1] = static_cast<double>(I) * I;
+      v[2] = static_cast<double>(Q) * Q;
+    }, sum);
+    a[l] = sum[0];
+    b[l] = sum[1];
+    c[l] = sum[2];
   }
   for (int l = 0; l < lines; ++l) {
     if (block == 0) st.cross = st.powI = st.powQ = 0.0;
