@@ -12,6 +12,7 @@
 #include "diag/report.h"
 #include "diag/waitbar.h"
 #include "numerics/fitting.h"
+#include "numerics/interleaved_sums.h"
 #include "product/general_sar.h"
 
 namespace {
@@ -221,33 +222,6 @@ int Ortog::apply_ortog(const OrtogRaster& raster) {
 
 void ortogN_reset() { g_ortogN = OrtogNState{}; }
 
-namespace {
-
-// Q sums over the n samples of a line, each in four interleaved partial sums
-// (sample k into partial sum k mod 4, added pairwise at the end), so that
-// neighbouring additions do not wait for each other. The samples go four at
-// a time so that the partial sums stay in registers; the order of the
-// additions is that of one sample after the other.
-template <int Q, class Term>
-inline void interleavedSums(int n, Term term, double (&out)[Q]) {
-  double acc[4][Q] = {};
-  int k = 0;
-  for (; k + 4 <= n; k += 4) {
-    for (int u = 0; u < 4; ++u) {
-      double v[Q];
-      term(k + u, v);
-      for (int q = 0; q < Q; ++q) acc[u][q] += v[q];
-    }
-  }
-  for (int u = 0; k < n; ++k, ++u) {
-    double v[Q];
-    term(k, v);
-    for (int q = 0; q < Q; ++q) acc[u][q] += v[q];
-  }
-  for (int q = 0; q < Q; ++q) out[q] = (acc[0][q] + acc[1][q]) + (acc[2][q] + acc[3][q]);
-}
-
-}  // namespace
 
 int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
   if (samples < 1 || lines < 1) return 0;
@@ -268,7 +242,7 @@ int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
   for (int l = 0; l < lines; ++l) {
     const fcomplex* row = rowOf(l);
     double sum[2];
-    interleavedSums(samples, [row](int k, double (&v)[2]) {
+    interleavedSums(0, samples, [row](int k, double (&v)[2]) {
       v[0] = row[k].real();
       v[1] = row[k].imag();
     }, sum);
@@ -290,7 +264,7 @@ int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
     const fcomplex* row = rowOf(l);
     const float mi = smi[l], mq = smq[l];
     double sum[2];
-    interleavedSums(samples, [row, mi, mq](int k, double (&v)[2]) {
+    interleavedSums(0, samples, [row, mi, mq](int k, double (&v)[2]) {
       const float I = row[k].real() - mi, Q = row[k].imag() - mq;
       v[0] = static_cast<double>(I) * I;
       v[1] = static_cast<double>(Q) * Q;
@@ -311,7 +285,7 @@ int ortogN(fcomplex* data, int pitch, int samples, int lines, int block) {
     const fcomplex* row = rowOf(l);
     const float mi = smi[l], mq = smq[l], r = ratio[l];
     double sum[3];
-    interleavedSums(samples, [row, mi, mq, r](int k, double (&v)[3]) {
+    interleavedSums(0, samples, [row, mi, mq, r](int k, double (&v)[3]) {
       const float I = row[k].real() - mi, Q = (row[k].imag() - mq) * r;
       v[0] = static_cast<double>(I) * Q;
       v[1] = static_cast<double>(I) * I;

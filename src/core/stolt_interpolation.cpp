@@ -19,6 +19,7 @@
 #include "core/fft.h"
 #include "diag/report.h"
 #include "numerics/filter_design.h"
+#include "numerics/interleaved_sums.h"
 
 namespace {
 
@@ -337,14 +338,14 @@ struct LSRows {
         for (int i = 0; i < padded; ++i) W[i] = static_cast<float>(rowTerm[i] * (rwin ? rwin[i] : 1.0));
         while (wlo < padded && W[wlo] == 0.0f) ++wlo;
         while (whi > wlo && W[whi] == 0.0f) --whi;
-        double n4[4] = {0.0, 0.0, 0.0, 0.0}, d4[4] = {0.0, 0.0, 0.0, 0.0};
-        for (int i = band0; i < band1; ++i) {
+        double sums[2];
+        interleavedSums(band0, band1, [rowP, W](int i, double (&v)[2]) {
           const double P = rowP[i], w = W[i];
-          d4[i & 3] += P;
-          n4[i & 3] += P * w * w;
-        }
-        D = (d4[0] + d4[1]) + (d4[2] + d4[3]);
-        N = (n4[0] + n4[1]) + (n4[2] + n4[3]);
+          v[0] = P;
+          v[1] = P * w * w;
+        }, sums);
+        D = sums[0];
+        N = sums[1];
       }
       // A row the azimuth window leaves out (a fifth of them with a window
       // over 80 % of the band) focuses to zeros: it keeps its gain sums and
