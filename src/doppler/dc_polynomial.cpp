@@ -341,13 +341,18 @@ int dcnastd(const double* values, int n, double varTh, double* mean, double* std
 
 namespace {
 
+bool blockInside(const DcEstState& st, const DcEstInput& input, int y, int x) {
+  return st.blocks >= 1 && st.blockl >= 1 && x >= 0 && y >= 0 && x + st.blocks <= input.samples &&
+         y + st.blockl <= input.lines;
+}
+
 // The block of st.blocks x st.blockl samples at sample x, line y into dst,
 // in host byte order, from memory or through `file`. On failure the report
 // text is left in `message`.
 int readBlockInto(const DcEstState& st, const DcEstInput& input, const RasterStream& file, int y, int x,
                   fcomplex* dst, std::string& message) {
   const int ns = st.blocks, nl = st.blockl;
-  if (ns < 1 || nl < 1 || x < 0 || y < 0 || x + ns > input.samples || y + nl > input.lines) {
+  if (!blockInside(st, input, y, x)) {
     message = "read_block: block of " + std::to_string(ns) + " x " + std::to_string(nl) + " at sample " +
               std::to_string(x) + ", line " + std::to_string(y) + " lies outside the raster " + input.rasterFile;
     return STATUS_BAD_CONDITION;
@@ -400,9 +405,8 @@ int read_block(DcEstState& st, const DcEstInput& input, int y, int x) {
   RasterStream file;
   std::string message;
   int s = STATUS_OK;
-  if (st.blocks >= 1 && st.blockl >= 1 && x >= 0 && y >= 0 && x + st.blocks <= input.samples &&
-      y + st.blockl <= input.lines)
-    s = openRaster(st, input, file);
+  // A block outside the raster is reported as such, before any file is opened.
+  if (blockInside(st, input, y, x)) s = openRaster(st, input, file);
   if (s == STATUS_OK) s = readBlockInto(st, input, file, y, x, st.blockBuf.data(), message);
   if (s != STATUS_OK && !message.empty()) ORV_REPORT(message, REPORT_ERROR);
   return s;
